@@ -1,0 +1,222 @@
+/*
+ * libvlx — signal processing on vectors of real or complex samples.
+ *
+ * Every operation exists twice: on double-precision vectors (`vlx_t`) and on
+ * single-precision vectors (`vlxf_t`); the single-precision twin sits on the
+ * line below its double twin and shares its comment.  Every function returns
+ * an int32_t status, 0 for success and negative (as a rule -1) for failure,
+ * unless its comment says otherwise.  Null pointers are not checked unless a
+ * comment says so.
+ *
+ * Prefixes: vlx_ general, vlxi_ in place, vlxb_ two operands, vlxbs_ two
+ * operands to a scalar, vlxu_ one source and one destination, vlxs_
+ * statistics, vlxc_ creators, vlxd_ filters and rate changers, vlxh_
+ * measurement-level and streaming processors; an `f` after `vlx` names the
+ * single-precision twin.
+ */
+#ifndef LIBVLX_H
+#define LIBVLX_H
+
+#include <stdint.h>
+
+#if defined(_WIN32)
+#  if defined(VLX_BUILDING)
+#    define VLX_API __declspec(dllexport)
+#  else
+#    define VLX_API
+#  endif
+#else
+#  define VLX_API __attribute__((visibility("default")))
+#endif
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/* A C program that includes <complex.h> first has `complex` defined as a
+ * macro; the field below keeps its name, so the macro is set aside here. */
+#if defined(complex)
+#  pragma push_macro("complex")
+#  undef complex
+#  define VLX_RESTORE_COMPLEX_MACRO 1
+#endif
+
+/* ======================================================================== */
+/* Vectors and memory                                                       */
+/* ======================================================================== */
+
+/* A vector of real or complex samples with a spacing on the x axis.
+ * `alloc` counts scalars (not points); 0 or less means `data` is not owned
+ * (null, or storage lent by the caller).  The scalar count is `points`,
+ * doubled when `complex` is non-zero; complex samples are interleaved re, im. */
+typedef struct vlx_t {
+    double   delta;    /* sample spacing on the x axis; 1.0 after vlx_init */
+    double*  data;     /* the samples */
+    int32_t  alloc;    /* capacity of data in scalars; <= 0: not owned */
+    int32_t  points;   /* logical length in points */
+    int32_t  complex;  /* non-zero: interleaved re, im pairs */
+    int32_t  reserved; /* cleared by vlx_init and vlx_destroy, never read */
+} vlx_t;
+
+typedef struct vlxf_t {
+    float    delta;
+    float*   data;
+    int32_t  alloc;
+    int32_t  points;
+    int32_t  complex;
+    int32_t  reserved;
+} vlxf_t;
+
+#if defined(VLX_RESTORE_COMPLEX_MACRO)
+#  pragma pop_macro("complex")
+#  undef VLX_RESTORE_COMPLEX_MACRO
+#endif
+
+/* Allocator hooks, one triple for each precision.  Return values are ignored.
+ * alloc: store in v->data a new block of at least the scalar count (or null);
+ *   it must release the old block itself when v->alloc > 0; never sets alloc.
+ * realloc: store in v->data a block of at least the scalar count that keeps
+ *   the old content (or null); data is null on entry when v owned nothing, and
+ *   the library then copies the old samples itself; never sets alloc.
+ * free: release v->data; the library clears the fields afterwards. */
+typedef int32_t (*vlx_alloc_hook_t)(vlx_t* v);
+typedef int32_t (*vlx_realloc_hook_t)(vlx_t* v, int32_t old_points, int32_t old_complex);
+typedef int32_t (*vlx_free_hook_t)(vlx_t* v);
+typedef int32_t (*vlxf_alloc_hook_t)(vlxf_t* v);
+typedef int32_t (*vlxf_realloc_hook_t)(vlxf_t* v, int32_t old_points, int32_t old_complex);
+typedef int32_t (*vlxf_free_hook_t)(vlxf_t* v);
+
+/* Install a hook (null restores the standard heap); the slot's previous value
+ * is stored through old_hook unless it is null.  Hooks of one precision do
+ * not affect the other.  Set them before other threads use the library. */
+VLX_API int32_t vlx_lib_alloc(vlx_alloc_hook_t new_hook, vlx_alloc_hook_t* old_hook);
+VLX_API int32_t vlxf_lib_alloc(vlxf_alloc_hook_t new_hook, vlxf_alloc_hook_t* old_hook);
+VLX_API int32_t vlx_lib_realloc(vlx_realloc_hook_t new_hook, vlx_realloc_hook_t* old_hook);
+VLX_API int32_t vlxf_lib_realloc(vlxf_realloc_hook_t new_hook, vlxf_realloc_hook_t* old_hook);
+VLX_API int32_t vlx_lib_free(vlx_free_hook_t new_hook, vlx_free_hook_t* old_hook);
+VLX_API int32_t vlxf_lib_free(vlxf_free_hook_t new_hook, vlxf_free_hook_t* old_hook);
+
+/* Sets delta to 1 and every other field to 0; releases nothing.  Always 0. */
+VLX_API int32_t vlx_init(vlx_t* v);
+VLX_API int32_t vlxf_init(vlxf_t* v);
+/* Releases owned storage (lent storage is left alone), then as vlx_init.  Always 0. */
+VLX_API int32_t vlx_destroy(vlx_t* v);
+VLX_API int32_t vlxf_destroy(vlxf_t* v);
+/* Set points and complex first: makes alloc at least the scalar count; old
+ * samples are not kept.  Capacity only grows.  On failure the vector is empty
+ * (data null, alloc and points 0). */
+VLX_API int32_t vlx_alloc(vlx_t* v);
+VLX_API int32_t vlxf_alloc(vlxf_t* v);
+/* Set the new points and complex first and pass the old ones: as vlx_alloc,
+ * keeping the old samples (copied out of lent storage into an owned block). */
+VLX_API int32_t vlx_realloc(vlx_t* v, int32_t old_points, int32_t old_complex);
+VLX_API int32_t vlxf_realloc(vlxf_t* v, int32_t old_points, int32_t old_complex);
+/* Sets every scalar to 0 (owning storage for them first); points < 1 become 0. */
+VLX_API int32_t vlxi_zero(vlx_t* v);
+VLX_API int32_t vlxfi_zero(vlxf_t* v);
+/* Real to complex in place, imaginary parts 0; a complex vector is left as it is. */
+VLX_API int32_t vlxi_rtoc(vlx_t* v);
+VLX_API int32_t vlxfi_rtoc(vlxf_t* v);
+/* Extends with zeros to new_n points; never shortens. */
+VLX_API int32_t vlxi_zpad(vlx_t* v, int32_t new_n);
+VLX_API int32_t vlxfi_zpad(vlxf_t* v, int32_t new_n);
+/* Appends src behind dst (dst turns complex if src is); dst->delta stays.
+ * A vector may be appended to itself. */
+VLX_API int32_t vlx_append(vlx_t* dst, vlx_t* src);
+VLX_API int32_t vlxf_append(vlxf_t* dst, vlxf_t* src);
+/* Copies src into dst, delta included (destination first). */
+VLX_API int32_t vlx_copy(vlx_t* dst, vlx_t* src);
+VLX_API int32_t vlxf_copy(vlxf_t* dst, vlxf_t* src);
+/* Copies at most max_points leading points of src into dst. */
+VLX_API int32_t vlx_copy_at_most(vlx_t* dst, vlx_t* src, int32_t max_points);
+VLX_API int32_t vlxf_copy_at_most(vlxf_t* dst, vlxf_t* src, int32_t max_points);
+/* dst = count points of src from start (source first); the range is clamped
+ * to src, so a range outside it gives a shorter or empty result.  src and dst
+ * may be the same owning vector, which trims it in place. */
+VLX_API int32_t vlxu_subvec(vlx_t* src, vlx_t* dst, int32_t start, int32_t count);
+VLX_API int32_t vlxfu_subvec(vlxf_t* src, vlxf_t* dst, int32_t start, int32_t count);
+/* Overwrites dst from point `at` with count points of src from start (both
+ * clamped); dst grows if needed, never shifts, and takes src->delta. */
+VLX_API int32_t vlx_insert_subvec(vlx_t* src, vlx_t* dst, int32_t start, int32_t count, int32_t at);
+VLX_API int32_t vlxf_insert_subvec(vlxf_t* src, vlxf_t* dst, int32_t start, int32_t count, int32_t at);
+/* Converts to a single-precision vector by rounding; -1 if src is dst. */
+VLX_API int32_t vlxu_tof(vlx_t* src, vlxf_t* dst);
+VLX_API int32_t vlxfu_tof(vlxf_t* src, vlxf_t* dst);
+/* Compares delta, then the samples in order, with an absolute tolerance:
+ * *result is 1, -1 or 0 at the first difference beyond it.  Returns -1 (and
+ * leaves *result alone) if the lengths differ.  A real operand compares as if
+ * its imaginary parts were 0. */
+VLX_API int32_t vlx_cmp(vlx_t* a, vlx_t* b, double tolerance, int32_t* result);
+VLX_API int32_t vlxf_cmp(vlxf_t* a, vlxf_t* b, float tolerance, int32_t* result);
+
+/* ======================================================================== */
+/* Library frame                                                            */
+/* ======================================================================== */
+
+/* Makes the library's two locks usable; call once before a second thread
+ * enters the library.  Safe to repeat.  Always 0.  One function, two names. */
+VLX_API int32_t vlx_lib_init(void);
+VLX_API int32_t vlxf_lib_init(void);
+/* Releases every internal cache of the double (vlx_) or the float (vlxf_)
+ * family; caches refill on next use.  0, or -1 if a step failed. */
+VLX_API int32_t vlx_free_internal(void);
+VLX_API int32_t vlxf_free_internal(void);
+/* The library's version without its point: 328 for 3.28.  One function, two names. */
+VLX_API int32_t vlx_version(void);
+VLX_API int32_t vlxf_version(void);
+
+/* ======================================================================== */
+/* Transforms                                                               */
+/* ======================================================================== */
+
+/* ======================================================================== */
+/* Element-wise: two-operand operations                                     */
+/* ======================================================================== */
+
+/* ======================================================================== */
+/* Element-wise: arithmetic and math                                        */
+/* ======================================================================== */
+
+/* Every scalar times s. */
+VLX_API int32_t vlxi_scale(vlx_t* v, double s);
+VLX_API int32_t vlxfi_scale(vlxf_t* v, float s);
+
+/* ======================================================================== */
+/* Element-wise: layout operations                                          */
+/* ======================================================================== */
+
+/* Drops the imaginary parts of a complex vector (a real one is left alone). */
+VLX_API int32_t vlxi_real(vlx_t* v);
+VLX_API int32_t vlxfi_real(vlxf_t* v);
+/* Reverses the sample order (pairs stay whole). */
+VLX_API int32_t vlxi_rev(vlx_t* v);
+VLX_API int32_t vlxfi_rev(vlxf_t* v);
+
+/* ======================================================================== */
+/* Filters: staging and decimation                                          */
+/* ======================================================================== */
+
+/* ======================================================================== */
+/* Statistics: moments, histogram, sort and median                          */
+/* ======================================================================== */
+
+/* ======================================================================== */
+/* Statistics: peak search                                                  */
+/* ======================================================================== */
+
+/* ======================================================================== */
+/* Internal helpers, exported for the library's own layers and for tests.   */
+/* Applications do not normally need them.                                  */
+/* ======================================================================== */
+
+/* --- two-operand destination preparation --- */
+
+/* --- arithmetic kernels --- */
+
+/* --- filter staging and tolerant point counts --- */
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif /* LIBVLX_H */

@@ -1,0 +1,122 @@
+// Shared test support: the two families as GoogleTest types, overloads that
+// route a call to the twin of the vector's family, an owning vector wrapper,
+// and closeness checks in which a NaN never passes.
+#pragma once
+
+#include "libvlx.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <initializer_list>
+#include <limits>
+#include <random>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+namespace vlxtest {
+
+using Families = ::testing::Types<vlx_t, vlxf_t>;
+
+// The scalar type of a family: double for vlx_t, float for vlxf_t.
+template <class V>
+using real_of = std::remove_pointer_t<decltype(V::data)>;
+
+template <class V>
+constexpr bool is_double = std::is_same_v<V, vlx_t>;
+
+// Defines `name(vector, args...)` for both families, forwarding to the
+// double export or its float twin by the type of the first argument.
+#define VLX_TEST_TWIN(name, dfn, ffn)                                                            \
+    template <class... A>                                                                        \
+    inline auto name(vlx_t* v, A&&... a) { return dfn(v, std::forward<A>(a)...); }              \
+    template <class... A>                                                                        \
+    inline auto name(vlxf_t* v, A&&... a) { return ffn(v, std::forward<A>(a)...); }
+
+VLX_TEST_TWIN(t_init, vlx_init, vlxf_init)
+VLX_TEST_TWIN(t_destroy, vlx_destroy, vlxf_destroy)
+VLX_TEST_TWIN(t_alloc, vlx_alloc, vlxf_alloc)
+VLX_TEST_TWIN(t_realloc, vlx_realloc, vlxf_realloc)
+VLX_TEST_TWIN(t_zero, vlxi_zero, vlxfi_zero)
+VLX_TEST_TWIN(t_rtoc, vlxi_rtoc, vlxfi_rtoc)
+VLX_TEST_TWIN(t_zpad, vlxi_zpad, vlxfi_zpad)
+VLX_TEST_TWIN(t_append, vlx_append, vlxf_append)
+VLX_TEST_TWIN(t_copy, vlx_copy, vlxf_copy)
+VLX_TEST_TWIN(t_copy_at_most, vlx_copy_at_most, vlxf_copy_at_most)
+VLX_TEST_TWIN(t_subvec, vlxu_subvec, vlxfu_subvec)
+VLX_TEST_TWIN(t_insert_subvec, vlx_insert_subvec, vlxf_insert_subvec)
+VLX_TEST_TWIN(t_cmp, vlx_cmp, vlxf_cmp)
+
+// An owning vector for tests: initialised on construction, destroyed on exit.
+template <class V>
+class Vec {
+public:
+    using T = real_of<V>;
+    Vec() { t_init(&v_); }
+    // Real samples, or complex ones given as re, im pairs when is_complex.
+    Vec(std::initializer_list<T> values, bool is_complex = false) : Vec() { assign(values, is_complex); }
+    Vec(const std::vector<T>& values, bool is_complex) : Vec() { assign(values, is_complex); }
+    ~Vec() { t_destroy(&v_); }
+    Vec(const Vec&) = delete;
+    Vec& operator=(const Vec&) = delete;
+
+    template <class C>
+    void assign(const C& values, bool is_complex) {
+        v_.complex = is_complex ? 1 : 0;
+        v_.points = static_cast<int32_t>(values.size() / (is_complex ? 2 : 1));
+        EXPECT_EQ(t_alloc(&v_), 0);
+        int32_t i = 0;
+        for (T x : values) v_.data[i++] = x;
+    }
+
+    V* operator&() { return &v_; }
+    V* get() { return &v_; }
+    V* operator->() { return &v_; }
+    int64_t scalars() const { return v_.complex ? 2 * int64_t(v_.points) : v_.points; }
+    T& operator[](int64_t i) { return v_.data[i]; }
+    std::vector<T> values() const { return std::vector<T>(v_.data, v_.data + scalars()); }
+
+private:
+    V v_;
+};
+
+// Uniform random samples in [lo, hi), reproducible from the seed.
+template <class T>
+std::vector<T> random_values(size_t n, uint32_t seed, double lo = -1.0, double hi = 1.0) {
+    std::mt19937_64 rng(seed);
+    std::uniform_real_distribution<double> dist(lo, hi);
+    std::vector<T> out(n);
+    for (auto& x : out) x = static_cast<T>(dist(rng));
+    return out;
+}
+
+// Bit-for-bit equality (so -0.0 differs from +0.0, and equal NaNs match).
+template <class T>
+bool same_bits(T a, T b) {
+    return std::memcmp(&a, &b, sizeof(T)) == 0;
+}
+
+// Distance in units in the last place; a NaN is infinitely far from anything.
+template <class T>
+double ulp_distance(T a, T b) {
+    if (std::isnan(a) || std::isnan(b)) return std::numeric_limits<double>::infinity();
+    if (a == b) return 0.0;
+    using I = std::conditional_t<sizeof(T) == 8, int64_t, int32_t>;
+    I ia, ib;
+    std::memcpy(&ia, &a, sizeof(T));
+    std::memcpy(&ib, &b, sizeof(T));
+    if (ia < 0) ia = std::numeric_limits<I>::min() - ia;
+    if (ib < 0) ib = std::numeric_limits<I>::min() - ib;
+    return std::fabs(static_cast<double>(ia) - static_cast<double>(ib));
+}
+
+// |a - b| <= tol, written so that a NaN on either side fails.
+inline ::testing::AssertionResult near(long double a, long double b, long double tol) {
+    if (std::fabs(a - b) <= tol) return ::testing::AssertionSuccess();
+    return ::testing::AssertionFailure() << a << " and " << b << " differ by more than " << tol;
+}
+
+}  // namespace vlxtest
