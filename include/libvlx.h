@@ -168,6 +168,14 @@ VLX_API int32_t vlxf_version(void);
 /* ======================================================================== */
 /* Transforms                                                               */
 /* ======================================================================== */
+/* Forward transforms carry 1/N, inverse ones nothing.  After a transform
+ * delta is 1/(N * delta), or 1e100 (float: 999999986991104) if it was 0. */
+
+/* --- complex and real power-of-two transforms --- */
+
+
+/* --- any length, cosine transform, analytic signal --- */
+
 
 /* ======================================================================== */
 /* Element-wise: two-operand operations                                     */
