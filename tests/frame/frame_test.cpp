@@ -1,0 +1,138 @@
+// The frame's internals: locks before and after vlx_lib_init, the bounded
+// counter, the active counter and the teardown that waits for readers.
+// Linked against the static library, whose internal symbols are visible.
+#include "core/frame.hpp"
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <chrono>
+#include <thread>
+#include <vector>
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+using std::chrono::milliseconds;
+
+// How long `other` waits for lock n while this thread holds it for hold_ms.
+int64_t blocked_ms(int n, int hold_ms) {
+    std::atomic<bool> held{false};
+    int64_t waited = 0;
+    vlx::lib_lock(n);
+    std::thread other([&] {
+        held.wait(false);
+        const auto t0 = Clock::now();
+        vlx::lib_lock(n);
+        waited = std::chrono::duration_cast<milliseconds>(Clock::now() - t0).count();
+        vlx::lib_unlock(n);
+    });
+    held = true;
+    held.notify_one();
+    std::this_thread::sleep_for(milliseconds(hold_ms));
+    vlx::lib_unlock(n);
+    other.join();
+    return waited;
+}
+
+// Runs first in this executable: before vlx_lib_init the locks do nothing.
+TEST(Frame, LocksWorkOnlyAfterInitAndInitRepeats) {
+    EXPECT_LT(blocked_ms(0, 100), 50);
+    EXPECT_LT(blocked_ms(1, 100), 50);
+
+    std::vector<std::thread> threads;
+    for (int t = 0; t < 4; ++t)
+        threads.emplace_back([] {
+            for (int i = 0; i < 2600; ++i) EXPECT_EQ(vlx_lib_init(), 0);
+        });
+    for (auto& t : threads) t.join();
+    EXPECT_EQ(vlxf_lib_init(), 0);
+
+    EXPECT_GE(blocked_ms(0, 100), 60);
+    EXPECT_GE(blocked_ms(1, 100), 60);
+    // recursive for the holding thread
+    vlx::lib_lock(1);
+    vlx::lib_lock(1);
+    vlx::lib_lock(0);
+    vlx::lib_unlock(0);
+    vlx::lib_unlock(1);
+    vlx::lib_unlock(1);
+    EXPECT_EQ(vlx_version(), 328);
+    EXPECT_EQ(vlxf_version(), 328);
+}
+
+TEST(Frame, BoundedCounterFiresOnceAndStaysBounded) {
+    std::atomic<int32_t> counter{0};
+    int first = 0;
+    for (int i = 0; i < 25000; ++i) first += vlx::bounded_counter_first(counter) ? 1 : 0;
+    EXPECT_EQ(first, 1);
+    EXPECT_LE(counter.load(), 10000);
+    EXPECT_GE(counter.load(), 9999);
+}
+
+std::vector<int> ran;
+template <int N, int Result>
+int32_t record_step() {
+    ran.push_back(N);
+    return Result;
+}
+
+TEST(Frame, TeardownRunsStepsInOrderAndStopsAtAFailure) {
+    using vlx::TeardownStep;
+    EXPECT_EQ(vlx_free_internal(), 0);  // nothing plugged in
+    vlx::register_teardown<vlx_t>(TeardownStep::window_cache, &record_step<8, 0>);
+    vlx::register_teardown<vlx_t>(TeardownStep::fir_scratch, &record_step<1, 0>);
+    vlx::register_teardown<vlx_t>(TeardownStep::bitrev_lists, &record_step<3, 0>);
+    vlx::register_teardown<vlx_t>(TeardownStep::twiddle_tables, &record_step<7, 0>);
+    ran.clear();
+    EXPECT_EQ(vlxf_free_internal(), 0);  // the float family has its own steps
+    EXPECT_TRUE(ran.empty());
+    EXPECT_EQ(vlx_free_internal(), 0);
+    EXPECT_EQ(ran, (std::vector<int>{1, 3, 7, 8}));
+
+    vlx::register_teardown<vlx_t>(TeardownStep::chirp, &record_step<5, -7>);
+    ran.clear();
+    EXPECT_EQ(vlx_free_internal(), -1);  // any negative status becomes -1
+    EXPECT_EQ(ran, (std::vector<int>{1, 3, 5}));
+
+    for (int s = 0; s < static_cast<int>(TeardownStep::count); ++s)
+        vlx::register_teardown<vlx_t>(static_cast<TeardownStep>(s), nullptr);
+}
+
+std::atomic<bool> reader_done{false};
+std::atomic<bool> step_saw_reader_done{false};
+
+int32_t waiting_step() {
+    vlx::LockGuard lock(0);
+    vlx::lib_active_wait();
+    step_saw_reader_done = reader_done.load();
+    return 0;
+}
+
+TEST(Frame, TeardownWaitsForAReaderOutsideTheLock) {
+    ASSERT_EQ(vlx_lib_init(), 0);
+    vlx::register_teardown<vlx_t>(vlx::TeardownStep::twiddle_tables, &waiting_step);
+    std::atomic<bool> reading{false};
+    std::thread reader([&] {
+        vlx::TableReader r;  // lock 0, active enter
+        r.release_lock();    // the table is now used outside the lock
+        reading = true;
+        reading.notify_one();
+        std::this_thread::sleep_for(milliseconds(120));
+        reader_done = true;
+    });  // active leave
+    reading.wait(false);
+    const auto t0 = Clock::now();
+    EXPECT_EQ(vlx_free_internal(), 0);
+    reader.join();
+    EXPECT_TRUE(step_saw_reader_done.load());
+    EXPECT_GE(std::chrono::duration_cast<milliseconds>(Clock::now() - t0).count(), 60);
+
+    // With nobody reading, the wait returns at once.
+    const auto t1 = Clock::now();
+    EXPECT_EQ(vlx_free_internal(), 0);
+    EXPECT_LT(std::chrono::duration_cast<milliseconds>(Clock::now() - t1).count(), 50);
+    vlx::register_teardown<vlx_t>(vlx::TeardownStep::twiddle_tables, nullptr);
+}
+
+}  // namespace
