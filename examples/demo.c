@@ -22,10 +22,11 @@ int main(void) {
     printf("libvlx %d.%02d\n", vlx_version() / 100, vlx_version() % 100);
     printf("b: %d complex points, capacity %d scalars, delta %g\n", b.points, b.alloc, b.delta);
 
-    /* keep points 2..9 of b and compare with a (b's imaginary parts are 0) */
-    vlxu_subvec(&b, &b, 2, 8);
+    /* trim b back to its first 8 points and compare with a: b's imaginary
+     * parts are 0, so the two are equal (0) */
+    vlxu_subvec(&b, &b, 0, 8);
     vlx_cmp(&a, &b, 1e-12, &order);
-    printf("a compared with b[2..9]: %d\n", order);
+    printf("a compared with b[0..7]: %d\n", order);
 
     vlx_destroy(&a);
     vlx_destroy(&b);
