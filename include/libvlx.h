@@ -253,10 +253,9 @@ VLX_API int32_t vlxfu_zinter(vlxf_t* src, vlxf_t* dst, float scale);
 #define VLX_STAGE_ALIAS       1 /* route a destination sharing the source's data through a temporary */
 #define VLX_STAGE_KEEP_POINTS 2 /* the caller has set out->points already */
 
-/* Keeps every factor-th sample (factor < 1 taken as 1), starting after the
- * skip count held in hist->data[0] and leaving the next one there, so that
- * blocks fed in turn give what one long call gives.  out may be in; hist may
- * be NULL; out->delta = factor * in->delta. */
+/* Keeps every factor-th sample (factor < 1 taken as 1) after the skip count carried in
+ * hist->data[0] (hist may be NULL), so blocks fed in turn give what one long call gives.
+ * out may be in; out->delta = factor * in->delta. */
 VLX_API int32_t vlxd_deci(vlx_t* in, vlx_t* out, int32_t factor, vlx_t* hist);
 VLX_API int32_t vlxfd_deci(vlxf_t* in, vlxf_t* out, int32_t factor, vlxf_t* hist);
 
@@ -279,13 +278,10 @@ VLX_API int32_t vlxfd_deci(vlxf_t* in, vlxf_t* out, int32_t factor, vlxf_t* hist
 
 /* --- filter staging and tolerant point counts --- */
 
-/* Prepares a filter call: brings *hist_ref (if given and not NULL) to in's
- * complex flag and delta and to at least hist_points points; with
- * VLX_STAGE_ALIAS and in->data == (*out_ref)->data, initialises *tmp, stores
- * the caller's destination in *saved_out and points *out_ref at tmp (aliased,
- * tmp and saved_out must then all be given; *aliased receives 0 or 1 whenever
- * they are).  Then gives the destination in's points (unless
- * VLX_STAGE_KEEP_POINTS), complex if in or other is, in's delta, and storage. */
+/* Prepares a filter call: *hist_ref (may be NULL) takes in's complex flag and delta and at least
+ * hist_points points; with VLX_STAGE_ALIAS a destination sharing in's data is swapped for tmp
+ * (aliased, tmp, saved_out then required); out gets in's points (unless VLX_STAGE_KEEP_POINTS),
+ * complex if in or other is, in's delta, and storage. */
 VLX_API int32_t vlx_stage_io(vlx_t* in, vlx_t** out_ref, vlx_t* other, vlx_t** hist_ref, int32_t hist_points, int32_t flags, int32_t* aliased, vlx_t* tmp, vlx_t** saved_out);
 VLX_API int32_t vlxf_stage_io(vlxf_t* in, vlxf_t** out_ref, vlxf_t* other, vlxf_t** hist_ref, int32_t hist_points, int32_t flags, int32_t* aliased, vlxf_t* tmp, vlxf_t** saved_out);
 /* Closes a staged call: when aliased, copies out into saved_out and destroys
