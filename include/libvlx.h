@@ -199,10 +199,65 @@ VLX_API int32_t vlxfi_real(vlxf_t* v);
 /* Reverses the sample order (pairs stay whole). */
 VLX_API int32_t vlxi_rev(vlx_t* v);
 VLX_API int32_t vlxfi_rev(vlxf_t* v);
+/* Keeps only the imaginary parts of a complex vector; a real vector's samples
+ * all become 0 (the imaginary part of a real signal). */
+VLX_API int32_t vlxi_imag(vlx_t* v);
+VLX_API int32_t vlxfi_imag(vlxf_t* v);
+/* Drops the first k samples, moving the rest to the front; k is clamped to
+ * [0, points].  There is no shift to the right. */
+VLX_API int32_t vlxi_shift(vlx_t* v, int32_t k);
+VLX_API int32_t vlxfi_shift(vlxf_t* v, int32_t k);
+/* Rotates left by n - n/2 samples: sample 0 goes to n/2.  Undoes vlxi_swap_halves2. */
+VLX_API int32_t vlxi_swap_halves(vlx_t* v);
+VLX_API int32_t vlxfi_swap_halves(vlxf_t* v);
+/* Rotates left by n/2 samples: sample n/2 comes to index 0 (a centred
+ * record's time zero to the transform's origin).  Undoes vlxi_swap_halves. */
+VLX_API int32_t vlxi_swap_halves2(vlx_t* v);
+VLX_API int32_t vlxfi_swap_halves2(vlxf_t* v);
+
+/* Flags of vlxi_zpad2 and vlxi_unzpad: one scale mode or'ed with one layout. */
+#define VLX_PAD_SCALE_RATIO 0x000 /* samples times new_n/old_n */
+#define VLX_PAD_SCALE_SQRT  0x001 /* samples times sqrt(new_n/old_n) */
+#define VLX_PAD_SCALE_NONE  0x002 /* samples unscaled */
+#define VLX_PAD_HEAD        0x000 /* samples at the start, zeros behind */
+#define VLX_PAD_CENTRE      0x100 /* samples in the middle */
+#define VLX_PAD_TAIL        0x200 /* samples at the end, zeros before */
+#define VLX_PAD_SPLIT       0x300 /* first (old_n+1)/2 at the start, the rest at the end */
+
+/* Extends to new_n points with zeros by a VLX_PAD_ layout and scale mode; no
+ * scaling from an empty vector.  new_n not above points: 0, nothing changed.
+ * Scale mode 3 or an unknown layout: -1, with the vector already grown. */
+VLX_API int32_t vlxi_zpad2(vlx_t* v, int32_t new_n, int32_t flags);
+VLX_API int32_t vlxfi_zpad2(vlxf_t* v, int32_t new_n, int32_t flags);
+/* Inverse of vlxi_zpad2: shortens to new_n points (negative taken as 0) by
+ * the same layout and scale flags, scale new_n/old_n.  new_n not below points:
+ * 0, nothing changed; invalid flags: -1, nothing changed.  alloc stays. */
+VLX_API int32_t vlxi_unzpad(vlx_t* v, int32_t new_n, int32_t flags);
+VLX_API int32_t vlxfi_unzpad(vlxf_t* v, int32_t new_n, int32_t flags);
+/* Inserts a zero (pair) behind every sample: twice the points, half the delta. */
+VLX_API int32_t vlxi_zinter(vlx_t* v);
+VLX_API int32_t vlxfi_zinter(vlxf_t* v);
+/* dst = src with each sample times scale followed by a zero (pair); dst
+ * gets 2 * src points, src's complex flag and half its delta.  dst may be src. */
+VLX_API int32_t vlxu_zinter(vlx_t* src, vlx_t* dst, double scale);
+VLX_API int32_t vlxfu_zinter(vlxf_t* src, vlxf_t* dst, float scale);
 
 /* ======================================================================== */
 /* Filters: staging and decimation                                          */
 /* ======================================================================== */
+/* A filter's history `hist` is an optional vector owned by the caller that
+ * carries the stream from block to block; NULL or empty starts from silence.
+ * Output has as many points as input, except in rate changers. */
+
+/* Staging flags of vlx_stage_io. */
+#define VLX_STAGE_ALIAS       1 /* route a destination sharing the source's data through a temporary */
+#define VLX_STAGE_KEEP_POINTS 2 /* the caller has set out->points already */
+
+/* Keeps every factor-th sample (factor < 1 taken as 1) after the skip count carried in
+ * hist->data[0] (hist may be NULL), so blocks fed in turn give what one long call gives.
+ * out may be in; out->delta = factor * in->delta. */
+VLX_API int32_t vlxd_deci(vlx_t* in, vlx_t* out, int32_t factor, vlx_t* hist);
+VLX_API int32_t vlxfd_deci(vlxf_t* in, vlxf_t* out, int32_t factor, vlxf_t* hist);
 
 /* ======================================================================== */
 /* Statistics: moments, histogram, sort and median                          */
@@ -222,6 +277,28 @@ VLX_API int32_t vlxfi_rev(vlxf_t* v);
 /* --- arithmetic kernels --- */
 
 /* --- filter staging and tolerant point counts --- */
+
+/* Prepares a filter call: *hist_ref (may be NULL) takes in's complex flag and delta and at least
+ * hist_points points; with VLX_STAGE_ALIAS a destination sharing in's data is swapped for tmp
+ * (aliased, tmp, saved_out then required); out gets in's points (unless VLX_STAGE_KEEP_POINTS),
+ * complex if in or other is, in's delta, and storage. */
+VLX_API int32_t vlx_stage_io(vlx_t* in, vlx_t** out_ref, vlx_t* other, vlx_t** hist_ref, int32_t hist_points, int32_t flags, int32_t* aliased, vlx_t* tmp, vlx_t** saved_out);
+VLX_API int32_t vlxf_stage_io(vlxf_t* in, vlxf_t** out_ref, vlxf_t* other, vlxf_t** hist_ref, int32_t hist_points, int32_t flags, int32_t* aliased, vlxf_t* tmp, vlxf_t** saved_out);
+/* Closes a staged call: when aliased, copies out into saved_out and destroys
+ * out (the temporary); otherwise 0 at once.  -1 if aliased without saved_out. */
+VLX_API int32_t vlx_unstage_io(vlx_t* out, int32_t aliased, vlx_t* saved_out);
+VLX_API int32_t vlxf_unstage_io(vlxf_t* out, int32_t aliased, vlxf_t* saved_out);
+/* 1 if b/a lies within 1 +- 20 epsilons (float: 7), or both are within 20
+ * smallest normals of 0; otherwise 0 (also for a NaN). */
+VLX_API int32_t vlx_nearly_equal(double a, double b);
+VLX_API int32_t vlxf_nearly_equal(float a, float b);
+/* A computed length as a point count, rounded up, a value within relative
+ * noise of a whole number taken as that number; 0 to 2147483647. */
+VLX_API int32_t vlx_ceil_pts(double x);
+VLX_API int32_t vlxf_ceil_pts(float x);
+/* As vlx_ceil_pts, rounded down. */
+VLX_API int32_t vlx_floor_pts(double x);
+VLX_API int32_t vlxf_floor_pts(float x);
 
 #ifdef __cplusplus
 }

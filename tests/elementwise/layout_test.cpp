@@ -1,0 +1,180 @@
+// Layout operations through the public interface, both families.
+#include "vlx_test.hpp"
+
+#include <algorithm>
+#include <climits>
+
+using namespace vlxtest;
+
+namespace {
+
+VLX_TEST_TWIN(t_real, vlxi_real, vlxfi_real)
+VLX_TEST_TWIN(t_imag, vlxi_imag, vlxfi_imag)
+VLX_TEST_TWIN(t_rev, vlxi_rev, vlxfi_rev)
+VLX_TEST_TWIN(t_shift, vlxi_shift, vlxfi_shift)
+VLX_TEST_TWIN(t_swap, vlxi_swap_halves, vlxfi_swap_halves)
+VLX_TEST_TWIN(t_swap2, vlxi_swap_halves2, vlxfi_swap_halves2)
+VLX_TEST_TWIN(t_zpad2, vlxi_zpad2, vlxfi_zpad2)
+VLX_TEST_TWIN(t_unzpad, vlxi_unzpad, vlxfi_unzpad)
+VLX_TEST_TWIN(t_zinter, vlxi_zinter, vlxfi_zinter)
+VLX_TEST_TWIN(t_uzinter, vlxu_zinter, vlxfu_zinter)
+
+// Sample k of a vector as (re, im); im is 0 for a real vector.
+template <class V>
+std::pair<real_of<V>, real_of<V>> sample(Vec<V>& v, int64_t k) {
+    if (v->complex) return {v[2 * k], v[2 * k + 1]};
+    return {v[k], real_of<V>(0)};
+}
+
+template <class V>
+class Layout : public ::testing::Test {};
+TYPED_TEST_SUITE(Layout, Families);
+
+TYPED_TEST(Layout, RealAndImaginaryParts) {
+    using V = TypeParam;
+    using R = std::vector<real_of<V>>;
+    Vec<V> c({1, -2, 3, -4, 5, -6}, true), d({1, -2, 3, -4, 5, -6}, true), r({7, 8, 9});
+    ASSERT_EQ(t_real(&c), 0);
+    ASSERT_EQ(t_imag(&d), 0);
+    EXPECT_EQ(c.values(), (R{1, 3, 5}));
+    EXPECT_EQ(c->alloc, 6);
+    EXPECT_EQ(d.values(), (R{-2, -4, -6}));
+    EXPECT_EQ(d->complex, 0);
+    ASSERT_EQ(t_real(&r), 0);
+    EXPECT_EQ(r.values(), (R{7, 8, 9}));
+    ASSERT_EQ(t_imag(&r), 0);  // the imaginary part of a real signal
+    EXPECT_EQ(r.values(), (R{0, 0, 0}));
+}
+
+TYPED_TEST(Layout, ReverseAndShiftAgainstIndexFormulas) {
+    using V = TypeParam;
+    for (bool cx : {false, true})
+        for (int32_t n : {0, 1, 2, 5, 8}) {
+            const auto x = random_values<real_of<V>>(size_t(n) * (cx ? 2 : 1), uint32_t(n));
+            Vec<V> ref(x, cx);
+            Vec<V> v(x, cx);
+            ASSERT_EQ(t_rev(&v), 0);
+            for (int64_t k = 0; k < n; ++k) EXPECT_EQ(sample(v, k), sample(ref, n - 1 - k));
+            for (int32_t k : {INT_MIN, -1, 0, 1, n - 1, n, n + 1, INT_MAX}) {
+                Vec<V> s(x, cx);
+                ASSERT_EQ(t_shift(&s, k), 0);
+                const int32_t drop = k < 0 ? 0 : std::min(k, n);
+                ASSERT_EQ(s->points, n - drop) << "n=" << n << " k=" << k;
+                for (int64_t j = 0; j < s->points; ++j) EXPECT_EQ(sample(s, j), sample(ref, j + drop));
+            }
+        }
+}
+
+TYPED_TEST(Layout, RotationsMatchIndexFormulaAndUndoEachOther) {
+    using V = TypeParam;
+    for (bool cx : {false, true})
+        for (int32_t n : {0, 1, 2, 3, 4, 5, 6, 7, 15, 16, 63, 64, 1001}) {
+            const auto x = random_values<real_of<V>>(size_t(n) * (cx ? 2 : 1), uint32_t(n + 7));
+            Vec<V> ref(x, cx);
+            Vec<V> a(x, cx), b(x, cx);
+            ASSERT_EQ(t_swap2(&a), 0);
+            ASSERT_EQ(t_swap(&b), 0);
+            for (int64_t j = 0; j < n; ++j) {
+                EXPECT_EQ(sample(a, j), sample(ref, (j + n / 2) % n)) << "n=" << n;
+                EXPECT_EQ(sample(b, j), sample(ref, (j + n - n / 2) % n)) << "n=" << n;
+            }
+            ASSERT_EQ(t_swap(&a), 0);
+            ASSERT_EQ(t_swap2(&b), 0);
+            EXPECT_EQ(a.values(), x);
+            EXPECT_EQ(b.values(), x);
+        }
+}
+
+// Padding then unpadding restores the input for every layout, scale mode and
+// a grid of lengths; on the way the padded samples sit where a spectrum or a
+// centred record expects them.
+TYPED_TEST(Layout, PadAndUnpadAreInverse) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const int32_t layouts[] = {VLX_PAD_HEAD, VLX_PAD_CENTRE, VLX_PAD_TAIL, VLX_PAD_SPLIT};
+    for (bool cx : {false, true})
+        for (int32_t mode : {VLX_PAD_SCALE_RATIO, VLX_PAD_SCALE_SQRT, VLX_PAD_SCALE_NONE})
+            for (int32_t layout : layouts)
+                for (int32_t old_n : {0, 1, 2, 3, 4, 5, 8, 9, 16, 17})
+                    for (int32_t extra : {1, 2, 3, 8, 31}) {
+                        const int32_t n = old_n + extra;
+                        const auto x = random_values<T>(size_t(old_n) * (cx ? 2 : 1), uint32_t(n * 3 + old_n));
+                        Vec<V> ref(x, cx);
+                        Vec<V> v(x, cx);
+                        SCOPED_TRACE(::testing::Message() << "cx " << cx << " flags " << (mode | layout)
+                                                          << " " << old_n << " -> " << n);
+                        ASSERT_EQ(t_zpad2(&v, n, mode | layout), 0);
+                        ASSERT_EQ(v->points, n);
+                        long double s = 1;
+                        if (mode != VLX_PAD_SCALE_NONE && old_n > 0)
+                            s = (long double)n / old_n;
+                        if (mode == VLX_PAD_SCALE_SQRT) s = std::sqrt(s);
+                        // where old sample k landed
+                        auto at = [&](int64_t k) -> int64_t {
+                            if (layout == VLX_PAD_HEAD) return k;
+                            if (layout == VLX_PAD_TAIL) return n - old_n + k;
+                            if (layout == VLX_PAD_CENTRE) return k + n / 2 - old_n / 2;
+                            return k < (old_n + 1) / 2 ? k : n - (old_n - k);
+                        };
+                        std::vector<bool> hit(size_t(n), false);
+                        for (int64_t k = 0; k < old_n; ++k) {
+                            hit[size_t(at(k))] = true;
+                            auto [re, im] = sample(v, at(k));
+                            auto [xr, xi] = sample(ref, k);
+                            EXPECT_LE(ulp_distance(re, T(xr * s)), 1.0);
+                            EXPECT_LE(ulp_distance(im, T(xi * s)), 1.0);
+                        }
+                        for (int64_t j = 0; j < n; ++j)
+                            if (!hit[size_t(j)]) {
+                                EXPECT_EQ(sample(v, j), std::make_pair(T(0), T(0))) << j;
+                            }
+                        ASSERT_EQ(t_unzpad(&v, old_n, mode | layout), 0);
+                        ASSERT_EQ(v->points, old_n);
+                        for (int64_t i = 0; i < v.scalars(); ++i) {
+                            if (mode == VLX_PAD_SCALE_NONE)
+                                EXPECT_TRUE(same_bits(v[i], x[size_t(i)]));
+                            else
+                                EXPECT_LE(ulp_distance(v[i], x[size_t(i)]), 4.0);
+                        }
+                    }
+}
+
+TYPED_TEST(Layout, InvalidFlagsAreSeenAfterGrowingAndBeforeUnpadding) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    for (int32_t flags : {3, VLX_PAD_SPLIT | 3, 0x400, 0x500, 0x600, 0x700 | VLX_PAD_SCALE_NONE}) {
+        Vec<V> v({1, 2, 3});
+        EXPECT_EQ(t_zpad2(&v, 3, flags), 0);  // nothing to do comes first
+        EXPECT_EQ(t_unzpad(&v, 3, flags), 0);
+        EXPECT_EQ(v->points, 3);
+        EXPECT_EQ(t_zpad2(&v, 5, flags), -1);
+        EXPECT_EQ(v->points, 5);  // grown, new samples unset
+        EXPECT_GE(v->alloc, 5);
+        EXPECT_EQ((std::vector<T>{v[0], v[1], v[2]}), (std::vector<T>{1, 2, 3}));
+        const auto before = v.values();
+        EXPECT_EQ(t_unzpad(&v, 2, flags), -1);
+        EXPECT_EQ(v->points, 5);
+        EXPECT_EQ(v.values(), before);
+    }
+}
+
+TYPED_TEST(Layout, ZeroInterleave) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    Vec<V> r({1, 2});
+    r->delta = 3;
+    ASSERT_EQ(t_zinter(&r), 0);
+    EXPECT_EQ(r.values(), (std::vector<T>{1, 0, 2, 0}));
+    EXPECT_EQ(r->delta, T(1.5));
+    // complex, into itself and into another vector
+    Vec<V> c({1, 2, 3, 4}, true);
+    Vec<V> d;
+    ASSERT_EQ(t_uzinter(&c, &d, T(2)), 0);
+    ASSERT_EQ(t_uzinter(&c, &c, T(2)), 0);
+    const std::vector<T> want{2, 4, 0, 0, 6, 8, 0, 0};
+    EXPECT_EQ(c.values(), want);
+    EXPECT_EQ(d.values(), want);
+    EXPECT_EQ(d->complex, 1);
+}
+
+}  // namespace
