@@ -7,6 +7,10 @@
 #include <cmath>
 #include <cstdlib>
 
+#if defined(__x86_64__) || defined(__i386__)
+#include <immintrin.h>
+#endif
+
 namespace vlx {
 namespace {
 
@@ -164,19 +168,166 @@ inline void two_point(T* x) {
     x[3] = i - x[3];
 }
 
+#if defined(__x86_64__) || defined(__i386__)
+#define VLX_FFT_AVX 1
+
+// AVX without FMA: each lane does the scalar butterfly's own operations in the
+// same order, so the results are bit-identical to l_block.  A vector holds
+// W complex points (2 doubles or 4 floats), k .. k+W-1 of a block.
+template <class T>
+struct Avx;
+
+template <>
+struct Avx<double> {
+    using reg = __m256d;
+    static constexpr size_t width = 2;
+    __attribute__((target("avx"))) static reg load(const double* p) { return _mm256_loadu_pd(p); }
+    __attribute__((target("avx"))) static void store(double* p, reg v) { _mm256_storeu_pd(p, v); }
+    __attribute__((target("avx"))) static reg add(reg a, reg b) { return _mm256_add_pd(a, b); }
+    __attribute__((target("avx"))) static reg sub(reg a, reg b) { return _mm256_sub_pd(a, b); }
+    __attribute__((target("avx"))) static reg mul(reg a, reg b) { return _mm256_mul_pd(a, b); }
+    // (re, im) -> (im, re)
+    __attribute__((target("avx"))) static reg swap(reg v) { return _mm256_permute_pd(v, 0x5); }
+    // (re, im) -> (re, re)
+    __attribute__((target("avx"))) static reg dup_re(reg v) { return _mm256_movedup_pd(v); }
+    // real parts from r, imaginary parts from i
+    __attribute__((target("avx"))) static reg re_im(reg r, reg i) { return _mm256_blend_pd(r, i, 0xA); }
+    // point 0 from a, the others from b
+    __attribute__((target("avx"))) static reg first_from(reg a, reg b) { return _mm256_blend_pd(b, a, 0x3); }
+    // Triples of two points: (c, c) and (a, b) per point, for the first
+    // (offset 0) or the second (offset 3) triple of each pair.
+    template <int Offset>
+    __attribute__((target("avx"))) static void triples(const double* t, size_t step, reg& c, reg& ab) {
+        c = _mm256_insertf128_pd(_mm256_castpd128_pd256(_mm_loaddup_pd(t + Offset)), _mm_loaddup_pd(t + step + Offset),
+                                 1);
+        ab = _mm256_insertf128_pd(_mm256_castpd128_pd256(_mm_loadu_pd(t + Offset + 1)),
+                                  _mm_loadu_pd(t + step + Offset + 1), 1);
+    }
+};
+
+template <>
+struct Avx<float> {
+    using reg = __m256;
+    static constexpr size_t width = 4;
+    __attribute__((target("avx"))) static reg load(const float* p) { return _mm256_loadu_ps(p); }
+    __attribute__((target("avx"))) static void store(float* p, reg v) { _mm256_storeu_ps(p, v); }
+    __attribute__((target("avx"))) static reg add(reg a, reg b) { return _mm256_add_ps(a, b); }
+    __attribute__((target("avx"))) static reg sub(reg a, reg b) { return _mm256_sub_ps(a, b); }
+    __attribute__((target("avx"))) static reg mul(reg a, reg b) { return _mm256_mul_ps(a, b); }
+    __attribute__((target("avx"))) static reg swap(reg v) { return _mm256_permute_ps(v, 0xB1); }
+    __attribute__((target("avx"))) static reg dup_re(reg v) { return _mm256_moveldup_ps(v); }
+    __attribute__((target("avx"))) static reg re_im(reg r, reg i) { return _mm256_blend_ps(r, i, 0xAA); }
+    __attribute__((target("avx"))) static reg first_from(reg a, reg b) { return _mm256_blend_ps(b, a, 0x3); }
+    // Triples of four points: (c, c) and (a, b) per point, for the first
+    // (offset 0) or the second (offset 3) triple of each pair.
+    template <int Offset>
+    __attribute__((target("avx"))) static void triples(const float* t, size_t step, reg& c, reg& ab) {
+        // four scalars within the pair: (c, a, b, c3) or (b, c3, a3, b3)
+        constexpr int at = Offset == 0 ? 0 : 2;
+        const __m128 p0 = _mm_loadu_ps(t + at), p1 = _mm_loadu_ps(t + step + at);
+        const __m128 p2 = _mm_loadu_ps(t + 2 * step + at), p3 = _mm_loadu_ps(t + 3 * step + at);
+        if constexpr (Offset == 0) {
+            c = _mm256_set_m128(_mm_shuffle_ps(p2, p3, 0x00), _mm_shuffle_ps(p0, p1, 0x00));
+            ab = _mm256_set_m128(_mm_shuffle_ps(p2, p3, 0x99), _mm_shuffle_ps(p0, p1, 0x99));
+        } else {
+            c = _mm256_set_m128(_mm_shuffle_ps(p2, p3, 0x55), _mm_shuffle_ps(p0, p1, 0x55));
+            ab = _mm256_set_m128(_mm_shuffle_ps(p2, p3, 0xEE), _mm_shuffle_ps(p0, p1, 0xEE));
+        }
+    }
+};
+
+// The three-multiply rotation of W points at once: c holds (c, c) per point,
+// ab holds (a, b) per point as the table stores them.
+template <class T, bool Inverse>
+__attribute__((target("avx"))) inline typename Avx<T>::reg rotate_avx(typename Avx<T>::reg z, typename Avx<T>::reg c,
+                                                                       typename Avx<T>::reg ab) {
+    using S = Avx<T>;
+    // re + im in the real lane, copied: the scalar form uses one m for both parts
+    const auto m = S::mul(S::dup_re(S::add(z, S::swap(z))), c);
+    // forward: (b im, a re); inverse: (a im, b re)
+    const auto coef = Inverse ? ab : S::swap(ab);
+    return S::add(m, S::mul(coef, S::swap(z)));
+}
+
+template <class T, bool Inverse>
+__attribute__((target("avx"))) void l_block_avx(T* x, size_t q, const T* tw, size_t stride) {
+    using S = Avx<T>;
+    T* x1 = x + 2 * q;
+    T* x2 = x + 4 * q;
+    T* x3 = x + 6 * q;
+    const size_t step = 6 * stride;
+    for (size_t k = 0; k < q; k += S::width) {
+        const size_t j = 2 * k;
+        const auto a0 = S::load(x + j), a1 = S::load(x1 + j), a2 = S::load(x2 + j), a3 = S::load(x3 + j);
+        const auto u = S::sub(a0, a2);
+        const auto w = S::swap(S::sub(a1, a3));
+        S::store(x + j, S::add(a0, a2));
+        S::store(x1 + j, S::add(a1, a3));
+        const auto plus = S::add(u, w);   // (ur + wi, ui + wr)
+        const auto minus = S::sub(u, w);  // (ur - wi, ui - wr)
+        auto z1 = Inverse ? S::re_im(minus, plus) : S::re_im(plus, minus);
+        auto z3 = Inverse ? S::re_im(plus, minus) : S::re_im(minus, plus);
+        const T* pair = tw + k * step;
+        typename S::reg c1, ab1, c3, ab3;
+        S::template triples<0>(pair, step, c1, ab1);
+        S::template triples<3>(pair, step, c3, ab3);
+        const auto r1 = rotate_avx<T, Inverse>(z1, c1, ab1);
+        const auto r3 = rotate_avx<T, Inverse>(z3, c3, ab3);
+        // index 0 is stored unrotated
+        z1 = k == 0 ? S::first_from(z1, r1) : r1;
+        z3 = k == 0 ? S::first_from(z3, r3) : r3;
+        S::store(x2 + j, z1);
+        S::store(x3 + j, z3);
+    }
+}
+
+bool have_avx() {
+    static const bool avx = __builtin_cpu_supports("avx");
+    return avx;
+}
+#endif
+
 // Depth first: a block of len points, then its half and its two quarters.
 // Blocks touch disjoint points, so this order does exactly the arithmetic of
 // the stage-by-stage walk while keeping small blocks in cache.
-template <class T, bool Inverse>
+template <class T, bool Inverse, bool Vector>
 void split_radix(T* x, size_t len, const T* tw, size_t n) {
-    if (len < 4) {
-        if (len == 2) two_point(x);
+    if (len <= 8) {
+        // the smallest blocks in line: no calls for the leaves
+        if (len == 8) {
+            l_block<T, Inverse>(x, 2, tw, n / 8);
+            l_block<T, Inverse>(x, 1, tw, n / 4);
+            two_point(x);
+            two_point(x + 8);
+            two_point(x + 12);
+        } else if (len == 4) {
+            l_block<T, Inverse>(x, 1, tw, n / 4);
+            two_point(x);
+        } else if (len == 2) {
+            two_point(x);
+        }
         return;
     }
-    l_block<T, Inverse>(x, len / 4, tw, n / len);
-    split_radix<T, Inverse>(x, len / 2, tw, n);
-    split_radix<T, Inverse>(x + len, len / 4, tw, n);
-    split_radix<T, Inverse>(x + 3 * len / 2, len / 4, tw, n);
+#ifdef VLX_FFT_AVX
+    if (Vector && len / 4 >= Avx<T>::width)
+        l_block_avx<T, Inverse>(x, len / 4, tw, n / len);
+    else
+#endif
+        l_block<T, Inverse>(x, len / 4, tw, n / len);
+    split_radix<T, Inverse, Vector>(x, len / 2, tw, n);
+    split_radix<T, Inverse, Vector>(x + len, len / 4, tw, n);
+    split_radix<T, Inverse, Vector>(x + 3 * len / 2, len / 4, tw, n);
+}
+
+template <class T, bool Inverse>
+void run_butterflies(T* x, size_t n, const T* tw) {
+#ifdef VLX_FFT_AVX
+    if (have_avx()) {
+        split_radix<T, Inverse, true>(x, n, tw, n);
+        return;
+    }
+#endif
+    split_radix<T, Inverse, false>(x, n, tw, n);
 }
 
 template <VlxVector V, bool Inverse>
@@ -190,7 +341,7 @@ int32_t native_fft(V* v) {
         const int32_t status = fft_table<V>(n, &tw);
         reader.release_lock();
         if (status < 0) return status;
-        split_radix<T, Inverse>(v->data, size_t(n), tw, size_t(n));
+        run_butterflies<T, Inverse>(v->data, size_t(n), tw);
     }
     // The reordering takes lock 0 for its lists: the counter must be down first.
     const int32_t status = Inverse ? bitrev(v) : bitrev_scale(v);
