@@ -6,6 +6,7 @@
 // transform and the median of the per-repetition ratios.  Each repetition is
 // a batch of forward + inverse round trips on the same buffer, refreshed from
 // the input at the same interval for both (FFTW's unscaled pair grows by N).
+// With --accuracy: relative L2 errors of both against a long-double transform.
 // With --benchmark_* arguments: the Google Benchmark cases instead.
 #include "libvlx.h"
 
@@ -13,10 +14,13 @@
 
 #include <algorithm>
 #include <chrono>
+#include <cmath>
+#include <complex>
 #include <cstdio>
 #include <cstring>
 #include <random>
 #include <string>
+#include <type_traits>
 #include <vector>
 
 #ifdef VLX_HAVE_FFTW
@@ -189,6 +193,61 @@ void interleaved_table(int reps) {
     }
 }
 
+using cld = std::complex<long double>;
+
+// Long-double radix 2 with each twiddle from the math library, forward, 1/N.
+void exact_forward(std::vector<cld>& x) {
+    const size_t n = x.size();
+    if (n == 1) return;
+    std::vector<cld> even(n / 2), odd(n / 2);
+    for (size_t j = 0; j < n / 2; ++j) even[j] = x[2 * j], odd[j] = x[2 * j + 1];
+    exact_forward(even);
+    exact_forward(odd);
+    const long double two_pi = 6.283185307179586476925286766559L;
+    for (size_t k = 0; k < n / 2; ++k) {
+        const cld t = std::polar(1.0L, -two_pi * k / n) * odd[k];
+        x[k] = (even[k] + t) / 2.0L;
+        x[k + n / 2] = (even[k] - t) / 2.0L;
+    }
+}
+
+template <class T>
+long double rel_l2(const T* got, const std::vector<cld>& want) {
+    long double num = 0, den = 0;
+    for (size_t k = 0; k < want.size(); ++k) {
+        const long double dr = got[2 * k] - want[k].real(), di = got[2 * k + 1] - want[k].imag();
+        num += dr * dr + di * di;
+        den += std::norm(want[k]);
+    }
+    return std::sqrt(num / den);
+}
+
+template <class V>
+void accuracy_table() {
+    using T = typename Ops<V>::T;
+    std::printf("\ncomplex %s forward, relative L2 error against long double\n", Ops<V>::name());
+    std::printf("%8s %12s %12s\n", "N", "libvlx", "FFTW");
+    for (int m = 6; m <= 20; m += 2) {
+        const size_t n = size_t(1) << m;
+        Ours<V> ours(n);
+        std::vector<cld> want(n);
+        for (size_t k = 0; k < n; ++k) want[k] = cld(ours.x[2 * k], ours.x[2 * k + 1]);
+        exact_forward(want);
+        Ops<V>::fft(&ours.v, 0);
+        const long double mine = rel_l2(ours.v.data, want);
+#ifdef VLX_HAVE_FFTW
+        Fftw<T> peer(n);
+        peer.refresh();
+        if constexpr (std::is_same_v<T, double>) fftw_execute(peer.fwd); else fftwf_execute(peer.fwd);
+        T* y = reinterpret_cast<T*>(peer.buf);
+        for (size_t i = 0; i < 2 * n; ++i) y[i] = y[i] * (T(1) / T(n));  // exact: a power of two
+        std::printf("%8zu %12.2e %12.2e\n", n, double(mine), double(rel_l2(y, want)));
+#else
+        std::printf("%8zu %12.2e %12s\n", n, double(mine), "-");
+#endif
+    }
+}
+
 template <class V>
 void bm_fft(benchmark::State& state) {
     Ours<V> ours(size_t(state.range(0)));
@@ -235,6 +294,13 @@ int main(int argc, char** argv) {
         benchmark::RunSpecifiedBenchmarks();
         benchmark::Shutdown();
         return 0;
+    }
+    for (int i = 1; i < argc; ++i) {
+        if (std::strcmp(argv[i], "--accuracy") == 0) {
+            accuracy_table<vlx_t>();
+            accuracy_table<vlxf_t>();
+            return 0;
+        }
     }
     interleaved_table<vlx_t>(reps);
     interleaved_table<vlxf_t>(reps);

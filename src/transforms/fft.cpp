@@ -295,7 +295,12 @@ void split_radix(T* x, size_t len, const T* tw, size_t n) {
     if (len <= 8) {
         // the smallest blocks in line: no calls for the leaves
         if (len == 8) {
-            l_block<T, Inverse>(x, 2, tw, n / 8);
+#ifdef VLX_FFT_AVX
+            if (Vector && Avx<T>::width == 2)
+                l_block_avx<T, Inverse>(x, 2, tw, n / 8);
+            else
+#endif
+                l_block<T, Inverse>(x, 2, tw, n / 8);
             l_block<T, Inverse>(x, 1, tw, n / 4);
             two_point(x);
             two_point(x + 8);
