@@ -358,6 +358,7 @@ int32_t native_fft(V* v) {
 template <VlxVector V>
 int32_t fft_table(int32_t n, const real_t<V>** table_out) {
     using T = real_t<V>;
+    if (n < 4) return -1;  // pair 0 alone needs length 4
     TwiddleState<V>& state = twiddle_state<V>;
     const int32_t size = 3 * (n / 2);
     for (int32_t i = 0; i < state.count; ++i) {
