@@ -179,6 +179,7 @@ struct Avx;
 
 template <>
 struct Avx<double> {
+    using scalar = double;
     using reg = __m256d;
     static constexpr size_t width = 2;
     __attribute__((target("avx"))) static reg load(const double* p) { return _mm256_loadu_pd(p); }
@@ -207,6 +208,7 @@ struct Avx<double> {
 
 template <>
 struct Avx<float> {
+    using scalar = float;
     using reg = __m256;
     static constexpr size_t width = 4;
     __attribute__((target("avx"))) static reg load(const float* p) { return _mm256_loadu_ps(p); }
@@ -236,12 +238,39 @@ struct Avx<float> {
     }
 };
 
+// Two complex floats in 128 bits, for blocks of quarter length 2.
+struct Sse2Floats {
+    using scalar = float;
+    using reg = __m128;
+    static constexpr size_t width = 2;
+    __attribute__((target("avx"))) static reg load(const float* p) { return _mm_loadu_ps(p); }
+    __attribute__((target("avx"))) static void store(float* p, reg v) { _mm_storeu_ps(p, v); }
+    __attribute__((target("avx"))) static reg add(reg a, reg b) { return _mm_add_ps(a, b); }
+    __attribute__((target("avx"))) static reg sub(reg a, reg b) { return _mm_sub_ps(a, b); }
+    __attribute__((target("avx"))) static reg mul(reg a, reg b) { return _mm_mul_ps(a, b); }
+    __attribute__((target("avx"))) static reg swap(reg v) { return _mm_permute_ps(v, 0xB1); }
+    __attribute__((target("avx"))) static reg dup_re(reg v) { return _mm_moveldup_ps(v); }
+    __attribute__((target("avx"))) static reg re_im(reg r, reg i) { return _mm_blend_ps(r, i, 0xA); }
+    __attribute__((target("avx"))) static reg first_from(reg a, reg b) { return _mm_blend_ps(b, a, 0x3); }
+    template <int Offset>
+    __attribute__((target("avx"))) static void triples(const float* t, size_t step, reg& c, reg& ab) {
+        constexpr int at = Offset == 0 ? 0 : 2;
+        const __m128 p0 = _mm_loadu_ps(t + at), p1 = _mm_loadu_ps(t + step + at);
+        if constexpr (Offset == 0) {
+            c = _mm_shuffle_ps(p0, p1, 0x00);
+            ab = _mm_shuffle_ps(p0, p1, 0x99);
+        } else {
+            c = _mm_shuffle_ps(p0, p1, 0x55);
+            ab = _mm_shuffle_ps(p0, p1, 0xEE);
+        }
+    }
+};
+
 // The three-multiply rotation of W points at once: c holds (c, c) per point,
 // ab holds (a, b) per point as the table stores them.
-template <class T, bool Inverse>
-__attribute__((target("avx"))) inline typename Avx<T>::reg rotate_avx(typename Avx<T>::reg z, typename Avx<T>::reg c,
-                                                                       typename Avx<T>::reg ab) {
-    using S = Avx<T>;
+template <class S, bool Inverse>
+__attribute__((target("avx"))) inline typename S::reg rotate_simd(typename S::reg z, typename S::reg c,
+                                                                   typename S::reg ab) {
     // re + im in the real lane, copied: the scalar form uses one m for both parts
     const auto m = S::mul(S::dup_re(S::add(z, S::swap(z))), c);
     // forward: (b im, a re); inverse: (a im, b re)
@@ -249,9 +278,10 @@ __attribute__((target("avx"))) inline typename Avx<T>::reg rotate_avx(typename A
     return S::add(m, S::mul(coef, S::swap(z)));
 }
 
-template <class T, bool Inverse>
-__attribute__((target("avx"))) void l_block_avx(T* x, size_t q, const T* tw, size_t stride) {
-    using S = Avx<T>;
+template <class S, bool Inverse>
+__attribute__((target("avx"))) void l_block_simd(typename S::scalar* x, size_t q, const typename S::scalar* tw,
+                                                  size_t stride) {
+    using T = typename S::scalar;
     T* x1 = x + 2 * q;
     T* x2 = x + 4 * q;
     T* x3 = x + 6 * q;
@@ -271,14 +301,23 @@ __attribute__((target("avx"))) void l_block_avx(T* x, size_t q, const T* tw, siz
         typename S::reg c1, ab1, c3, ab3;
         S::template triples<0>(pair, step, c1, ab1);
         S::template triples<3>(pair, step, c3, ab3);
-        const auto r1 = rotate_avx<T, Inverse>(z1, c1, ab1);
-        const auto r3 = rotate_avx<T, Inverse>(z3, c3, ab3);
+        const auto r1 = rotate_simd<S, Inverse>(z1, c1, ab1);
+        const auto r3 = rotate_simd<S, Inverse>(z3, c3, ab3);
         // index 0 is stored unrotated
         z1 = k == 0 ? S::first_from(z1, r1) : r1;
         z3 = k == 0 ? S::first_from(z3, r3) : r3;
         S::store(x2 + j, z1);
         S::store(x3 + j, z3);
     }
+}
+
+// Quarter length 2 in 128 bits: two doubles hold one point, so only floats.
+template <class T, bool Inverse>
+void l_block_of_two(T* x, const T* tw, size_t stride) {
+    if constexpr (std::is_same_v<T, float>)
+        l_block_simd<Sse2Floats, Inverse>(x, 2, tw, stride);
+    else
+        l_block_simd<Avx<double>, Inverse>(x, 2, tw, stride);
 }
 
 bool have_avx() {
@@ -296,8 +335,8 @@ void split_radix(T* x, size_t len, const T* tw, size_t n) {
         // the smallest blocks in line: no calls for the leaves
         if (len == 8) {
 #ifdef VLX_FFT_AVX
-            if (Vector && Avx<T>::width == 2)
-                l_block_avx<T, Inverse>(x, 2, tw, n / 8);
+            if (Vector)
+                l_block_of_two<T, Inverse>(x, tw, n / 8);
             else
 #endif
                 l_block<T, Inverse>(x, 2, tw, n / 8);
@@ -315,7 +354,7 @@ void split_radix(T* x, size_t len, const T* tw, size_t n) {
     }
 #ifdef VLX_FFT_AVX
     if (Vector && len / 4 >= Avx<T>::width)
-        l_block_avx<T, Inverse>(x, len / 4, tw, n / len);
+        l_block_simd<Avx<T>, Inverse>(x, len / 4, tw, n / len);
     else
 #endif
         l_block<T, Inverse>(x, len / 4, tw, n / len);
