@@ -238,8 +238,8 @@ struct Avx<float> {
     }
 };
 
-// Two complex floats in 128 bits, for blocks of quarter length 2.
-struct Sse2Floats {
+// Two complex floats in 128 bits (VEX-encoded), for blocks of quarter length 2.
+struct Floats128 {
     using scalar = float;
     using reg = __m128;
     static constexpr size_t width = 2;
@@ -315,7 +315,7 @@ __attribute__((target("avx"))) void l_block_simd(typename S::scalar* x, size_t q
 template <class T, bool Inverse>
 void l_block_of_two(T* x, const T* tw, size_t stride) {
     if constexpr (std::is_same_v<T, float>)
-        l_block_simd<Sse2Floats, Inverse>(x, 2, tw, stride);
+        l_block_simd<Floats128, Inverse>(x, 2, tw, stride);
     else
         l_block_simd<Avx<double>, Inverse>(x, 2, tw, stride);
 }
