@@ -311,7 +311,7 @@ __attribute__((target("avx"))) void l_block_simd(typename S::scalar* x, size_t q
     }
 }
 
-// Quarter length 2 in 128 bits: two doubles hold one point, so only floats.
+// Quarter length 2: one AVX vector of doubles, or 128 bits of floats.
 template <class T, bool Inverse>
 void l_block_of_two(T* x, const T* tw, size_t stride) {
     if constexpr (std::is_same_v<T, float>)
