@@ -173,6 +173,34 @@ VLX_API int32_t vlxf_version(void);
 
 /* --- complex and real power-of-two transforms --- */
 
+/* Complex transform in place, points a power of two (else -1, nothing
+ * changed); inverse 0 is forward with 1/N, non-zero inverse unscaled.  A real
+ * vector becomes complex, except with 1 point. */
+VLX_API int32_t vlxi_fft(vlx_t* v, int32_t inverse);
+VLX_API int32_t vlxfi_fft(vlxf_t* v, int32_t inverse);
+/* Reorders real or complex points into bit-reversed order; points a power of two. */
+VLX_API int32_t vlxi_bitrev(vlx_t* v);
+VLX_API int32_t vlxfi_bitrev(vlxf_t* v);
+/* As vlxi_bitrev, multiplying every sample by 1/points in the same pass. */
+VLX_API int32_t vlxi_bitrev_scale(vlx_t* v);
+VLX_API int32_t vlxfi_bitrev_scale(vlxf_t* v);
+/* Real vector of N points (a power of two) to its half spectrum in place:
+ * N/2 + 1 complex bins with 1/N, Nyquist as the last bin.  -1 if complex. */
+VLX_API int32_t vlxi_rfft(vlx_t* v);
+VLX_API int32_t vlxfi_rfft(vlxf_t* v);
+/* Half spectrum of P points back to 2(P - 1) real samples (a power of two),
+ * through the full spectrum and the inverse complex transform. */
+VLX_API int32_t vlxi_irfft(vlx_t* v);
+VLX_API int32_t vlxfi_irfft(vlxf_t* v);
+/* Extends a half spectrum of P points in place to the full one: 2(P - 1)
+ * points, plus 1 if odd is non-zero; conjugate mirror (plain mirror for a
+ * real vector).  P < 2 (P < 3 with odd 0) is left alone. */
+VLX_API int32_t vlxi_orecon(vlx_t* v, int32_t odd);
+VLX_API int32_t vlxfi_orecon(vlxf_t* v, int32_t odd);
+/* The same as vlxi_orecon(v, 0). */
+VLX_API int32_t vlxi_recon(vlx_t* v);
+VLX_API int32_t vlxfi_recon(vlxf_t* v);
+
 
 /* --- any length, cosine transform, analytic signal --- */
 

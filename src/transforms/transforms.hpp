@@ -8,6 +8,38 @@ namespace vlx {
 
 // ---- fast transform core, bit reversal, real transforms ----
 
+// 1, 2, 4, ...; a length of 0 or less is not a power of two.
+inline bool is_power_of_two(int32_t n) { return n > 0 && (n & (n - 1)) == 0; }
+// log2 of a power of two.
+inline int32_t log2_of(int32_t n) {
+    int32_t m = 0;
+    while ((int32_t(1) << m) < n) ++m;
+    return m;
+}
+
+// cos(pi/4) as the transforms store it: the double value, rounded for floats.
+template <VlxVector V>
+inline constexpr real_t<V> fft_sqrt_half =
+    std::is_same_v<V, vlx_t> ? real_t<V>(0.7071067811865476) : real_t<V>(0.70710677f);
+
+// Seam of the optional vendor transform binding: dft_bound_fast() is its entry
+// check (binding on first use), dft_fast_transform() its path.  Until the
+// binding exists, power-of-two transforms always take the native engines.
+template <VlxVector V> inline bool dft_bound_fast() { return false; }
+template <VlxVector V> inline int32_t dft_fast_transform(V*, int32_t /*inverse*/, int32_t /*complex_domain*/) {
+    return -1;
+}
+
+// Twiddle table of length n (3n/2 scalars: n/4 pairs of rotation triples),
+// found or built; the caller holds lock 0 and keeps the active counter raised
+// while it reads the table.  0, or -1 if memory ran out.
+template <VlxVector V> int32_t fft_table(int32_t n, const real_t<V>** table_out);
+// Native engines, n >= 4: the complex transform in both directions (forward
+// carries 1/N) and the real transform to the half spectrum.
+template <VlxVector V> int32_t fft_forward(V* v);
+template <VlxVector V> int32_t fft_inverse(V* v);
+template <VlxVector V> int32_t fft_real_forward(V* v);
+
 // Complex power-of-two transform in place (vlxi_fft): forward carries 1/N.
 template <VlxVector V> int32_t fft(V* v, int32_t inverse);
 // Reorder into bit-reversed order (vlxi_bitrev); the same, times 1/N (vlxi_bitrev_scale).

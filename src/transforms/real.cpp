@@ -1,0 +1,226 @@
+// Real power-of-two transforms and half spectra: the split-radix decimation
+// in time for real data, which builds the half spectrum in natural order
+// without a complex transform, its inverse through the complex engine, and
+// the reconstruction of a full spectrum from a half one.
+#include "core/frame.hpp"
+#include "elementwise/elementwise.hpp"
+#include "transforms/fft_simd.hpp"
+#include "transforms/transforms.hpp"
+
+#include <limits>
+
+namespace vlx {
+namespace {
+
+#ifdef VLX_FFT_AVX
+// The general elements k of a block, W at a time, for as long as W of them
+// remain; returns the first k left over.  Lane i holds element k + i: the
+// mirrored points p + h - k - i and p + 2h - k - i are read and written in
+// reverse.  Each lane does the scalar arithmetic of real_block.
+template <class S>
+__attribute__((target("avx"))) int64_t real_elements_simd(typename S::scalar* e, int64_t h,
+                                                          const typename S::scalar* tw, int64_t stride) {
+    using T = typename S::scalar;
+    constexpr int64_t w = S::width;
+    const T* o1 = e + 4 * h;
+    const T* o3 = e + 6 * h;
+    const size_t step = 6 * size_t(stride);
+    int64_t k = 1;
+    for (; k + w - 1 < h / 2; k += w) {
+        const int64_t j = 2 * k;
+        typename S::reg c1, ab1, c3, ab3;
+        S::template triples<0>(tw + size_t(k) * step, step, c1, ab1);
+        S::template triples<3>(tw + size_t(k) * step, step, c3, ab3);
+        const auto w1 = fft_simd::rotate_simd<S, false>(S::load(o1 + j), c1, ab1);
+        const auto w3 = fft_simd::rotate_simd<S, false>(S::load(o3 + j), c3, ab3);
+        const auto sum = S::add(w1, w3);
+        const auto dsw = S::swap(S::sub(w3, w1));  // (D.im, D.re)
+        const auto e1 = S::load(e + j);
+        T* at2 = e + 2 * (h - k - w + 1);
+        const auto e2 = S::reverse(S::load(at2));
+        S::store(e + j, S::add(e1, sum));
+        S::store(e + 2 * (2 * h - k - w + 1), S::reverse(S::re_im(S::sub(e1, sum), S::sub(sum, e1))));
+        S::store(at2, S::reverse(S::add(e2, dsw)));
+        S::store(e + 2 * (h + k), S::re_im(S::sub(e2, dsw), S::sub(dsw, e2)));
+    }
+    return k;
+}
+#endif
+
+// One block of n = 4h points at point p: from the half spectra of its even
+// part (p .. p+h), and of its two quarter parts (p+2h .. p+2h+h/2 and
+// p+3h .. p+3h+h/2) to its own half spectrum (p .. p+2h).
+template <VlxVector V>
+void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t stride, bool vector) {
+    using T = real_t<V>;
+    T* e = x + 2 * p;
+    T* o1 = e + 4 * h;
+    T* o3 = e + 6 * h;
+
+    const T x0 = e[0], x2 = o1[0], x3 = o3[0];
+    const T t = x3 + x2;
+    e[0] = x0 + t;
+    o1[0] = x0 - t;
+    e[2 * h + 1] = x3 - x2;
+
+    int64_t k = 1;
+#ifdef VLX_FFT_AVX
+    if (vector) k = real_elements_simd<fft_simd::Avx<T>>(e, h, tw, stride);
+#else
+    (void)vector;
+#endif
+    for (; k < h / 2; ++k) {
+        const T* pair = tw + 6 * k * stride;
+        const int64_t j = 2 * k;
+        T re = o1[j], im = o1[j + 1];
+        T m = (re + im) * pair[0];
+        const T w1r = m + pair[2] * im, w1i = m + pair[1] * re;
+        re = o3[j], im = o3[j + 1];
+        m = (re + im) * pair[3];
+        const T w3r = m + pair[5] * im, w3i = m + pair[4] * re;
+        const T sr = w1r + w3r, si = w1i + w3i;
+        const T dr = w3r - w1r, di = w3i - w1i;
+        T* e1 = e + j;
+        T* e2 = e + 2 * (h - k);
+        const T e1r = e1[0], e1i = e1[1], e2r = e2[0], e2i = e2[1];
+        e1[0] = e1r + sr;
+        e1[1] = e1i + si;
+        T* mirror1 = e + 2 * (2 * h - k);
+        mirror1[0] = e1r - sr;
+        mirror1[1] = si - e1i;
+        e2[0] = e2r + di;
+        e2[1] = dr + e2i;
+        T* mirror2 = e + 2 * (h + k);
+        mirror2[0] = e2r - di;
+        mirror2[1] = dr - e2i;
+    }
+
+    if (h >= 2) {
+        // the pi/4 point: only the real parts of the quarter parts' Nyquist bins
+        const int64_t j = h;  // scalar index of point h/2
+        const T r = fft_sqrt_half<V>;
+        const T u = -r * o3[j];
+        const T v = r * o1[j];
+        const T er = e[j], ei = e[j + 1];
+        e[j] = er + (u + v);
+        e[j + 1] = (u - v) + ei;
+        T* mirror = e + 2 * h + j;
+        mirror[0] = er - (u + v);
+        mirror[1] = (u - v) - ei;
+    }
+}
+
+}  // namespace
+
+template <VlxVector V>
+int32_t fft_real_forward(V* v) {
+    using T = real_t<V>;
+    // Reordered and scaled while still real: half the samples to move.
+    if (bitrev_scale(v) < 0 || rtoc(v) < 0) return -1;
+    const int64_t n = v->points;
+    const int32_t m = log2_of(v->points);
+    TableReader reader;
+    const T* tw = nullptr;
+    const int32_t status = fft_table<V>(v->points, &tw);
+    reader.release_lock();
+    if (status < 0) return status;
+    T* x = v->data;
+#ifdef VLX_FFT_AVX
+    const bool vector = fft_simd::have_avx();
+#else
+    const bool vector = false;
+#endif
+
+    for (int64_t pos = 0, spacing = 4, c = (n + 2) / 4; c > 0; pos = 4 * pos + 6, spacing *= 4, c = (c + 2) / 4) {
+        for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) {
+            const T a = x[2 * p], b = x[2 * p + 2];
+            x[2 * p] = a + b;
+            x[2 * p + 2] = a - b;
+        }
+    }
+    for (int32_t s = 0; s <= m - 2; ++s) {
+        const int64_t h = int64_t(1) << s;
+        const int64_t stride = n / (4 * h);
+        for (int64_t pos = 0, spacing = 8, c = (stride + 1) / 2; c > 0;
+             pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
+            for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) real_block<V>(x, p * h, h, tw, stride, vector);
+        }
+    }
+    v->points = static_cast<int32_t>(n / 2 + 1);
+    return 0;
+}
+
+template <VlxVector V>
+int32_t rfft(V* v) {
+    using T = real_t<V>;
+    if (dft_bound_fast<V>()) return dft_fast_transform(v, 0, 0);
+    if (v->complex) return -1;
+    const int32_t n = v->points;
+    if (!is_power_of_two(n)) return -1;
+    if (n == 2) {
+        if (rtoc(v) < 0) return -1;
+        T* x = v->data;
+        const T a = x[0], b = x[2];
+        x[0] = (a + b) * T(0.5);
+        x[1] = 0;
+        x[2] = (a - b) * T(0.5);
+        x[3] = 0;
+    } else if (n > 2) {
+        if (fft_real_forward(v) < 0) return -1;
+    }
+    set_transform_delta(v, n);
+    return 0;
+}
+
+template <VlxVector V>
+int32_t orecon(V* v, int32_t odd) {
+    using T = real_t<V>;
+    const int32_t p = v->points;
+    if (p < 2 || (odd == 0 && p < 3)) return 0;
+    const int64_t full = 2 * (int64_t(p) - 1) + (odd != 0 ? 1 : 0);
+    if (full > std::numeric_limits<int32_t>::max()) return -1;
+    v->points = static_cast<int32_t>(full);
+    if (realloc(v, p, v->complex) < 0) return -1;
+    T* x = v->data;
+    // Odd lengths mirror bins p-1 .. 1; even ones p-2 .. 1 (the Nyquist bin
+    // has no mirror).
+    int64_t from = odd != 0 ? p - 1 : p - 2;
+    if (v->complex) {
+        for (int64_t i = p; i < full; ++i, --from) {
+            x[2 * i] = x[2 * from];
+            x[2 * i + 1] = -x[2 * from + 1];
+        }
+    } else {
+        for (int64_t i = p; i < full; ++i, --from) x[i] = x[from];
+    }
+    return 0;
+}
+
+template <VlxVector V>
+int32_t irfft(V* v) {
+    // No scaling: the forward side carries 1/N.
+    if (orecon(v, 0) < 0 || fft(v, 1) < 0 || real_part(v) < 0) return -1;
+    return 0;
+}
+
+#define VLX_INSTANTIATE(V)                              \
+    template int32_t fft_real_forward<V>(V*);           \
+    template int32_t rfft<V>(V*);                       \
+    template int32_t irfft<V>(V*);                      \
+    template int32_t orecon<V>(V*, int32_t);
+VLX_INSTANTIATE(vlx_t)
+VLX_INSTANTIATE(vlxf_t)
+#undef VLX_INSTANTIATE
+
+}  // namespace vlx
+
+extern "C" {
+VLX_API int32_t vlxi_rfft(vlx_t* v) { return vlx::rfft(v); }
+VLX_API int32_t vlxfi_rfft(vlxf_t* v) { return vlx::rfft(v); }
+VLX_API int32_t vlxi_irfft(vlx_t* v) { return vlx::irfft(v); }
+VLX_API int32_t vlxfi_irfft(vlxf_t* v) { return vlx::irfft(v); }
+VLX_API int32_t vlxi_orecon(vlx_t* v, int32_t odd) { return vlx::orecon(v, odd); }
+VLX_API int32_t vlxfi_orecon(vlxf_t* v, int32_t odd) { return vlx::orecon(v, odd); }
+VLX_API int32_t vlxi_recon(vlx_t* v) { return vlx::orecon(v, 0); }
+VLX_API int32_t vlxfi_recon(vlxf_t* v) { return vlx::orecon(v, 0); }
+}

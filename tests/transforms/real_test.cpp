@@ -1,0 +1,149 @@
+// Real transforms, half spectra and their reconstruction.
+#include "fft_reference.hpp"
+
+#include <cmath>
+#include <limits>
+
+using namespace vlxtest;
+using namespace fftref;
+
+namespace {
+
+template <class V>
+class RealFft : public ::testing::Test {};
+TYPED_TEST_SUITE(RealFft, Families);
+
+// The vectorised engine against the literal recipe, bit for bit.
+TYPED_TEST(RealFft, MatchesLiteralEngineBitForBit) {
+    using T = real_of<TypeParam>;
+    for (int m = 2; m <= 16; ++m) {
+        const std::vector<T> in = random_values<T>(size_t(1) << m, 300 + m);
+        const std::vector<T> want = literal_rfft(in);
+        Vec<TypeParam> v(in, false);
+        ASSERT_EQ(t_rfft(&v), 0);
+        ASSERT_EQ(v.scalars(), int64_t(want.size()));
+        size_t mismatches = 0;
+        for (size_t i = 0; i < want.size(); ++i) mismatches += !same_bits(v[int64_t(i)], want[i]);
+        EXPECT_EQ(mismatches, 0u) << "n = " << in.size();
+    }
+}
+
+// The half spectrum against long double, and against the complex engine on
+// the same data; then the inverse brings the samples back.
+TYPED_TEST(RealFft, AccuracyAndRoundTrip) {
+    using T = real_of<TypeParam>;
+    const double eps = std::numeric_limits<T>::epsilon();
+    for (int m = 0; m <= 16; ++m) {
+        const size_t n = size_t(1) << m;
+        const std::vector<T> in = random_values<T>(n, 40 + m);
+        std::vector<cld> x(n);
+        for (size_t k = 0; k < n; ++k) x[k] = in[k];
+        const std::vector<cld> want = exact_dft(x, false);
+        const double tol = transform_tolerance(eps, m);
+
+        Vec<TypeParam> v(in, false), c(in, false);
+        ASSERT_EQ(t_rfft(&v), 0);
+        if (n == 1) {
+            EXPECT_EQ(v->complex, 0);
+            EXPECT_EQ(v.values(), in);
+            continue;
+        }
+        ASSERT_EQ(v->points, int32_t(n / 2 + 1));
+        ASSERT_EQ(v->complex, 1);
+        const std::vector<cld> half(want.begin(), want.begin() + n / 2 + 1);
+        EXPECT_LE(double(rel_l2(v.get()->data, half, n / 2 + 1)), tol) << "n = " << n;
+        EXPECT_EQ(v[1], T(0));  // bin 0 is real
+        EXPECT_EQ(v[int64_t(n) + 1], T(0));  // and so is the Nyquist bin
+
+        ASSERT_EQ(t_fft(&c, 0), 0);
+        std::vector<cld> from_complex(n / 2 + 1);
+        for (size_t k = 0; k <= n / 2; ++k) from_complex[k] = cld(c[2 * k], c[2 * k + 1]);
+        EXPECT_LE(double(rel_l2(v.get()->data, from_complex, n / 2 + 1)), 2 * tol) << "n = " << n;
+
+        v->delta = T(0.125);
+        ASSERT_EQ(t_irfft(&v), 0);
+        ASSERT_EQ(v->points, int32_t(n));
+        ASSERT_EQ(v->complex, 0);
+        EXPECT_EQ(v->delta, T(1) / (T(n) * T(0.125)));
+        std::vector<cld> back(n);
+        std::vector<T> interleaved(2 * n);
+        for (size_t k = 0; k < n; ++k) interleaved[2 * k] = v[k], interleaved[2 * k + 1] = 0;
+        for (size_t k = 0; k < n; ++k) back[k] = in[k];
+        EXPECT_LE(double(rel_l2(interleaved.data(), back, n)), 3 * tol) << "n = " << n;
+    }
+}
+
+TYPED_TEST(RealFft, ExactSmallLengths) {
+    using T = real_of<TypeParam>;
+    struct Case {
+        std::vector<T> in;
+        std::vector<T> out;
+    };
+    const Case cases[] = {
+        {{1, 3}, {2, 0, -1, 0}},
+        {{1, 2, 3, 4}, {2.5, 0, -0.5, 0.5, -0.5, 0}},
+        {{1, 1, 1, 1, 1, 1, 1, 1}, {1, 0, 0, 0, 0, 0, 0, 0, 0, 0}},
+        {{8, 0, 0, 0, 0, 0, 0, 0}, {1, 0, 1, 0, 1, 0, 1, 0, 1, 0}},
+    };
+    for (const Case& c : cases) {
+        Vec<TypeParam> v(c.in, false);
+        v->delta = T(0);
+        ASSERT_EQ(t_rfft(&v), 0);
+        EXPECT_EQ(v->complex, 1);
+        EXPECT_EQ(v.values(), c.out);
+        EXPECT_EQ(v->delta, is_double<TypeParam> ? T(1e100) : T(999999986991104.0f));
+    }
+    // A vector with room for its 8 real samples grows to the 16 scalars the
+    // transform works in, although only 5 points remain.
+    Vec<TypeParam> v(random_values<T>(8, 2), false);
+    ASSERT_EQ(v->alloc, 8);
+    ASSERT_EQ(t_rfft(&v), 0);
+    EXPECT_EQ(v->alloc, 16);
+    EXPECT_EQ(v->points, 5);
+}
+
+TYPED_TEST(RealFft, Rejects) {
+    using T = real_of<TypeParam>;
+    const std::vector<T> in = random_values<T>(8, 4);
+    Vec<TypeParam> cplx(in, true), odd(std::vector<T>(in.begin(), in.begin() + 6), false), empty;
+    EXPECT_EQ(t_rfft(&cplx), -1);
+    EXPECT_EQ(cplx.values(), in);
+    EXPECT_EQ(cplx->points, 4);
+    EXPECT_EQ(t_rfft(&odd), -1);
+    EXPECT_EQ(odd->complex, 0);
+    EXPECT_EQ(odd->points, 6);
+    EXPECT_EQ(t_rfft(&empty), -1);
+}
+
+TYPED_TEST(RealFft, Reconstruction) {
+    using T = real_of<TypeParam>;
+    struct Case {
+        std::vector<T> in;
+        bool cplx;
+        int odd;
+        std::vector<T> out;
+    };
+    const Case cases[] = {
+        {{1, 2, 3, 4}, true, 0, {1, 2, 3, 4}},                  // 2 points: nothing to mirror
+        {{1, 2, 3, 4}, true, 1, {1, 2, 3, 4, 3, -4}},           // odd: point 1 mirrored
+        {{7, 0}, true, 1, {7, 0}},                               // a single point stays
+        {{0, 0, 1, 1, 2, 2, 3, 3, 4, 0}, true, 0, {0, 0, 1, 1, 2, 2, 3, 3, 4, 0, 3, -3, 2, -2, 1, -1}},
+        {{0, 0, 1, 1, 2, 2}, true, 1, {0, 0, 1, 1, 2, 2, 2, -2, 1, -1}},
+        {{0, 1, 2, 3}, false, 0, {0, 1, 2, 3, 2, 1}},           // real: mirrored as is
+        {{0, 1, 2}, false, 1, {0, 1, 2, 2, 1}},
+    };
+    for (const Case& c : cases) {
+        Vec<TypeParam> v(c.in, c.cplx);
+        v->delta = T(2);
+        ASSERT_EQ(t_orecon(&v, c.odd), 0);
+        EXPECT_EQ(v.values(), c.out) << c.in.size() << " scalars, odd " << c.odd;
+        EXPECT_EQ(v->delta, T(2));
+        if (c.odd == 0) {
+            Vec<TypeParam> w(c.in, c.cplx);
+            ASSERT_EQ(t_recon(&w), 0);
+            EXPECT_EQ(w.values(), c.out);
+        }
+    }
+}
+
+}  // namespace
