@@ -17,7 +17,10 @@
 namespace vlx::stats::avx {
 
 inline bool available() {
-    static const bool has = __builtin_cpu_supports("avx");
+    static const bool has = [] {
+        __builtin_cpu_init();  // may run before the runtime's own constructor
+        return __builtin_cpu_supports("avx") != 0;
+    }();
     return has;
 }
 

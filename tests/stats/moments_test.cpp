@@ -67,23 +67,23 @@ TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
         const long double var = s2 / n;
         struct Row {
             const char* name;
-            std::function<StatResult<TypeParam>(Vec<TypeParam>&)> fn;
+            StatFn<TypeParam> fn;
             long double expected;
             long double scale = 0;  // what the ulps are counted in, if not the result
         };
         const Row rows[] = {
-            {"sum", [](auto& v) { return stat(STAT(t_sum), v); }, s1},
-            {"mean", [](auto& v) { return stat(STAT(t_mean), v); }, m},
-            {"magsq_sum", [](auto& v) { return stat(STAT(t_magsq_sum), v); }, sq},
-            {"rms", [](auto& v) { return stat(STAT(t_rms), v); }, std::sqrt(sq / n)},
-            {"pop_var", [](auto& v) { return stat(STAT(t_pop_var), v); }, var},
-            {"samp_var", [](auto& v) { return stat(STAT(t_samp_var), v); }, s2 / (n - 1)},
-            {"pop_stddev", [](auto& v) { return stat(STAT(t_pop_stddev), v); }, std::sqrt(var)},
-            {"samp_stddev", [](auto& v) { return stat(STAT(t_samp_stddev), v); }, std::sqrt(s2 / (n - 1))},
-            {"skew", [](auto& v) { return stat(STAT(t_skew), v); }, (s3 / n) / (var * std::sqrt(var))},
-            {"excess", [](auto& v) { return stat(STAT(t_excess), v); }, (s4 / n) / (var * var) - 3, (s4 / n) / (var * var)},
-            {"gmean", [](auto& v) { return stat(STAT(t_gmean), v); }, std::exp(logs / n)},
-            {"hmean", [](auto& v) { return stat(STAT(t_hmean), v); }, n / inv},
+            {"sum", STAT(t_sum), s1},
+            {"mean", STAT(t_mean), m},
+            {"magsq_sum", STAT(t_magsq_sum), sq},
+            {"rms", STAT(t_rms), std::sqrt(sq / n)},
+            {"pop_var", STAT(t_pop_var), var},
+            {"samp_var", STAT(t_samp_var), s2 / (n - 1)},
+            {"pop_stddev", STAT(t_pop_stddev), std::sqrt(var)},
+            {"samp_stddev", STAT(t_samp_stddev), std::sqrt(s2 / (n - 1))},
+            {"skew", STAT(t_skew), (s3 / n) / (var * std::sqrt(var))},
+            {"excess", STAT(t_excess), (s4 / n) / (var * var) - 3, (s4 / n) / (var * var)},
+            {"gmean", STAT(t_gmean), std::exp(logs / n)},
+            {"hmean", STAT(t_hmean), n / inv},
         };
         const double tolerance = 8.0 + 2.0 * std::sqrt(static_cast<double>(std::min<int64_t>(n, kBlock)));
         for (const Row& row : rows) {
@@ -114,7 +114,7 @@ TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
         T running = T(0);
         for (T v : x) running += v;
         ASSERT_EQ(running, T(1));
-        EXPECT_TRUE(same_bits(stat(STAT(t_sum), src).re, T(1) + T(kBlock) * tiny));
+        EXPECT_TRUE(same_bits(STAT(t_sum)(src).re, T(1) + T(kBlock) * tiny));
     }
     for (const int64_t n : {int64_t(1), int64_t(kBlock), int64_t(kBlock + 1), int64_t(8 * kBlock),
                             int64_t(19 * kBlock + 333)}) {
@@ -123,15 +123,15 @@ TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
         Vec<TypeParam> re(std::vector<T>(x.begin(), x.begin() + n), false);
         Vec<TypeParam> cx(x, true);
         const T* v = x.data();
-        EXPECT_TRUE(same_bits(stat(STAT(t_sum), re).re, blockwise<T>(n, [v](int64_t i) { return v[i]; })));
-        const auto cs = stat(STAT(t_sum), cx);
+        EXPECT_TRUE(same_bits(STAT(t_sum)(re).re, blockwise<T>(n, [v](int64_t i) { return v[i]; })));
+        const auto cs = STAT(t_sum)(cx);
         EXPECT_TRUE(same_bits(cs.re, blockwise<T>(n, [v](int64_t i) { return v[2 * i]; })));
         EXPECT_TRUE(same_bits(cs.im, blockwise<T>(n, [v](int64_t i) { return v[2 * i + 1]; })));
         const T r = T(1) / static_cast<T>(n);
-        EXPECT_TRUE(same_bits(stat(STAT(t_mean), re).re, blockwise<T>(n, [v](int64_t i) { return v[i]; }) * r));
+        EXPECT_TRUE(same_bits(STAT(t_mean)(re).re, blockwise<T>(n, [v](int64_t i) { return v[i]; }) * r));
         const T sq = blockwise<T>(n, [v, b](int64_t i) { return std::fabs(v[i]) > b ? b : v[i] * v[i]; });
-        EXPECT_TRUE(same_bits(stat(STAT(t_magsq_sum), re).re, sq)) << n;
-        EXPECT_TRUE(same_bits(stat(STAT(t_rms), re).re, std::sqrt(sq / static_cast<T>(n))));
+        EXPECT_TRUE(same_bits(STAT(t_magsq_sum)(re).re, sq)) << n;
+        EXPECT_TRUE(same_bits(STAT(t_rms)(re).re, std::sqrt(sq / static_cast<T>(n))));
         // variance about the pivot of the first, middle and last samples
         const T third = is_double<TypeParam> ? T(0.3333333333333333) : T(0.33333334f);
         const T p = (v[n / 2] + v[0] + v[n - 1]) * third;
@@ -140,7 +140,7 @@ TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
             const T d = saturated(v[i] - p, b);
             return d * d;
         });
-        EXPECT_TRUE(same_bits(stat(STAT(t_pop_var), re).re, r * S2 - (r * S1) * (r * S1))) << n;
+        EXPECT_TRUE(same_bits(STAT(t_pop_var)(re).re, r * S2 - (r * S1) * (r * S1))) << n;
     }
 }
 
@@ -149,19 +149,7 @@ TYPED_TEST(Moments, FixedResults) {
     using T = real_of<TypeParam>;
     constexpr T b = bound_of<TypeParam>();
     const T nan = std::numeric_limits<T>::quiet_NaN();
-    using Fn = std::function<StatResult<TypeParam>(Vec<TypeParam>&)>;
-    const Fn sum = [](auto& v) { return stat(STAT(t_sum), v); };
-    const Fn mean = [](auto& v) { return stat(STAT(t_mean), v); };
-    const Fn magsq = [](auto& v) { return stat(STAT(t_magsq_sum), v); };
-    const Fn pvar = [](auto& v) { return stat(STAT(t_pop_var), v); };
-    const Fn svar = [](auto& v) { return stat(STAT(t_samp_var), v); };
-    const Fn skew = [](auto& v) { return stat(STAT(t_skew), v); };
-    const Fn excess = [](auto& v) { return stat(STAT(t_excess), v); };
-    const Fn gmean = [](auto& v) { return stat(STAT(t_gmean), v); };
-    const Fn hmean = [](auto& v) { return stat(STAT(t_hmean), v); };
-    const Fn min = [](auto& v) { return stat(STAT(t_min), v); };
-    const Fn max = [](auto& v) { return stat(STAT(t_max), v); };
-    const Fn median = [](auto& v) { return stat(STAT(t_median), v); };
+    using Fn = StatFn<TypeParam>;
     struct Row {
         const char* what;
         Fn fn;
@@ -170,36 +158,36 @@ TYPED_TEST(Moments, FixedResults) {
         T re, im;
     };
     const Row rows[] = {
-        {"empty sum", sum, {}, true, 0, 0},
-        {"empty mean", mean, {}, false, 0, 0},
-        {"empty variance", pvar, {}, false, 0, 0},
-        {"empty skew", skew, {}, false, 0, 0},
-        {"empty excess", excess, {}, false, -3, 0},
-        {"empty gmean", gmean, {}, true, 0, 0},
-        {"empty hmean", hmean, {}, true, 0, 0},
-        {"empty min", min, {}, false, 0, 0},
-        {"empty max", max, {}, true, 0, 0},
-        {"empty median", median, {}, false, 0, 0},
-        {"constant skew", skew, {2.5, 2.5, 2.5, 2.5}, false, 0, 0},
-        {"constant excess", excess, {2.5, 2.5, 2.5, 2.5}, false, -3, 0},
-        {"one-point sample variance", svar, {7}, false, 0, 0},
-        {"one negative factor", gmean, {-2, 8}, false, 0, 0},
-        {"two negative factors", gmean, {-2, -8}, false, 4, 0},
-        {"a zero sample", hmean, {1, 0, 2}, false, 0, 0},
-        {"cancelling reciprocals", hmean, {1, -1}, false, b, 0},
-        {"complex zero is not special", hmean, {0, 0}, true, 0, 0},
-        {"huge complex squares", magsq, {10 * b, 0, 10 * b, 0}, true, 2 * b, 0},
-        {"huge complex max keeps the first", max, {10 * b, 1, 10 * b, 2}, true, 10 * b, 1},
-        {"real max at or below -bound", max, {-2 * b, -b, nan}, false, -b, 0},
-        {"real min passes NaN", min, {nan, 3, -1, nan}, false, -1, 0},
-        {"complex max takes a huge sample", max, {nan, 0, 10 * b, 0}, true, 10 * b, 0},
-        {"complex max of NaN only", max, {nan, 0, 1, nan}, true, 0, 0},
-        {"complex min of huge or NaN", min, {nan, 0, 10 * b, 0}, true, b, b},
-        {"complex min: first of equal power", min, {0, 2, 2, 0, -2, 0, 3, 3}, true, 0, 2},
-        {"complex max: first of equal power", max, {0, -2, 1, 1, 2, 0}, true, 0, -2},
-        {"complex median by power", median, {3, 0, 0, 1}, true, 1.5, 0.5},
-        {"complex gmean of 2i and 8i", gmean, {0, 2, 0, 8}, true, 0, 4},
-        {"complex hmean of 1+i and 1-i", hmean, {1, 1, 1, -1}, true, 2, 0},
+        {"empty sum", STAT(t_sum), {}, true, 0, 0},
+        {"empty mean", STAT(t_mean), {}, false, 0, 0},
+        {"empty variance", STAT(t_pop_var), {}, false, 0, 0},
+        {"empty skew", STAT(t_skew), {}, false, 0, 0},
+        {"empty excess", STAT(t_excess), {}, false, -3, 0},
+        {"empty gmean", STAT(t_gmean), {}, true, 0, 0},
+        {"empty hmean", STAT(t_hmean), {}, true, 0, 0},
+        {"empty min", STAT(t_min), {}, false, 0, 0},
+        {"empty max", STAT(t_max), {}, true, 0, 0},
+        {"empty median", STAT(t_median), {}, false, 0, 0},
+        {"constant skew", STAT(t_skew), {2.5, 2.5, 2.5, 2.5}, false, 0, 0},
+        {"constant excess", STAT(t_excess), {2.5, 2.5, 2.5, 2.5}, false, -3, 0},
+        {"one-point sample variance", STAT(t_samp_var), {7}, false, 0, 0},
+        {"one negative factor", STAT(t_gmean), {-2, 8}, false, 0, 0},
+        {"two negative factors", STAT(t_gmean), {-2, -8}, false, 4, 0},
+        {"a zero sample", STAT(t_hmean), {1, 0, 2}, false, 0, 0},
+        {"cancelling reciprocals", STAT(t_hmean), {1, -1}, false, b, 0},
+        {"complex zero is not special", STAT(t_hmean), {0, 0}, true, 0, 0},
+        {"huge complex squares", STAT(t_magsq_sum), {10 * b, 0, 10 * b, 0}, true, 2 * b, 0},
+        {"huge complex max keeps the first", STAT(t_max), {10 * b, 1, 10 * b, 2}, true, 10 * b, 1},
+        {"real max at or below -bound", STAT(t_max), {-2 * b, -b, nan}, false, -b, 0},
+        {"real min passes NaN", STAT(t_min), {nan, 3, -1, nan}, false, -1, 0},
+        {"complex max takes a huge sample", STAT(t_max), {nan, 0, 10 * b, 0}, true, 10 * b, 0},
+        {"complex max of NaN only", STAT(t_max), {nan, 0, 1, nan}, true, 0, 0},
+        {"complex min of huge or NaN", STAT(t_min), {nan, 0, 10 * b, 0}, true, b, b},
+        {"complex min: first of equal power", STAT(t_min), {0, 2, 2, 0, -2, 0, 3, 3}, true, 0, 2},
+        {"complex max: first of equal power", STAT(t_max), {0, -2, 1, 1, 2, 0}, true, 0, -2},
+        {"complex median by power", STAT(t_median), {3, 0, 0, 1}, true, 1.5, 0.5},
+        {"complex gmean of 2i and 8i", STAT(t_gmean), {0, 2, 0, 8}, true, 0, 4},
+        {"complex hmean of 1+i and 1-i", STAT(t_hmean), {1, 1, 1, -1}, true, 2, 0},
     };
     for (const Row& row : rows) {
         Vec<TypeParam> src(row.in, row.complex);
@@ -214,8 +202,8 @@ TYPED_TEST(Moments, FixedResults) {
     }
     // A NaN flows through the sums.
     Vec<TypeParam> with_nan{1, nan, 3};
-    EXPECT_TRUE(std::isnan(stat(STAT(t_mean), with_nan).re));
-    EXPECT_TRUE(std::isnan(stat(STAT(t_pop_var), with_nan).re));
+    EXPECT_TRUE(std::isnan(STAT(t_mean)(with_nan).re));
+    EXPECT_TRUE(std::isnan(STAT(t_pop_var)(with_nan).re));
     // Complex input to skew and excess is refused, dst untouched.
     Vec<TypeParam> cx({1, 2, 3, 4}, true);
     Vec<TypeParam> dst{42};
@@ -238,7 +226,7 @@ TYPED_TEST(Moments, InPlaceAndComplexShape) {
     EXPECT_EQ(v->delta, T(0.25));
     // complex variance is that of re plus that of im; the result is real
     Vec<TypeParam> c({1, 10, 3, 10, 5, 40}, true);
-    const auto r = stat(STAT(t_pop_var), c);
+    const auto r = STAT(t_pop_var)(c);
     EXPECT_EQ(r.complex, 0);
     EXPECT_TRUE(near(r.re, T(8) / 3 + T(200), 1e-4));
 }

@@ -3,7 +3,7 @@
 
 #include "vlx_test.hpp"
 
-#include <array>
+#include <functional>
 
 namespace vlxtest {
 
@@ -56,7 +56,10 @@ StatResult<V> stat(Fn fn, Vec<V>& src) {
     return r;
 }
 
-// Wraps a twin set into one callable object: STAT(t_sum).
-#define STAT(fn) [](auto* s, auto* d) { return fn(s, d); }
+// A statistic as one callable object over both families: STAT(t_sum)(src).
+#define STAT(fn) [](auto& v) { return stat([](auto* s, auto* d) { return fn(s, d); }, v); }
+
+template <class V>
+using StatFn = std::function<StatResult<V>(Vec<V>&)>;
 
 }  // namespace vlxtest
