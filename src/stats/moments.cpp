@@ -138,6 +138,13 @@ T bessel(int64_t n) {
     return n >= 2 ? static_cast<T>(n) / static_cast<T>(n - 1) : T(1);
 }
 
+// Comparison value of a complex sample for the extremes: its power, or the
+// bound when a component lies beyond it.
+template <class T>
+inline T extreme_power(T re, T im, T bound) {
+    return (beyond(re, bound) || beyond(im, bound)) ? bound : re * re + im * im;
+}
+
 }  // namespace
 
 template <VlxVector V>
@@ -338,13 +345,6 @@ int32_t hmean(const V* src, V* dst) {
     if (zero_seen) return put(dst, false, T(0));
     // reciprocals that cancel to 0 give the bound
     return put(dst, false, s[0] != T(0) ? tn / s[0] : bound);
-}
-
-// Comparison value of a complex sample for the extremes: its power, or the
-// bound when a component lies beyond it.
-template <class T>
-inline T extreme_power(T re, T im, T bound) {
-    return (beyond(re, bound) || beyond(im, bound)) ? bound : re * re + im * im;
 }
 
 template <VlxVector V>
