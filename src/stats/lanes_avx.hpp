@@ -75,9 +75,11 @@ __attribute__((target("avx"))) inline int64_t pivot_sums(const double* x, int64_
     return start;
 }
 
-// x * x, or exactly the bound where x lies beyond it.
-__attribute__((target("avx"))) inline __m256d square_term(__m256d x, __m256d bound, __m256d neg_bound) {
-    const __m256d out = _mm256_or_pd(_mm256_cmp_pd(x, bound, _CMP_GT_OQ), _mm256_cmp_pd(x, neg_bound, _CMP_LT_OQ));
+// x * x, or exactly the bound where x lies beyond it: |x| > bound is
+// x > bound or x < -bound, and false for a NaN as both of those are.
+__attribute__((target("avx"))) inline __m256d square_term(__m256d x, __m256d bound, __m256d abs_mask) {
+    const __m256d out = _mm256_cmp_pd(_mm256_and_pd(x, abs_mask), bound, _CMP_GT_OQ);
+    // a plain select: GCC turns blendv here into branches per lane
     return _mm256_or_pd(_mm256_and_pd(out, bound), _mm256_andnot_pd(out, _mm256_mul_pd(x, x)));
 }
 
@@ -85,7 +87,8 @@ __attribute__((target("avx"))) inline __m256d square_term(__m256d x, __m256d bou
 // groups of eight blocks; returns where the groups end.
 __attribute__((target("avx"))) inline int64_t square_sums(const double* x, int64_t n, double bound,
                                                           double (&total)[1]) {
-    const __m256d hi_b = _mm256_set1_pd(bound), lo_b = _mm256_set1_pd(-bound);
+    const __m256d hi_b = _mm256_set1_pd(bound);
+    const __m256d abs_mask = _mm256_castsi256_pd(_mm256_set1_epi64x(0x7fffffffffffffffLL));
     int64_t start = 0;
     for (; start + 8 * block <= n; start += 8 * block) {
         __m256d acc[2][1] = {{_mm256_setzero_pd()}, {_mm256_setzero_pd()}};
@@ -93,8 +96,8 @@ __attribute__((target("avx"))) inline int64_t square_sums(const double* x, int64
             for (int q = 0; q < 2; ++q) {
                 __m256d s0, s1;
                 load_quad(x + start + q * 4 * block + j, s0, s1);
-                acc[q][0] = _mm256_add_pd(acc[q][0], square_term(s0, hi_b, lo_b));
-                acc[q][0] = _mm256_add_pd(acc[q][0], square_term(s1, hi_b, lo_b));
+                acc[q][0] = _mm256_add_pd(acc[q][0], square_term(s0, hi_b, abs_mask));
+                acc[q][0] = _mm256_add_pd(acc[q][0], square_term(s1, hi_b, abs_mask));
             }
         }
         add_lanes(total, acc);
