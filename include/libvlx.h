@@ -290,10 +290,100 @@ VLX_API int32_t vlxfd_deci(vlxf_t* in, vlxf_t* out, int32_t factor, vlxf_t* hist
 /* ======================================================================== */
 /* Statistics: moments, histogram, sort and median                          */
 /* ======================================================================== */
+/* Each statistic makes dst a one-point vector (real, or complex where noted)
+ * and leaves its delta alone; dst may be src.  A vector of no points gives a
+ * defined value, not an error.  Sums run in blocks of 2048 samples whose
+ * partial sums are added to the total in order.  BOUND is 1e100 (float:
+ * 999999986991104). */
+
+/* Sum of the samples; complex src gives a complex sum. */
+VLX_API int32_t vlxs_sum(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_sum(const vlxf_t* src, vlxf_t* dst);
+/* Mean: the sum times 1/points; complex src gives a complex mean.  Empty: 0. */
+VLX_API int32_t vlxs_mean(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_mean(const vlxf_t* src, vlxf_t* dst);
+/* Sum of squared magnitudes (real); a sample beyond +-BOUND adds BOUND. */
+VLX_API int32_t vlxs_magsq_sum(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_magsq_sum(const vlxf_t* src, vlxf_t* dst);
+/* Root mean square of the magnitudes (real).  Empty: 0. */
+VLX_API int32_t vlxs_rms(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_rms(const vlxf_t* src, vlxf_t* dst);
+/* Population variance (real; complex: variance of re plus that of im), from
+ * one pass about a pivot; not forced non-negative.  Empty: 0. */
+VLX_API int32_t vlxs_pop_var(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_pop_var(const vlxf_t* src, vlxf_t* dst);
+/* Sample variance: the population variance times n/(n-1) from two points on. */
+VLX_API int32_t vlxs_samp_var(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_samp_var(const vlxf_t* src, vlxf_t* dst);
+/* Square root of the population variance (NaN if that rounded below 0). */
+VLX_API int32_t vlxs_pop_stddev(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_pop_stddev(const vlxf_t* src, vlxf_t* dst);
+/* Square root of the sample variance. */
+VLX_API int32_t vlxs_samp_stddev(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_samp_stddev(const vlxf_t* src, vlxf_t* dst);
+/* Skewness of a real vector; 0 for empty or constant, BOUND when the spread
+ * is 0 but the third moment is not.  Complex src: -1, dst untouched. */
+VLX_API int32_t vlxs_skew(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_skew(const vlxf_t* src, vlxf_t* dst);
+/* Excess kurtosis of a real vector; -3 for empty or constant.  Complex src:
+ * -1, dst untouched. */
+VLX_API int32_t vlxs_excess(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_excess(const vlxf_t* src, vlxf_t* dst);
+/* Geometric mean from the plain product (which may overflow); 0 if the
+ * product is below the smallest normal (so for any negative product).
+ * Complex: principal root of the complex product. */
+VLX_API int32_t vlxs_gmean(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_gmean(const vlxf_t* src, vlxf_t* dst);
+/* Harmonic mean: n / sum of 1/x; 0 if a real sample is 0, BOUND if the
+ * reciprocals cancel.  Complex: from the complex reciprocals. */
+VLX_API int32_t vlxs_hmean(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_hmean(const vlxf_t* src, vlxf_t* dst);
+/* Smallest sample; complex: the sample of least power (first of equals).
+ * Real samples at or above BOUND give BOUND; complex ones with a component
+ * beyond +-BOUND (or NaN) are never chosen, and if none is, (BOUND, BOUND). */
+VLX_API int32_t vlxs_min(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_min(const vlxf_t* src, vlxf_t* dst);
+/* Largest sample; complex: the sample of largest power (first of equals).
+ * Real samples at or below -BOUND give -BOUND; if no complex sample ranks
+ * above -BOUND the result is (0, 0).  NaN samples are passed over. */
+VLX_API int32_t vlxs_max(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_max(const vlxf_t* src, vlxf_t* dst);
+/* Median by the order of vlxi_sort: the middle sample, or the mean of the two
+ * middle ones for an even count.  Empty: 0. */
+VLX_API int32_t vlxs_median(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_median(const vlxf_t* src, vlxf_t* dst);
+/* Histogram into bins real points, delta = width: bin k counts values in
+ * [origin + k*width, origin + (k+1)*width); complex samples count by
+ * magnitude.  A value a rounding error above the top edge counts in the top
+ * bin; others outside are dropped.  width 0 counts values equal to origin. */
+VLX_API int32_t vlxs_hist(const vlx_t* src, vlx_t* dst, double origin, double width, int32_t bins);
+VLX_API int32_t vlxfs_hist(const vlxf_t* src, vlxf_t* dst, float origin, float width, int32_t bins);
+/* Sorts in place, ascending; complex by power, then re, then im.  NaN
+ * samples end up last.  Always 0. */
+VLX_API int32_t vlxi_sort(vlx_t* v);
+VLX_API int32_t vlxfi_sort(vlxf_t* v);
 
 /* ======================================================================== */
 /* Statistics: peak search                                                  */
 /* ======================================================================== */
+
+/* Flags of vlxs_peak.  Refinement field (mask 0x700): */
+#define VLX_PEAK_SAMPLE               0x000 /* the sample itself */
+#define VLX_PEAK_PARABOLA             0x100 /* parabola through three samples */
+#define VLX_PEAK_LOG_RATIO            0x200 /* log ratio of two neighbours */
+#define VLX_PEAK_LOG_RATIO_CORRECTED  0x300 /* the same with a cubic correction */
+/* Search control: */
+#define VLX_PEAK_AT_INDEX             0x1000 /* no search: use the index argument */
+#define VLX_PEAK_MIN                  0x2000 /* minimum instead of maximum */
+
+/* Finds the largest (VLX_PEAK_MIN: smallest; first of equals) sample, or takes
+ * the one at index (VLX_PEAK_AT_INDEX, clamped to the vector), and makes dst
+ * two real points: value and fractional sample index (not scaled by delta).
+ * Complex samples count by power, |z|^2.  dst may be src (its delta becomes
+ * 1).  Returns 0; -1 on failure or an invalid refinement, and -1 with the
+ * result filled when a log-ratio offset had to be clamped. */
+VLX_API int32_t vlxs_peak(const vlx_t* src, vlx_t* dst, int32_t flags, int32_t index);
+VLX_API int32_t vlxfs_peak(const vlxf_t* src, vlxf_t* dst, int32_t flags, int32_t index);
 
 /* ======================================================================== */
 /* Internal helpers, exported for the library's own layers and for tests.   */

@@ -1,0 +1,108 @@
+// Statistics as templates, for the library's other layers, and the pieces
+// shared by the statistics' own files: block summation and the math calls of
+// each precision.  Each operation is explicitly instantiated for vlx_t and
+// vlxf_t where it is defined.
+#pragma once
+
+#include "core/core.hpp"
+
+#include <cmath>
+#include <cstdint>
+#include <type_traits>
+
+namespace vlx {
+
+// ---- moments, histogram, sort and median (dst becomes one point) ----
+
+template <VlxVector V> int32_t sum(const V* src, V* dst);
+template <VlxVector V> int32_t mean(const V* src, V* dst);
+template <VlxVector V> int32_t magsq_sum(const V* src, V* dst);
+template <VlxVector V> int32_t rms(const V* src, V* dst);
+template <VlxVector V> int32_t pop_var(const V* src, V* dst);
+template <VlxVector V> int32_t samp_var(const V* src, V* dst);
+template <VlxVector V> int32_t pop_stddev(const V* src, V* dst);
+template <VlxVector V> int32_t samp_stddev(const V* src, V* dst);
+template <VlxVector V> int32_t skew(const V* src, V* dst);
+template <VlxVector V> int32_t excess(const V* src, V* dst);
+template <VlxVector V> int32_t gmean(const V* src, V* dst);
+template <VlxVector V> int32_t hmean(const V* src, V* dst);
+template <VlxVector V> int32_t min(const V* src, V* dst);
+template <VlxVector V> int32_t max(const V* src, V* dst);
+template <VlxVector V> int32_t median(const V* src, V* dst);
+template <VlxVector V> int32_t hist(const V* src, V* dst, real_t<V> origin, real_t<V> width, int32_t bins);
+template <VlxVector V> int32_t sort(V* v);
+
+// ---- peak search (dst becomes two real points: value, fractional index) ----
+
+template <VlxVector V> int32_t peak(const V* src, V* dst, int32_t flags, int32_t index);
+
+namespace stats {
+
+// Every sum over samples runs in blocks of this many samples (points).
+inline constexpr int64_t block = 2048;
+
+// Block summation of K running sums.  Each block's partials start at 0 and
+// take the samples in index order; at the end of a block they are added to
+// the totals, in block order.  The totals are never updated per sample.
+//
+// Blocks are independent chains, so L of them advance side by side: the
+// adds of one block still happen in its own order, which keeps the result
+// bit-identical to summing the blocks one after another, while the processor
+// overlaps L dependency chains instead of waiting on one.
+//
+// step(i, acc) adds the terms of sample i into acc[0..K-1].  This form goes on
+// from sample `start`, a block boundary, adding to the totals as they are.
+template <int K, int L, class T, class Step>
+inline void block_sums_from(int64_t start, int64_t n, T (&total)[K], Step step) {
+    for (; start + L * block <= n; start += L * block) {
+        T acc[L][K];
+        for (int b = 0; b < L; ++b)
+            for (int k = 0; k < K; ++k) acc[b][k] = T(0);
+        for (int64_t j = 0; j < block; ++j)
+            for (int b = 0; b < L; ++b) step(start + b * block + j, acc[b]);
+        for (int b = 0; b < L; ++b)
+            for (int k = 0; k < K; ++k) total[k] += acc[b][k];
+    }
+    for (; start < n; start += block) {
+        const int64_t end = start + block < n ? start + block : n;
+        T acc[K];
+        for (int k = 0; k < K; ++k) acc[k] = T(0);
+        for (int64_t i = start; i < end; ++i) step(i, acc);
+        for (int k = 0; k < K; ++k) total[k] += acc[k];
+    }
+}
+
+template <int K, int L, class T, class Step>
+inline void block_sums(int64_t n, T (&total)[K], Step step) {
+    for (int k = 0; k < K; ++k) total[k] = T(0);
+    block_sums_from<K, L>(0, n, total, step);
+}
+
+// x limited to [-bound, bound]; a NaN passes unchanged.
+template <class T>
+inline T saturate(T x, T bound) {
+    if (x > bound) return bound;
+    if (x < -bound) return -bound;
+    return x;
+}
+
+template <class T>
+inline bool beyond(T x, T bound) {
+    return x > bound || x < -bound;
+}
+
+// Math calls in the sample's own precision: the float overloads for float,
+// the double functions for double.
+template <class T> inline T sqrt_own(T x) { return std::sqrt(x); }
+template <class T> inline T log_own(T x) { return std::log(x); }
+template <class T> inline T exp_own(T x) { return std::exp(x); }
+template <class T> inline T cos_own(T x) { return std::cos(x); }
+template <class T> inline T sin_own(T x) { return std::sin(x); }
+template <class T> inline T atan2_own(T y, T x) { return std::atan2(y, x); }
+// The square root of the double function, narrowed back to T.
+template <class T> inline T sqrt_in_double(T x) { return static_cast<T>(std::sqrt(static_cast<double>(x))); }
+
+static_assert(std::is_same_v<decltype(std::sqrt(1.0f)), float>, "float overloads expected");
+
+}  // namespace stats
+}  // namespace vlx

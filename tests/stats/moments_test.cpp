@@ -1,0 +1,253 @@
+// Moments against long-double references, the block order of the sums bit for
+// bit, and the fixed results of degenerate, huge and NaN inputs.
+#include "stats_support.hpp"
+
+#include <functional>
+#include <string>
+
+using namespace vlxtest;
+
+template <class V>
+class Moments : public ::testing::Test {};
+TYPED_TEST_SUITE(Moments, Families);
+
+namespace {
+
+constexpr int64_t kBlock = 2048;
+
+// The defined order: each block of 2048 summed from 0 in index order, the
+// block sums added to a total in block order.
+template <class T, class Term>
+T blockwise(int64_t n, Term term) {
+    T total = T(0);
+    for (int64_t start = 0; start < n; start += kBlock) {
+        T partial = T(0);
+        for (int64_t i = start; i < std::min(n, start + kBlock); ++i) partial += term(i);
+        total += partial;
+    }
+    return total;
+}
+
+template <class T>
+T saturated(T x, T b) {
+    return x > b ? b : (x < -b ? -b : x);
+}
+
+}  // namespace
+
+// Tolerance: each add of a sequential sum rounds by at most half an ulp of the
+// partial, and on these positive, well-conditioned data the errors have no
+// preferred sign, so they grow like the square root of the adds in one block
+// (the block totals add few more).  We allow 2 * sqrt(adds per block) ulps of
+// the result, plus 8 for the roundings after the sums (divisions, the root,
+// the three-term combination of the skewness about a pivot that is not quite
+// the mean): 13 ulps at 7 points, 98 at a full block.  The double twin lands
+// within a few ulps, the float twin within about 35.  The
+// excess kurtosis is m4/m2^2 - 3, whose subtraction cancels: it is measured in
+// ulps of m4/m2^2, the quantity actually computed.  A wrong divisor (n against
+// n - 1), a lost block or a wrong pivot is off by far more.
+TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
+    using T = real_of<TypeParam>;
+    for (const int64_t n : {int64_t(7), int64_t(1000), int64_t(5000), int64_t(2 * 8 * kBlock + 700)}) {
+        std::vector<T> x = random_values<T>(static_cast<size_t>(n), 11u + static_cast<uint32_t>(n), -1.0, 1.0);
+        for (auto& v : x) v = static_cast<T>(std::exp(static_cast<double>(v)));  // skewed, positive
+        Vec<TypeParam> src(x, false);
+        long double s1 = 0, s2 = 0, s3 = 0, s4 = 0, sq = 0, inv = 0, logs = 0;
+        for (T v : x) s1 += v;
+        const long double m = s1 / n;
+        for (T v : x) {
+            const long double d = v - m;
+            s2 += d * d;
+            s3 += d * d * d;
+            s4 += d * d * d * d;
+            sq += (long double)v * v;
+            inv += 1.0L / v;
+            logs += std::log((long double)v);
+        }
+        const long double var = s2 / n;
+        struct Row {
+            const char* name;
+            StatFn<TypeParam> fn;
+            long double expected;
+            long double scale = 0;  // what the ulps are counted in, if not the result
+        };
+        const Row rows[] = {
+            {"sum", STAT(t_sum), s1},
+            {"mean", STAT(t_mean), m},
+            {"magsq_sum", STAT(t_magsq_sum), sq},
+            {"rms", STAT(t_rms), std::sqrt(sq / n)},
+            {"pop_var", STAT(t_pop_var), var},
+            {"samp_var", STAT(t_samp_var), s2 / (n - 1)},
+            {"pop_stddev", STAT(t_pop_stddev), std::sqrt(var)},
+            {"samp_stddev", STAT(t_samp_stddev), std::sqrt(s2 / (n - 1))},
+            {"skew", STAT(t_skew), (s3 / n) / (var * std::sqrt(var))},
+            {"excess", STAT(t_excess), (s4 / n) / (var * var) - 3, (s4 / n) / (var * var)},
+            {"gmean", STAT(t_gmean), std::exp(logs / n)},
+            {"hmean", STAT(t_hmean), n / inv},
+        };
+        const double tolerance = 8.0 + 2.0 * std::sqrt(static_cast<double>(std::min<int64_t>(n, kBlock)));
+        for (const Row& row : rows) {
+            // the plain running product may overflow on long vectors, as intended
+            if (std::string(row.name) == "gmean" && n > 1000) continue;
+            const auto r = row.fn(src);
+            ASSERT_EQ(r.status, 0) << row.name;
+            const long double scale = row.scale != 0 ? row.scale : std::fabs(row.expected);
+            const long double ulp = scale * std::numeric_limits<T>::epsilon();
+            EXPECT_TRUE(near(r.re, row.expected, tolerance * ulp)) << row.name << " n=" << n;
+        }
+    }
+}
+
+// Bit for bit against the literal blockwise order, on lengths that end inside
+// a block, on a block edge, and past several groups of blocks.
+TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
+    using T = real_of<TypeParam>;
+    constexpr T b = bound_of<TypeParam>();
+    // A running sum loses the small tail against the leading 1; in blocks the
+    // tail sums exactly to 2048 * tiny and survives.
+    {
+        const T tiny = std::numeric_limits<T>::epsilon() / 2;
+        std::vector<T> x(2 * kBlock, T(0));
+        x[0] = T(1);
+        for (int64_t i = kBlock; i < 2 * kBlock; ++i) x[i] = tiny;
+        Vec<TypeParam> src(x, false);
+        T running = T(0);
+        for (T v : x) running += v;
+        ASSERT_EQ(running, T(1));
+        EXPECT_TRUE(same_bits(STAT(t_sum)(src).re, T(1) + T(kBlock) * tiny));
+    }
+    for (const int64_t n : {int64_t(1), int64_t(kBlock), int64_t(kBlock + 1), int64_t(8 * kBlock),
+                            int64_t(19 * kBlock + 333)}) {
+        auto x = random_values<T>(static_cast<size_t>(2 * n), 3u + static_cast<uint32_t>(n), -3.0, 5.0);
+        x[static_cast<size_t>(n / 2)] = T(2) * b;  // saturated in the square sums
+        Vec<TypeParam> re(std::vector<T>(x.begin(), x.begin() + n), false);
+        Vec<TypeParam> cx(x, true);
+        const T* v = x.data();
+        EXPECT_TRUE(same_bits(STAT(t_sum)(re).re, blockwise<T>(n, [v](int64_t i) { return v[i]; })));
+        const auto cs = STAT(t_sum)(cx);
+        EXPECT_TRUE(same_bits(cs.re, blockwise<T>(n, [v](int64_t i) { return v[2 * i]; })));
+        EXPECT_TRUE(same_bits(cs.im, blockwise<T>(n, [v](int64_t i) { return v[2 * i + 1]; })));
+        const T r = T(1) / static_cast<T>(n);
+        EXPECT_TRUE(same_bits(STAT(t_mean)(re).re, blockwise<T>(n, [v](int64_t i) { return v[i]; }) * r));
+        const T sq = blockwise<T>(n, [v, b](int64_t i) { return std::fabs(v[i]) > b ? b : v[i] * v[i]; });
+        EXPECT_TRUE(same_bits(STAT(t_magsq_sum)(re).re, sq)) << n;
+        EXPECT_TRUE(same_bits(STAT(t_rms)(re).re, std::sqrt(sq / static_cast<T>(n))));
+        // variance about the pivot of the first, middle and last samples
+        const T third = is_double<TypeParam> ? T(0.3333333333333333) : T(0.33333334f);
+        const T p = (v[n / 2] + v[0] + v[n - 1]) * third;
+        const T S1 = blockwise<T>(n, [&](int64_t i) { return saturated(v[i] - p, b); });
+        const T S2 = blockwise<T>(n, [&](int64_t i) {
+            const T d = saturated(v[i] - p, b);
+            return d * d;
+        });
+        EXPECT_TRUE(same_bits(STAT(t_pop_var)(re).re, r * S2 - (r * S1) * (r * S1))) << n;
+    }
+}
+
+// Fixed results: empty vectors, constant vectors, bound and NaN samples.
+TYPED_TEST(Moments, FixedResults) {
+    using T = real_of<TypeParam>;
+    constexpr T b = bound_of<TypeParam>();
+    const T nan = std::numeric_limits<T>::quiet_NaN();
+    using Fn = StatFn<TypeParam>;
+    struct Row {
+        const char* what;
+        Fn fn;
+        std::vector<T> in;
+        bool complex;
+        T re, im;
+    };
+    const Row rows[] = {
+        {"empty sum", STAT(t_sum), {}, true, 0, 0},
+        {"empty mean", STAT(t_mean), {}, false, 0, 0},
+        {"empty variance", STAT(t_pop_var), {}, false, 0, 0},
+        {"empty skew", STAT(t_skew), {}, false, 0, 0},
+        {"empty excess", STAT(t_excess), {}, false, -3, 0},
+        {"empty gmean", STAT(t_gmean), {}, true, 0, 0},
+        {"empty hmean", STAT(t_hmean), {}, true, 0, 0},
+        {"empty min", STAT(t_min), {}, false, 0, 0},
+        {"empty max", STAT(t_max), {}, true, 0, 0},
+        {"empty median", STAT(t_median), {}, false, 0, 0},
+        {"constant skew", STAT(t_skew), {2.5, 2.5, 2.5, 2.5}, false, 0, 0},
+        {"constant excess", STAT(t_excess), {2.5, 2.5, 2.5, 2.5}, false, -3, 0},
+        {"one-point sample variance", STAT(t_samp_var), {7}, false, 0, 0},
+        {"one negative factor", STAT(t_gmean), {-2, 8}, false, 0, 0},
+        {"two negative factors", STAT(t_gmean), {-2, -8}, false, 4, 0},
+        {"a zero sample", STAT(t_hmean), {1, 0, 2}, false, 0, 0},
+        {"cancelling reciprocals", STAT(t_hmean), {1, -1}, false, b, 0},
+        {"complex zero is not special", STAT(t_hmean), {0, 0}, true, 0, 0},
+        {"huge complex squares", STAT(t_magsq_sum), {10 * b, 0, 10 * b, 0}, true, 2 * b, 0},
+        {"huge complex max keeps the first", STAT(t_max), {10 * b, 1, 10 * b, 2}, true, 10 * b, 1},
+        {"real max at or below -bound", STAT(t_max), {-2 * b, -b, nan}, false, -b, 0},
+        {"real min passes NaN", STAT(t_min), {nan, 3, -1, nan}, false, -1, 0},
+        {"complex max takes a huge sample", STAT(t_max), {nan, 0, 10 * b, 0}, true, 10 * b, 0},
+        {"complex max of NaN only", STAT(t_max), {nan, 0, 1, nan}, true, 0, 0},
+        {"complex min of huge or NaN", STAT(t_min), {nan, 0, 10 * b, 0}, true, b, b},
+        {"complex min: first of equal power", STAT(t_min), {0, 2, 2, 0, -2, 0, 3, 3}, true, 0, 2},
+        {"complex max: first of equal power", STAT(t_max), {0, -2, 1, 1, 2, 0}, true, 0, -2},
+        {"complex median by power", STAT(t_median), {3, 0, 0, 1}, true, 1.5, 0.5},
+        {"complex gmean of 2i and 8i", STAT(t_gmean), {0, 2, 0, 8}, true, 0, 4},
+        {"complex hmean of 1+i and 1-i", STAT(t_hmean), {1, 1, 1, -1}, true, 2, 0},
+    };
+    for (const Row& row : rows) {
+        Vec<TypeParam> src(row.in, row.complex);
+        const auto r = row.fn(src);
+        ASSERT_EQ(r.status, 0) << row.what;
+        EXPECT_TRUE(near(r.re, row.re, std::fabs(row.re) * 4 * std::numeric_limits<T>::epsilon() + 1e-6 * (row.re == 0)))
+            << row.what << ": " << r.re;
+        if (row.complex) {
+            EXPECT_TRUE(near(r.im, row.im, std::fabs(row.im) * 4 * std::numeric_limits<T>::epsilon() + 1e-6))
+                << row.what << ": " << r.im;
+        }
+    }
+    // A NaN flows through the sums.
+    Vec<TypeParam> with_nan{1, nan, 3};
+    EXPECT_TRUE(std::isnan(STAT(t_mean)(with_nan).re));
+    EXPECT_TRUE(std::isnan(STAT(t_pop_var)(with_nan).re));
+    // Complex input to skew and excess is refused, dst untouched.
+    Vec<TypeParam> cx({1, 2, 3, 4}, true);
+    Vec<TypeParam> dst{42};
+    EXPECT_EQ(t_skew(cx.get(), dst.get()), -1);
+    EXPECT_EQ(t_excess(cx.get(), dst.get()), -1);
+    EXPECT_EQ(dst->points, 1);
+    EXPECT_EQ(dst[0], T(42));
+}
+
+// dst may be src: the statistic is read before the vector becomes one point.
+TYPED_TEST(Moments, InPlaceAndComplexShape) {
+    using T = real_of<TypeParam>;
+    Vec<TypeParam> v({1, 2, 3, 4, 5, 6}, true);
+    v->delta = T(0.25);
+    ASSERT_EQ(t_mean(v.get(), v.get()), 0);
+    EXPECT_EQ(v->points, 1);
+    EXPECT_EQ(v->complex, 1);
+    EXPECT_EQ(v[0], T(3));
+    EXPECT_EQ(v[1], T(4));
+    EXPECT_EQ(v->delta, T(0.25));
+    // complex variance is that of re plus that of im; the result is real
+    Vec<TypeParam> c({1, 10, 3, 10, 5, 40}, true);
+    const auto r = STAT(t_pop_var)(c);
+    EXPECT_EQ(r.complex, 0);
+    EXPECT_TRUE(near(r.re, T(8) / 3 + T(200), 1e-4));
+}
+
+// A failed allocation is a status: dst is left empty, nothing is written.
+TEST(MomentsHooks, AllocationFailureIsReported) {
+    vlx_alloc_hook_t old_alloc = nullptr;
+    vlx_realloc_hook_t old_realloc = nullptr;
+    vlx_lib_alloc([](vlx_t* v) -> int32_t { v->data = nullptr; return 0; }, &old_alloc);
+    vlx_lib_realloc([](vlx_t* v, int32_t, int32_t) -> int32_t { v->data = nullptr; return 0; }, &old_realloc);
+    vlx_t src{1.0, nullptr, 0, 3, 0, 0};
+    double lent[3] = {1, 2, 3};
+    src.data = lent;  // lent storage: no allocation needed to read it
+    Vec<vlx_t> dst;
+    EXPECT_EQ(vlxs_sum(&src, dst.get()), -1);
+    EXPECT_EQ(dst->points, 0);
+    EXPECT_EQ(dst->data, nullptr);
+    EXPECT_EQ(vlxs_median(&src, dst.get()), -1);
+    EXPECT_EQ(vlxs_hist(&src, dst.get(), 0, 1, 4), -1);
+    EXPECT_EQ(vlxs_peak(&src, dst.get(), VLX_PEAK_SAMPLE, 0), -1);
+    EXPECT_EQ(vlxs_peak(&src, &src, VLX_PEAK_SAMPLE, 0), -1);
+    vlx_lib_alloc(old_alloc, nullptr);
+    vlx_lib_realloc(old_realloc, nullptr);
+}
