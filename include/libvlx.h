@@ -180,6 +180,14 @@ VLX_API int32_t vlxf_version(void);
 /* ======================================================================== */
 /* Element-wise: two-operand operations                                     */
 /* ======================================================================== */
+/* Sources a and b, destination dst, which may be either source.  A real
+ * operand meets a complex one as if its imaginary parts were 0; the result is
+ * complex if either source is, and its delta is the mean of the two deltas.
+ * Unequal points give -1 unless a comment says otherwise. */
+
+/* dst = a * b, point by point. */
+VLX_API int32_t vlxb_mul(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
 
 /* ======================================================================== */
 /* Element-wise: arithmetic and math                                        */
@@ -218,6 +226,12 @@ VLX_API int32_t vlxfi_rev(vlxf_t* v);
 /* ======================================================================== */
 
 /* --- two-operand destination preparation --- */
+
+/* Sizes dst for a two-operand result: -1 (dst untouched) if the points
+ * differ; sets delta to the mean, complex if either source is, points; keeps
+ * the old samples when dst shares a source's data.  -1 if growth fails. */
+VLX_API int32_t vlxb_prepare_dest(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_prepare_dest(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
 
 /* --- arithmetic kernels --- */
 

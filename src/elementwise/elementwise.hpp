@@ -8,6 +8,10 @@ namespace vlx {
 
 // ---- two-operand operations ----
 
+// Sizes dst for a two-operand result: -1 if the points differ; delta the
+// mean, complex if either is; keeps the samples when dst shares a source's
+// data (vlxb_prepare_dest).
+template <VlxVector V> int32_t prepare_dest(V* a, V* b, V* dst);
 // dst = a * b point by point (vlxb_mul).
 template <VlxVector V> int32_t mul(V* a, V* b, V* dst);
 
