@@ -185,9 +185,45 @@ VLX_API int32_t vlxf_version(void);
  * complex if either source is, and its delta is the mean of the two deltas.
  * Unequal points give -1 unless a comment says otherwise. */
 
+/* dst = a + b; the shorter source counts as zero-extended (result: the longer points). */
+VLX_API int32_t vlxb_add(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_add(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = a - b; the shorter source counts as zero-extended (result: the longer points). */
+VLX_API int32_t vlxb_sub(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_sub(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
 /* dst = a * b, point by point. */
 VLX_API int32_t vlxb_mul(vlx_t* a, vlx_t* b, vlx_t* dst);
 VLX_API int32_t vlxfb_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = a * conj(b), point by point. */
+VLX_API int32_t vlxb_conj_mul(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_conj_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = a / b.  A division by zero gives 0 for a zero numerator, otherwise
+ * +1e100 (float: +1e15) in every part, whatever the signs. */
+VLX_API int32_t vlxb_div(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_div(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = (a - b) * alpha + b: exponential averaging with weight alpha on a. */
+VLX_API int32_t vlxb_avg_add(vlx_t* a, vlx_t* b, vlx_t* dst, double alpha);
+VLX_API int32_t vlxfb_avg_add(vlxf_t* a, vlxf_t* b, vlxf_t* dst, float alpha);
+/* The larger (max) or smaller (min) sample of each pair; once either source is
+ * complex, whole samples by power, parts beyond 1e100 (float: 1e15) ranking at
+ * 1e100.  Ties and NaNs give b's sample. */
+VLX_API int32_t vlxb_max(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_max(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+VLX_API int32_t vlxb_min(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_min(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* Interleaves samples: a[0], b[0], a[1], b[1], ...; 2 * points, delta the mean halved. */
+VLX_API int32_t vlxb_inter(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_inter(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* Complex dst from real vectors re and im; -1 if either is complex. */
+VLX_API int32_t vlxb_ritoc(vlx_t* re, vlx_t* im, vlx_t* dst);
+VLX_API int32_t vlxfb_ritoc(vlxf_t* re, vlxf_t* im, vlxf_t* dst);
+/* Polynomial product (full linear convolution): a.points + b.points - 1
+ * points, 0 if either is empty.  Any lengths. */
+VLX_API int32_t vlxb_pmul(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_pmul(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* One-point dst = sum of a[i] * b[i] (nothing conjugated); dst->delta is left alone. */
+VLX_API int32_t vlxbs_dot(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfbs_dot(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
 
 /* ======================================================================== */
 /* Element-wise: arithmetic and math                                        */
