@@ -43,6 +43,56 @@ template <VlxVector V> int32_t dot(V* a, V* b, V* dst);
 
 // Every scalar times s (vlxi_scale).
 template <VlxVector V> int32_t scale(V* v, real_t<V> s);
+// In place: x + c on the real part (vlxi_offset); times re + j im, making a
+// real vector complex (vlxi_cscale); negation, absolute value (real only),
+// conjugate, times j (making complex).
+template <VlxVector V> int32_t offset(V* v, real_t<V> c);
+template <VlxVector V> int32_t cscale(V* v, real_t<V> re, real_t<V> im);
+template <VlxVector V> int32_t neg(V* v);
+template <VlxVector V> int32_t abs(V* v);
+template <VlxVector V> int32_t conj(V* v);
+template <VlxVector V> int32_t timesi(V* v);
+// Magnitude and clamped power, packed to a real vector (vlxi_mag, vlxi_magsq),
+// and the same from src into dst (vlxu_mag, vlxu_magsq).
+template <VlxVector V> int32_t mag(V* v);
+template <VlxVector V> int32_t magsq(V* v);
+template <VlxVector V> int32_t mag_to(V* src, V* dst);
+template <VlxVector V> int32_t magsq_to(V* src, V* dst);
+// Clamped square, reciprocal and square root; sqrt_to is vlxu_sqrt.
+template <VlxVector V> int32_t square(V* v);
+template <VlxVector V> int32_t recip(V* v);
+template <VlxVector V> int32_t sqrt(V* v);
+template <VlxVector V> int32_t sqrt_to(V* src, V* dst);
+// Complex (magnitude, phase) to (re, im) (vlxi_ptor).
+template <VlxVector V> int32_t ptor(V* v);
+// Adds amp * cos(2 pi freq x + phase), and the sine to the imaginary part of
+// a complex vector when flags bit 1 is set (vlxi_addcos).
+template <VlxVector V> int32_t addcos(V* v, uint32_t flags, real_t<V> freq, real_t<V> amp, real_t<V> phase);
+// Exponentials and logarithms with their clamps; db is factor * log10.
+template <VlxVector V> int32_t exp(V* v);
+template <VlxVector V> int32_t exp10(V* v);
+template <VlxVector V> int32_t log(V* v);
+template <VlxVector V> int32_t log10(V* v);
+template <VlxVector V> int32_t db(V* v, real_t<V> factor);
+// Real-only functions of each sample.
+template <VlxVector V> int32_t sin(V* v);
+template <VlxVector V> int32_t cos(V* v);
+template <VlxVector V> int32_t tan(V* v);
+template <VlxVector V> int32_t atan(V* v);
+template <VlxVector V> int32_t tanh(V* v);
+template <VlxVector V> int32_t acos(V* v);
+template <VlxVector V> int32_t asin(V* v);
+template <VlxVector V> int32_t cosh(V* v);
+template <VlxVector V> int32_t sinh(V* v);
+template <VlxVector V> int32_t sinc(V* v);
+template <VlxVector V> int32_t besi0(V* v);
+template <VlxVector V> int32_t besj0(V* v);
+template <VlxVector V> int32_t besj1(V* v);
+template <VlxVector V> int32_t besy0(V* v);
+template <VlxVector V> int32_t besy1(V* v);
+// Modified Bessel function I0 of one scalar (vlx_besi0_kernel); the Kaiser
+// window uses it too.
+template <VlxVector V> real_t<V> besi0_kernel(real_t<V> x);
 
 // ---- layout operations ----
 
