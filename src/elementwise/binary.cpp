@@ -3,6 +3,7 @@
 // may overwrite a source's attributes) and the data pointers after (growing
 // may move them).
 #include "elementwise/elementwise.hpp"
+#include "elementwise/simd.hpp"
 
 #include <type_traits>
 
@@ -34,29 +35,47 @@ int32_t run_shapes(V* a, V* b, V* dst, RR rr, CC cc, CR cr, RC rc) {
     const T* y = b->data;
     T* d = dst->data;
     if (!ac && !bc) {
-        for (int64_t i = 0; i < n; ++i) d[i] = rr(x[i], y[i]);
+        simd::dispatch([=]() VLX_INLINE_LOOP {
+            for (int64_t i = 0; i < n; ++i) d[i] = rr(x[i], y[i]);
+        });
     } else if (ac && bc) {
         if constexpr (by_scalar) {
-            for (int64_t i = 0; i < 2 * n; ++i) d[i] = rr(x[i], y[i]);
+            simd::dispatch([=]() VLX_INLINE_LOOP {
+                for (int64_t i = 0; i < 2 * n; ++i) d[i] = rr(x[i], y[i]);
+            });
         } else {
-            for (int64_t i = 0; i < n; ++i) {
-                const Cx<T> r = cc(x[2 * i], x[2 * i + 1], y[2 * i], y[2 * i + 1]);
+            simd::dispatch([=]() VLX_INLINE_LOOP {
+                for (int64_t i = 0; i < n; ++i) {
+                    const Cx<T> r = cc(x[2 * i], x[2 * i + 1], y[2 * i], y[2 * i + 1]);
+                    d[2 * i] = r.re;
+                    d[2 * i + 1] = r.im;
+                }
+            });
+        }
+    } else if (simd::overlaps(d, 2 * n, x, ac ? 2 * n : n) || simd::overlaps(d, 2 * n, y, bc ? 2 * n : n)) {
+        if (ac) {
+            for (int64_t i = n - 1; i >= 0; --i) {
+                const Cx<T> r = cr(x[2 * i], x[2 * i + 1], y[i]);
+                d[2 * i] = r.re;
+                d[2 * i + 1] = r.im;
+            }
+        } else {
+            for (int64_t i = n - 1; i >= 0; --i) {
+                const Cx<T> r = rc(x[i], y[2 * i], y[2 * i + 1]);
                 d[2 * i] = r.re;
                 d[2 * i + 1] = r.im;
             }
         }
-    } else if (ac) {
-        for (int64_t i = n - 1; i >= 0; --i) {
-            const Cx<T> r = cr(x[2 * i], x[2 * i + 1], y[i]);
-            d[2 * i] = r.re;
-            d[2 * i + 1] = r.im;
-        }
     } else {
-        for (int64_t i = n - 1; i >= 0; --i) {
-            const Cx<T> r = rc(x[i], y[2 * i], y[2 * i + 1]);
-            d[2 * i] = r.re;
-            d[2 * i + 1] = r.im;
-        }
+        // dst apart from both sources: the order is invisible, and forward
+        // loops are the ones the compiler vectorises.
+        simd::dispatch([=]() VLX_INLINE_LOOP {
+            for (int64_t i = 0; i < n; ++i) {
+                const Cx<T> r = ac ? cr(x[2 * i], x[2 * i + 1], y[i]) : rc(x[i], y[2 * i], y[2 * i + 1]);
+                d[2 * i] = r.re;
+                d[2 * i + 1] = r.im;
+            }
+        });
     }
     return 0;
 }
