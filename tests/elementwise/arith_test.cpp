@@ -296,6 +296,66 @@ TYPED_TEST(Arith, AddcosFollowsTheToneAcrossRestarts) {
     EXPECT_EQ(flat.values(), (std::vector<T>{2, 3, 4}));
 }
 
+// Round trips on random complex samples: sqrt then square, log then exp,
+// cscale by w then by 1/w; each against the input within a few eps of its
+// magnitude.  Catches swapped parts and wrong phases, which fixed points miss.
+TYPED_TEST(Arith, ComplexRoundTrips) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const std::vector<T> in = random_values<T>(2 * 200, 21, -8, 8);
+    const long double eps = std::numeric_limits<T>::epsilon();
+    const std::vector<std::pair<const char*, std::function<void(V*)>>> trips = {
+        {"sqrt, square", [](V* v) { t_sqrt(v); t_square(v); }},
+        {"log, exp", [](V* v) { t_log(v); t_exp(v); }},
+        {"cscale there and back", [](V* v) { t_cscale(v, T(0.6), T(-0.8)); t_cscale(v, T(0.6), T(0.8)); }},
+        {"ptor of (|z|, arg z)", [](V* v) {
+             for (int32_t i = 0; i < v->points; ++i) {
+                 const T a = v->data[2 * i], b = v->data[2 * i + 1];
+                 v->data[2 * i] = std::hypot(a, b);
+                 v->data[2 * i + 1] = std::atan2(b, a);
+             }
+             t_ptor(v);
+         }},
+    };
+    for (const auto& [name, trip] : trips) {
+        Vec<V> v(in, true);
+        trip(v.get());
+        for (int i = 0; i < 200; ++i) {
+            const long double scale = std::hypot((long double)in[2 * i], (long double)in[2 * i + 1]);
+            EXPECT_TRUE(near(v[2 * i], in[2 * i], 16 * eps * scale)) << name << " re " << i;
+            EXPECT_TRUE(near(v[2 * i + 1], in[2 * i + 1], 16 * eps * scale)) << name << " im " << i;
+        }
+    }
+}
+
+template <class V>
+int32_t refuse_realloc(V* v, int32_t, int32_t) {
+    if (v->alloc > 0) std::free(v->data);
+    v->data = nullptr;
+    return 0;
+}
+
+// Growth fails in the operations that make a real vector complex: -1, and
+// the vector is empty and safe to destroy.
+TYPED_TEST(Arith, GrowthFailureLeavesAnEmptyVector) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const std::vector<std::function<int32_t(V*)>> growing = {
+        [](V* v) { return t_cscale(v, T(1), T(2)); }, [](V* v) { return t_timesi(v); }};
+    for (const auto& op : growing) {
+        Vec<V> v({1, 2, 3});
+        if constexpr (is_double<V>) vlx_lib_realloc(refuse_realloc<vlx_t>, nullptr);
+        else vlxf_lib_realloc(refuse_realloc<vlxf_t>, nullptr);
+        const int32_t r = op(v.get());
+        if constexpr (is_double<V>) vlx_lib_realloc(nullptr, nullptr);
+        else vlxf_lib_realloc(nullptr, nullptr);
+        EXPECT_EQ(r, -1);
+        EXPECT_EQ(v->points, 0);
+        EXPECT_EQ(v->alloc, 0);
+        EXPECT_EQ(v->data, nullptr);
+    }
+}
+
 // I0 by its power series summed in long double to convergence.
 long double besi0_reference(long double x) {
     const long double u = x * x / 4;
