@@ -19,11 +19,13 @@ struct Cx {
 //   rr(x, y)              real with real, forward; with by_scalar also the
 //                         scalars of complex with complex
 //   cc(ar, ai, br, bi)    complex with complex, forward, pair loaded whole
-//   cr(ar, ai, b)         complex with real, backward
-//   rc(a, br, bi)         real with complex, backward
-// The mixed shapes walk down from the last sample: the result needs two
-// scalars where the real source had one, and only that order lets dst be the
-// real source without overwriting a scalar still to be read.
+//   cr(ar, ai, b)         complex with real
+//   rc(a, br, bi)         real with complex
+// The mixed shapes walk down from the last sample when dst overlaps a
+// source: the result needs two scalars where the real source had one, and
+// only that order lets dst be the real source without overwriting a scalar
+// still to be read.  Apart from the sources the order cannot be seen, and the
+// forward loop is the one that vectorises.
 template <bool by_scalar, VlxVector V, class RR, class CC, class CR, class RC>
 int32_t run_shapes(V* a, V* b, V* dst, RR rr, CC cc, CR cr, RC rc) {
     using T = real_t<V>;
@@ -67,8 +69,6 @@ int32_t run_shapes(V* a, V* b, V* dst, RR rr, CC cc, CR cr, RC rc) {
             }
         }
     } else {
-        // dst apart from both sources: the order is invisible, and forward
-        // loops are the ones the compiler vectorises.
         simd::dispatch([=]() VLX_INLINE_LOOP {
             for (int64_t i = 0; i < n; ++i) {
                 const Cx<T> r = ac ? cr(x[2 * i], x[2 * i + 1], y[i]) : rc(x[i], y[2 * i], y[2 * i + 1]);
