@@ -72,7 +72,7 @@ int32_t neg(V* v) {
 }
 
 template <VlxVector V>
-int32_t abs(V* v) {
+int32_t abs_each(V* v) {
     return inplace::map_real(v, [](real_t<V> x) { return std::fabs(x); });
 }
 
@@ -278,7 +278,7 @@ inline Cx<real_t<V>> sqrt_pair(real_t<V> a, real_t<V> b) {
 }  // namespace
 
 template <VlxVector V>
-int32_t sqrt(V* v) {
+int32_t sqrt_each(V* v) {
     return inplace::map_both(v, sqrt_real<V>, sqrt_pair<V>);
 }
 
@@ -360,14 +360,14 @@ int32_t not_implemented(const void*) {
     template int32_t offset<V>(V*, real_t<V>);                                \
     template int32_t cscale<V>(V*, real_t<V>, real_t<V>);                     \
     template int32_t neg<V>(V*);                                              \
-    template int32_t abs<V>(V*);                                              \
+    template int32_t abs_each<V>(V*);                                         \
     template int32_t conj<V>(V*);                                             \
     template int32_t timesi<V>(V*);                                           \
     template int32_t mag<V>(V*);                                              \
     template int32_t magsq<V>(V*);                                            \
     template int32_t square<V>(V*);                                           \
     template int32_t recip<V>(V*);                                            \
-    template int32_t sqrt<V>(V*);                                             \
+    template int32_t sqrt_each<V>(V*);                                        \
     template int32_t ptor<V>(V*);                                             \
     template int32_t addcos<V>(V*, uint32_t, real_t<V>, real_t<V>, real_t<V>); \
     template int32_t mag_to<V>(V*, V*);                                       \
@@ -388,8 +388,8 @@ VLX_API int32_t vlxi_cscale(vlx_t* v, double re, double im) { return vlx::cscale
 VLX_API int32_t vlxfi_cscale(vlxf_t* v, float re, float im) { return vlx::cscale(v, re, im); }
 VLX_API int32_t vlxi_neg(vlx_t* v) { return vlx::neg(v); }
 VLX_API int32_t vlxfi_neg(vlxf_t* v) { return vlx::neg(v); }
-VLX_API int32_t vlxi_abs(vlx_t* v) { return vlx::abs(v); }
-VLX_API int32_t vlxfi_abs(vlxf_t* v) { return vlx::abs(v); }
+VLX_API int32_t vlxi_abs(vlx_t* v) { return vlx::abs_each(v); }
+VLX_API int32_t vlxfi_abs(vlxf_t* v) { return vlx::abs_each(v); }
 VLX_API int32_t vlxi_conj(vlx_t* v) { return vlx::conj(v); }
 VLX_API int32_t vlxfi_conj(vlxf_t* v) { return vlx::conj(v); }
 VLX_API int32_t vlxi_timesi(vlx_t* v) { return vlx::timesi(v); }
@@ -402,8 +402,8 @@ VLX_API int32_t vlxi_square(vlx_t* v) { return vlx::square(v); }
 VLX_API int32_t vlxfi_square(vlxf_t* v) { return vlx::square(v); }
 VLX_API int32_t vlxi_recip(vlx_t* v) { return vlx::recip(v); }
 VLX_API int32_t vlxfi_recip(vlxf_t* v) { return vlx::recip(v); }
-VLX_API int32_t vlxi_sqrt(vlx_t* v) { return vlx::sqrt(v); }
-VLX_API int32_t vlxfi_sqrt(vlxf_t* v) { return vlx::sqrt(v); }
+VLX_API int32_t vlxi_sqrt(vlx_t* v) { return vlx::sqrt_each(v); }
+VLX_API int32_t vlxfi_sqrt(vlxf_t* v) { return vlx::sqrt_each(v); }
 VLX_API int32_t vlxi_ptor(vlx_t* v) { return vlx::ptor(v); }
 VLX_API int32_t vlxfi_ptor(vlxf_t* v) { return vlx::ptor(v); }
 VLX_API int32_t vlxi_addcos(vlx_t* v, uint32_t flags, double freq, double amp, double phase) { return vlx::addcos(v, flags, freq, amp, phase); }

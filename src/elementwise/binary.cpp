@@ -179,7 +179,7 @@ int32_t conj_mul(V* a, V* b, V* dst) {
 }
 
 template <VlxVector V>
-int32_t div(V* a, V* b, V* dst) {
+int32_t divide(V* a, V* b, V* dst) {
     using T = real_t<V>;
     // The substitute for a division by zero is positive whatever the signs.
     constexpr T big = family<V>::bound;
@@ -274,13 +274,13 @@ int32_t pick(V* a, V* b, V* dst, Real take_a, Ranked take_a_by_rank) {
 }  // namespace
 
 template <VlxVector V>
-int32_t max(V* a, V* b, V* dst) {
+int32_t maximum(V* a, V* b, V* dst) {
     using T = real_t<V>;
     return pick(a, b, dst, [](T x, T y) { return x > y; }, [](T ra, T rb) { return ra > rb; });
 }
 
 template <VlxVector V>
-int32_t min(V* a, V* b, V* dst) {
+int32_t minimum(V* a, V* b, V* dst) {
     using T = real_t<V>;
     return pick(a, b, dst, [](T x, T y) { return x < y; }, [](T ra, T rb) { return rb > ra; });
 }
@@ -465,21 +465,21 @@ int32_t dot(V* a, V* b, V* dst) {
     return 0;
 }
 
-#define VLX_INSTANTIATE(V)                                              \
-    template int32_t prepare_dest<V>(V*, V*, V*);                     \
-    template int32_t add_equal<V>(V*, V*, V*);                        \
-    template int32_t sub_equal<V>(V*, V*, V*);                        \
-    template int32_t add<V>(V*, V*, V*);                              \
-    template int32_t sub<V>(V*, V*, V*);                              \
-    template int32_t mul<V>(V*, V*, V*);                              \
-    template int32_t conj_mul<V>(V*, V*, V*);                         \
-    template int32_t div<V>(V*, V*, V*);                              \
-    template int32_t avg_add<V>(V*, V*, V*, real_t<V>);               \
-    template int32_t max<V>(V*, V*, V*);                              \
-    template int32_t min<V>(V*, V*, V*);                              \
-    template int32_t inter<V>(V*, V*, V*);                            \
-    template int32_t ritoc<V>(V*, V*, V*);                            \
-    template int32_t pmul<V>(V*, V*, V*);                             \
+#define VLX_INSTANTIATE(V)                              \
+    template int32_t prepare_dest<V>(V*, V*, V*);       \
+    template int32_t add_equal<V>(V*, V*, V*);          \
+    template int32_t sub_equal<V>(V*, V*, V*);          \
+    template int32_t add<V>(V*, V*, V*);                \
+    template int32_t sub<V>(V*, V*, V*);                \
+    template int32_t mul<V>(V*, V*, V*);                \
+    template int32_t conj_mul<V>(V*, V*, V*);           \
+    template int32_t divide<V>(V*, V*, V*);             \
+    template int32_t avg_add<V>(V*, V*, V*, real_t<V>); \
+    template int32_t maximum<V>(V*, V*, V*);            \
+    template int32_t minimum<V>(V*, V*, V*);            \
+    template int32_t inter<V>(V*, V*, V*);              \
+    template int32_t ritoc<V>(V*, V*, V*);              \
+    template int32_t pmul<V>(V*, V*, V*);               \
     template int32_t dot<V>(V*, V*, V*);
 VLX_INSTANTIATE(vlx_t)
 VLX_INSTANTIATE(vlxf_t)
@@ -498,12 +498,12 @@ VLX_API int32_t vlxb_mul(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::mul(a, b,
 VLX_API int32_t vlxfb_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::mul(a, b, dst); }
 VLX_API int32_t vlxb_conj_mul(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::conj_mul(a, b, dst); }
 VLX_API int32_t vlxfb_conj_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::conj_mul(a, b, dst); }
-VLX_API int32_t vlxb_div(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::div(a, b, dst); }
-VLX_API int32_t vlxfb_div(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::div(a, b, dst); }
-VLX_API int32_t vlxb_max(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::max(a, b, dst); }
-VLX_API int32_t vlxfb_max(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::max(a, b, dst); }
-VLX_API int32_t vlxb_min(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::min(a, b, dst); }
-VLX_API int32_t vlxfb_min(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::min(a, b, dst); }
+VLX_API int32_t vlxb_div(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::divide(a, b, dst); }
+VLX_API int32_t vlxfb_div(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::divide(a, b, dst); }
+VLX_API int32_t vlxb_max(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::maximum(a, b, dst); }
+VLX_API int32_t vlxfb_max(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::maximum(a, b, dst); }
+VLX_API int32_t vlxb_min(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::minimum(a, b, dst); }
+VLX_API int32_t vlxfb_min(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::minimum(a, b, dst); }
 VLX_API int32_t vlxb_inter(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::inter(a, b, dst); }
 VLX_API int32_t vlxfb_inter(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::inter(a, b, dst); }
 VLX_API int32_t vlxb_ritoc(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::ritoc(a, b, dst); }
