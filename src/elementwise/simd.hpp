@@ -4,16 +4,15 @@
 // the same order; only the width of the compiler's vectors differs.
 #pragma once
 
+#include "core/cpu.hpp"
+
 #include <cstdint>
 
 #define VLX_INLINE_LOOP __attribute__((always_inline))
 
 namespace vlx::simd {
 
-inline bool cpu_has_avx2() {
-    static const bool has = __builtin_cpu_supports("avx2");
-    return has;
-}
+inline bool cpu_has_avx2() { return cpu::has_avx2(); }
 
 template <class Loop>
 __attribute__((target("avx2"))) __attribute__((noinline)) void run_avx2(const Loop& loop) {

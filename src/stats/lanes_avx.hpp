@@ -8,6 +8,7 @@
 // which would fuse d * d into the add and change the last bits.
 #pragma once
 
+#include "core/cpu.hpp"
 #include "stats/stats.hpp"
 
 #if defined(__x86_64__) && defined(__GNUC__)
@@ -16,13 +17,7 @@
 
 namespace vlx::stats::avx {
 
-inline bool available() {
-    static const bool has = [] {
-        __builtin_cpu_init();  // may run before the runtime's own constructor
-        return __builtin_cpu_supports("avx") != 0;
-    }();
-    return has;
-}
+inline bool available() { return cpu::has_avx(); }
 
 // Samples j and j + 1 of the four blocks starting at p, as two registers
 // [b0, b1, b2, b3].

@@ -3,6 +3,8 @@
 // so a vectorised butterfly gives the scalar result bit for bit.
 #pragma once
 
+#include "core/cpu.hpp"
+
 #include <cstddef>
 #include <type_traits>
 
@@ -15,10 +17,7 @@
 namespace vlx {
 namespace fft_simd {
 
-inline bool have_avx() {
-    static const bool avx = __builtin_cpu_supports("avx");
-    return avx;
-}
+inline bool have_avx() { return cpu::has_avx(); }
 
 
 // A vector holds W complex points (2 doubles or 4 floats), k .. k+W-1 of a
