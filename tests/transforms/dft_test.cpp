@@ -102,10 +102,12 @@ std::vector<T> literal_chirp_z(std::vector<T> x, bool cplx, const std::vector<in
 
 }  // namespace
 
-// Relative L2 error against a long-double sum.  The chirp path chains three
-// products and two transforms of length L < 4N, so its error is that of a
-// power-of-two transform of length L a few times over: the bound is three
-// times the engine's own, whose twiddle recurrence adds up to min(L/8, 256) eps.
+// Relative L2 error against a long-double sum.  The chirp path is two
+// power-of-two transforms of length L < 4N between three products with
+// unit-modulus factors (a few eps each), so the bound is twice the engine's
+// own for length L.  That one is not eps sqrt(log2 L): the engine's twiddle
+// recurrence adds up to min(L/8, 256) eps, and it dominates from L = 1024 on
+// (measured: about 85 eps at L = 4096 against a bound of 540 eps).
 TYPED_TEST(DftTest, MatchesLongDoubleSumForAnyLength) {
     using T = real_of<TypeParam>;
     const double eps = std::numeric_limits<T>::epsilon();
@@ -117,7 +119,7 @@ TYPED_TEST(DftTest, MatchesLongDoubleSumForAnyLength) {
             const std::vector<cld> want = fftref::exact_dft(as_cld(x, true), inverse != 0);
             int m = 2;
             while ((int64_t(1) << m) < 2 * int64_t(n) - 2) ++m;
-            EXPECT_LE(double(fftref::rel_l2(v->data, want, n)), 3 * fftref::transform_tolerance(eps, m))
+            EXPECT_LE(double(fftref::rel_l2(v->data, want, n)), 2 * fftref::transform_tolerance(eps, m))
                 << "n " << n << " inverse " << inverse;
         }
     }
