@@ -234,14 +234,175 @@ VLX_API int32_t vlxfi_hilbert(vlxf_t* v);
 /* ======================================================================== */
 /* Element-wise: two-operand operations                                     */
 /* ======================================================================== */
+/* Sources a and b, destination dst, which may be either source.  A real
+ * operand meets a complex one as if its imaginary parts were 0; the result is
+ * complex if either source is, and its delta is the mean of the two deltas.
+ * Unequal points give -1 unless a comment says otherwise. */
+
+/* dst = a + b; the shorter source counts as zero-extended (result: the longer points). */
+VLX_API int32_t vlxb_add(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_add(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = a - b; the shorter source counts as zero-extended (result: the longer points). */
+VLX_API int32_t vlxb_sub(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_sub(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = a * b, point by point. */
+VLX_API int32_t vlxb_mul(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = a * conj(b), point by point. */
+VLX_API int32_t vlxb_conj_mul(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_conj_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = a / b.  A division by zero gives 0 for a zero numerator, otherwise
+ * +1e100 (float: +1e15) in every part, whatever the signs. */
+VLX_API int32_t vlxb_div(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_div(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* dst = (a - b) * alpha + b: exponential averaging with weight alpha on a. */
+VLX_API int32_t vlxb_avg_add(vlx_t* a, vlx_t* b, vlx_t* dst, double alpha);
+VLX_API int32_t vlxfb_avg_add(vlxf_t* a, vlxf_t* b, vlxf_t* dst, float alpha);
+/* The larger (max) or smaller (min) sample of each pair; once either source is
+ * complex, whole samples by power, parts beyond 1e100 (float: 1e15) ranking at
+ * 1e100.  Ties and NaNs give b's sample. */
+VLX_API int32_t vlxb_max(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_max(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+VLX_API int32_t vlxb_min(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_min(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* Interleaves samples: a[0], b[0], a[1], b[1], ...; 2 * points, delta the mean halved. */
+VLX_API int32_t vlxb_inter(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_inter(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* Complex dst from real vectors re and im; -1 if either is complex. */
+VLX_API int32_t vlxb_ritoc(vlx_t* re, vlx_t* im, vlx_t* dst);
+VLX_API int32_t vlxfb_ritoc(vlxf_t* re, vlxf_t* im, vlxf_t* dst);
+/* Polynomial product (full linear convolution): a.points + b.points - 1
+ * points, 0 if either is empty.  Any lengths. */
+VLX_API int32_t vlxb_pmul(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_pmul(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+/* One-point dst = sum of a[i] * b[i] (nothing conjugated); dst->delta is left alone. */
+VLX_API int32_t vlxbs_dot(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfbs_dot(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
 
 /* ======================================================================== */
 /* Element-wise: arithmetic and math                                        */
 /* ======================================================================== */
 
+/* In place, one vector; points < 1 is a no-op returning 0.  B stands for
+ * 1e100 (float: 1e15), E for ln B = 230.2585 (float: 34.538776), T for the
+ * smallest normal value.  "Real only" functions return -1 for a complex
+ * vector and change nothing.  Clamps replace domain errors; NaN passes them. */
+
 /* Every scalar times s. */
 VLX_API int32_t vlxi_scale(vlx_t* v, double s);
 VLX_API int32_t vlxfi_scale(vlxf_t* v, float s);
+/* Adds c to every real sample, or to the real part of every complex one. */
+VLX_API int32_t vlxi_offset(vlx_t* v, double c);
+VLX_API int32_t vlxfi_offset(vlxf_t* v, float c);
+/* Multiplies by re + j im; a real vector becomes complex (-1 if it cannot grow). */
+VLX_API int32_t vlxi_cscale(vlx_t* v, double re, double im);
+VLX_API int32_t vlxfi_cscale(vlxf_t* v, float re, float im);
+/* Negates every scalar. */
+VLX_API int32_t vlxi_neg(vlx_t* v);
+VLX_API int32_t vlxfi_neg(vlxf_t* v);
+/* |x|; real only (vlxi_mag takes magnitudes of complex samples). */
+VLX_API int32_t vlxi_abs(vlx_t* v);
+VLX_API int32_t vlxfi_abs(vlxf_t* v);
+/* Complex conjugate (sign bit of im flipped); a real vector is left alone. */
+VLX_API int32_t vlxi_conj(vlx_t* v);
+VLX_API int32_t vlxfi_conj(vlxf_t* v);
+/* Multiplies by j; a real vector becomes complex (-1 if it cannot grow). */
+VLX_API int32_t vlxi_timesi(vlx_t* v);
+VLX_API int32_t vlxfi_timesi(vlxf_t* v);
+/* Magnitude |x| or hypot(re, im); the vector becomes real. */
+VLX_API int32_t vlxi_mag(vlx_t* v);
+VLX_API int32_t vlxfi_mag(vlxf_t* v);
+/* Power x*x or re*re + im*im, B once a part exceeds B; the vector becomes real. */
+VLX_API int32_t vlxi_magsq(vlx_t* v);
+VLX_API int32_t vlxfi_magsq(vlxf_t* v);
+/* Square: x*x (B beyond B); complex parts clamped to +-B first. */
+VLX_API int32_t vlxi_square(vlx_t* v);
+VLX_API int32_t vlxfi_square(vlxf_t* v);
+/* Reciprocal: 1/x, B for 0; complex (0, 0) gives (0, -0). */
+VLX_API int32_t vlxi_recip(vlx_t* v);
+VLX_API int32_t vlxfi_recip(vlxf_t* v);
+/* Square root: 0 for x < 0; complex: the principal root. */
+VLX_API int32_t vlxi_sqrt(vlx_t* v);
+VLX_API int32_t vlxfi_sqrt(vlxf_t* v);
+/* e^x, B for x > E; complex: e^re * (cos im, sin im). */
+VLX_API int32_t vlxi_exp(vlx_t* v);
+VLX_API int32_t vlxfi_exp(vlxf_t* v);
+/* 10^x, B for x > 100 (float: 15); real: the walk stops at the first sample
+ * below -B, leaving it and the rest unchanged; complex: re below -B gives -B. */
+VLX_API int32_t vlxi_exp10(vlx_t* v);
+VLX_API int32_t vlxfi_exp10(vlxf_t* v);
+/* Natural logarithm, ln T below T; complex: (ln |z|, arg z). */
+VLX_API int32_t vlxi_log(vlx_t* v);
+VLX_API int32_t vlxfi_log(vlxf_t* v);
+/* Base-10 logarithm, log10 T below T; complex: (log10 |z|, arg z * log10 e). */
+VLX_API int32_t vlxi_log10(vlx_t* v);
+VLX_API int32_t vlxfi_log10(vlxf_t* v);
+/* factor * log10: 20 for decibels of an amplitude, 10 of a power; complex as vlxi_log10, both parts times factor. */
+VLX_API int32_t vlxi_db(vlx_t* v, double factor);
+VLX_API int32_t vlxfi_db(vlxf_t* v, float factor);
+/* Complex (magnitude, phase in radians) to (re, im); a real vector is left alone. */
+VLX_API int32_t vlxi_ptor(vlx_t* v);
+VLX_API int32_t vlxfi_ptor(vlxf_t* v);
+/* Adds amp * cos(2 pi freq k delta + phase) to sample k (freq in cycles per
+ * unit of x); with flags bit 1 (value 1) a complex vector also gets the sine
+ * in its imaginary part. */
+VLX_API int32_t vlxi_addcos(vlx_t* v, uint32_t flags, double freq, double amp, double phase);
+VLX_API int32_t vlxfi_addcos(vlxf_t* v, uint32_t flags, float freq, float amp, float phase);
+/* Real only: sin, cos, tan, atan, tanh of each sample (radians). */
+VLX_API int32_t vlxi_sin(vlx_t* v);
+VLX_API int32_t vlxfi_sin(vlxf_t* v);
+VLX_API int32_t vlxi_cos(vlx_t* v);
+VLX_API int32_t vlxfi_cos(vlxf_t* v);
+VLX_API int32_t vlxi_tan(vlx_t* v);
+VLX_API int32_t vlxfi_tan(vlxf_t* v);
+VLX_API int32_t vlxi_atan(vlx_t* v);
+VLX_API int32_t vlxfi_atan(vlxf_t* v);
+VLX_API int32_t vlxi_tanh(vlx_t* v);
+VLX_API int32_t vlxfi_tanh(vlxf_t* v);
+/* Real only: acos, asin; 0 where |x| > 1. */
+VLX_API int32_t vlxi_acos(vlx_t* v);
+VLX_API int32_t vlxfi_acos(vlxf_t* v);
+VLX_API int32_t vlxi_asin(vlx_t* v);
+VLX_API int32_t vlxfi_asin(vlxf_t* v);
+/* Real only: cosh (B where |x| > E), sinh (+-B where |x| > E). */
+VLX_API int32_t vlxi_cosh(vlx_t* v);
+VLX_API int32_t vlxfi_cosh(vlxf_t* v);
+VLX_API int32_t vlxi_sinh(vlx_t* v);
+VLX_API int32_t vlxfi_sinh(vlxf_t* v);
+/* Real only: sin(x)/x, 1 at 0 (no factor of pi). */
+VLX_API int32_t vlxi_sinc(vlx_t* v);
+VLX_API int32_t vlxfi_sinc(vlxf_t* v);
+/* Real only: modified Bessel function I0 (B where |x| > E). */
+VLX_API int32_t vlxi_besi0(vlx_t* v);
+VLX_API int32_t vlxfi_besi0(vlxf_t* v);
+/* Real only: Bessel functions J0, J1, and Y0, Y1 (0 where x <= 0). */
+VLX_API int32_t vlxi_besj0(vlx_t* v);
+VLX_API int32_t vlxfi_besj0(vlxf_t* v);
+VLX_API int32_t vlxi_besj1(vlx_t* v);
+VLX_API int32_t vlxfi_besj1(vlxf_t* v);
+VLX_API int32_t vlxi_besy0(vlx_t* v);
+VLX_API int32_t vlxfi_besy0(vlxf_t* v);
+VLX_API int32_t vlxi_besy1(vlx_t* v);
+VLX_API int32_t vlxfi_besy1(vlxf_t* v);
+/* Not implemented: always -1, the vector unchanged. */
+VLX_API int32_t vlxi_erf(vlx_t* v);
+VLX_API int32_t vlxfi_erf(vlxf_t* v);
+VLX_API int32_t vlxi_erfc(vlx_t* v);
+VLX_API int32_t vlxfi_erfc(vlxf_t* v);
+VLX_API int32_t vlxi_gamma(vlx_t* v);
+VLX_API int32_t vlxfi_gamma(vlxf_t* v);
+VLX_API int32_t vlxi_lgamma(vlx_t* v);
+VLX_API int32_t vlxfi_lgamma(vlxf_t* v);
+/* dst = magnitudes of src (real, src's delta and points); src unchanged
+ * unless it is dst. */
+VLX_API int32_t vlxu_mag(vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfu_mag(vlxf_t* src, vlxf_t* dst);
+/* dst = clamped powers of src, as vlxi_magsq. */
+VLX_API int32_t vlxu_magsq(vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfu_magsq(vlxf_t* src, vlxf_t* dst);
+/* dst = square roots of src, as vlxi_sqrt (dst complex if src is). */
+VLX_API int32_t vlxu_sqrt(vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfu_sqrt(vlxf_t* src, vlxf_t* dst);
 
 /* ======================================================================== */
 /* Element-wise: layout operations                                          */
@@ -273,7 +434,18 @@ VLX_API int32_t vlxfi_rev(vlxf_t* v);
 
 /* --- two-operand destination preparation --- */
 
+/* Sizes dst for a two-operand result: -1 (dst untouched) if the points
+ * differ; sets delta to the mean, complex if either source is, points; keeps
+ * the old samples when dst shares a source's data.  -1 if growth fails. */
+VLX_API int32_t vlxb_prepare_dest(vlx_t* a, vlx_t* b, vlx_t* dst);
+VLX_API int32_t vlxfb_prepare_dest(vlxf_t* a, vlxf_t* b, vlxf_t* dst);
+
 /* --- arithmetic kernels --- */
+
+/* Modified Bessel function of the first kind, order 0, of |x|: a stored power
+ * series up to 20 (float: 16), an asymptotic series beyond.  Returns I0. */
+VLX_API double vlx_besi0_kernel(double x);
+VLX_API float vlxf_besi0_kernel(float x);
 
 /* --- filter staging and tolerant point counts --- */
 

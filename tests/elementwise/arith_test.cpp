@@ -1,0 +1,320 @@
+// The in-place arithmetic and math family through the C interface: clamps at
+// and just beyond their limits, fixed values, the real-only refusal, the
+// one-source forms with every aliasing, the tone adder and the I0 kernel
+// against long-double references.
+#include "vlx_test.hpp"
+
+#include <cmath>
+#include <functional>
+#include <string>
+
+namespace {
+
+using namespace vlxtest;
+
+VLX_TEST_TWIN(t_scale, vlxi_scale, vlxfi_scale)
+VLX_TEST_TWIN(t_offset, vlxi_offset, vlxfi_offset)
+VLX_TEST_TWIN(t_cscale, vlxi_cscale, vlxfi_cscale)
+VLX_TEST_TWIN(t_neg, vlxi_neg, vlxfi_neg)
+VLX_TEST_TWIN(t_abs, vlxi_abs, vlxfi_abs)
+VLX_TEST_TWIN(t_conj, vlxi_conj, vlxfi_conj)
+VLX_TEST_TWIN(t_timesi, vlxi_timesi, vlxfi_timesi)
+VLX_TEST_TWIN(t_mag, vlxi_mag, vlxfi_mag)
+VLX_TEST_TWIN(t_magsq, vlxi_magsq, vlxfi_magsq)
+VLX_TEST_TWIN(t_square, vlxi_square, vlxfi_square)
+VLX_TEST_TWIN(t_recip, vlxi_recip, vlxfi_recip)
+VLX_TEST_TWIN(t_sqrt, vlxi_sqrt, vlxfi_sqrt)
+VLX_TEST_TWIN(t_exp, vlxi_exp, vlxfi_exp)
+VLX_TEST_TWIN(t_exp10, vlxi_exp10, vlxfi_exp10)
+VLX_TEST_TWIN(t_log, vlxi_log, vlxfi_log)
+VLX_TEST_TWIN(t_log10, vlxi_log10, vlxfi_log10)
+VLX_TEST_TWIN(t_db, vlxi_db, vlxfi_db)
+VLX_TEST_TWIN(t_ptor, vlxi_ptor, vlxfi_ptor)
+VLX_TEST_TWIN(t_addcos, vlxi_addcos, vlxfi_addcos)
+VLX_TEST_TWIN(t_sin, vlxi_sin, vlxfi_sin)
+VLX_TEST_TWIN(t_acos, vlxi_acos, vlxfi_acos)
+VLX_TEST_TWIN(t_cosh, vlxi_cosh, vlxfi_cosh)
+VLX_TEST_TWIN(t_sinh, vlxi_sinh, vlxfi_sinh)
+VLX_TEST_TWIN(t_sinc, vlxi_sinc, vlxfi_sinc)
+VLX_TEST_TWIN(t_besi0, vlxi_besi0, vlxfi_besi0)
+VLX_TEST_TWIN(t_besj0, vlxi_besj0, vlxfi_besj0)
+VLX_TEST_TWIN(t_besy1, vlxi_besy1, vlxfi_besy1)
+VLX_TEST_TWIN(t_erf, vlxi_erf, vlxfi_erf)
+VLX_TEST_TWIN(t_erfc, vlxi_erfc, vlxfi_erfc)
+VLX_TEST_TWIN(t_gamma, vlxi_gamma, vlxfi_gamma)
+VLX_TEST_TWIN(t_lgamma, vlxi_lgamma, vlxfi_lgamma)
+VLX_TEST_TWIN(t_umag, vlxu_mag, vlxfu_mag)
+VLX_TEST_TWIN(t_umagsq, vlxu_magsq, vlxfu_magsq)
+VLX_TEST_TWIN(t_usqrt, vlxu_sqrt, vlxfu_sqrt)
+
+inline double kernel(double x) { return vlx_besi0_kernel(x); }
+inline float kernel(float x) { return vlxf_besi0_kernel(x); }
+
+template <class V>
+class Arith : public ::testing::Test {};
+TYPED_TEST_SUITE(Arith, Families);
+
+template <class V>
+struct Limits {
+    using T = real_of<V>;
+    static constexpr T big = is_double<V> ? T(1e100) : T(1e15f);
+    static constexpr T e = is_double<V> ? T(230.25850929940458) : T(34.538776f);
+    static constexpr T tiny = is_double<V> ? T(2.2250738585072014e-308) : T(1.1754944e-38f);
+    static constexpr T exp10_max = is_double<V> ? T(100) : T(15);
+};
+
+template <class T>
+T above(T x) {
+    return std::nextafter(x, std::numeric_limits<T>::infinity());
+}
+
+// One row: an operation, its input, whether complex, and the expected
+// scalars with a tolerance in ulps (0: bit for bit).
+template <class V>
+struct Row {
+    std::string name;
+    std::function<int32_t(V*)> op;
+    std::vector<real_of<V>> in;
+    bool is_complex;
+    std::vector<real_of<V>> want;
+    double ulps;
+    int want_complex = -1;  // -1: unchanged
+};
+
+TYPED_TEST(Arith, ClampsAndFixedValues) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    using L = Limits<V>;
+    const T B = L::big, E = L::e;
+    const T ln_t = std::log(L::tiny), log10_t = std::log10(L::tiny);
+    const T nan = std::numeric_limits<T>::quiet_NaN();
+    const T log10e = is_double<V> ? T(0.4342944819032518) : T(0.4342945f);
+    auto f = [](auto fn) { return std::function<int32_t(V*)>(fn); };
+    const std::vector<Row<V>> rows = {
+        {"exp at E", f([](V* v) { return t_exp(v); }), {E, above(E), T(-1000), nan}, false, {std::exp(E), B, 0, nan}, 0},
+        {"exp complex", f([](V* v) { return t_exp(v); }), {above(E), 0, 0, T(M_PI / 2)}, true,
+         {B, 0, std::cos(T(M_PI / 2)), 1}, 0},
+        {"exp10 stops below -B", f([](V* v) { return t_exp10(v); }),
+         {2, L::exp10_max, above(L::exp10_max), -B, -above(B), 3}, false,
+         {std::exp(T(2) * T(2.302585092994046)), std::exp(L::exp10_max * T(2.302585092994046)), B, 0, -above(B), 3}, 0},
+        {"exp10 complex lower clamp is negative", f([](V* v) { return t_exp10(v); }), {-above(B), 0}, true, {-B, T(-0.0)}, 0},
+        {"log below T", f([](V* v) { return t_log(v); }), {0, -1, L::tiny, nan}, false, {ln_t, ln_t, ln_t, nan}, 0},
+        {"log complex", f([](V* v) { return t_log(v); }), {0, 0, 0, 1, above(B), 1}, true,
+         {ln_t, 0, 0, T(M_PI / 2), std::log(B) * T(0.5), std::atan2(T(1), above(B))}, 0},
+        {"log10 complex clamps parts", f([](V* v) { return t_log10(v); }), {-above(B), 0}, true,
+         {std::log10(B * B) * T(0.5), std::atan2(T(0), -B) * log10e}, 0},
+        {"db real", f([](V* v) { return t_db(v, T(20)); }), {T(0.1), 0}, false, {-20, T(20) * log10_t}, 2},
+        {"db complex", f([](V* v) { return t_db(v, T(20)); }), {1, 1, 0, 0}, true,
+         {T(10 * std::log10(2.0L)), T(M_PI / 4 * 20 * 0.43429448190325182765L), T(20) * log10_t, 0}, 2},
+        {"recip", f([](V* v) { return t_recip(v); }), {0, 4, T(-0.0)}, false, {B, T(0.25), B}, 0},
+        {"recip complex", f([](V* v) { return t_recip(v); }), {0, 0, 0, 2, above(B), 0}, true,
+         {0, T(-0.0), 0, T(-0.5), above(B) * (T(1) / B), T(-0.0)}, 0},
+        {"sqrt", f([](V* v) { return t_sqrt(v); }), {-4, 4, T(-0.0)}, false, {0, 2, T(-0.0)}, 0},
+        {"sqrt complex", f([](V* v) { return t_sqrt(v); }), {-4, 0, 0, 0}, true,
+         {T(2) * std::cos(T(M_PI / 2)), 2, 0, 0}, 0},
+        {"magsq", f([](V* v) { return t_magsq(v); }), {B, above(B), -above(B), 3}, false, {B * B, B, B, 9}, 0, 0},
+        {"magsq complex", f([](V* v) { return t_magsq(v); }), {above(B), 0, 3, 4}, true, {B, 25}, 0, 0},
+        {"mag complex", f([](V* v) { return t_mag(v); }), {3, 4, -1, 0}, true, {5, 1}, 0, 0},
+        {"square", f([](V* v) { return t_square(v); }), {above(B), -3}, false, {B, 9}, 0},
+        {"square complex clamps parts", f([](V* v) { return t_square(v); }), {above(B), 0, 1, 2}, true,
+         {B * B, 0, -3, 4}, 0},
+        {"timesi", f([](V* v) { return t_timesi(v); }), {2, -1}, false, {0, 2, 0, -1}, 0, 1},
+        {"timesi complex", f([](V* v) { return t_timesi(v); }), {1, 2}, true, {-2, 1}, 0},
+        {"cscale", f([](V* v) { return t_cscale(v, T(2), T(3)); }), {1, 2}, false, {2, 3, 4, 6}, 0, 1},
+        {"cscale complex", f([](V* v) { return t_cscale(v, T(2), T(3)); }), {1, 1}, true, {-1, 5}, 0},
+        {"offset complex", f([](V* v) { return t_offset(v, T(5)); }), {1, 1}, true, {6, 1}, 0},
+        {"conj", f([](V* v) { return t_conj(v); }), {1, 0, 2, -3}, true, {1, T(-0.0), 2, 3}, 0},
+        {"conj real", f([](V* v) { return t_conj(v); }), {1, -2}, false, {1, -2}, 0},
+        {"ptor real", f([](V* v) { return t_ptor(v); }), {1, -2}, false, {1, -2}, 0},
+        {"ptor", f([](V* v) { return t_ptor(v); }), {2, 0}, true, {2, 0}, 0},
+        {"neg", f([](V* v) { return t_neg(v); }), {0, 1}, true, {T(-0.0), -1}, 0},
+        {"acos", f([](V* v) { return t_acos(v); }), {T(1.5), 1, above(T(1)), -1}, false, {0, 0, 0, T(M_PI)}, 1},
+        {"cosh", f([](V* v) { return t_cosh(v); }), {-above(E), 0}, false, {B, 1}, 0},
+        {"sinh", f([](V* v) { return t_sinh(v); }), {above(E), -above(E), 0}, false, {B, -B, 0}, 0},
+        {"sinc", f([](V* v) { return t_sinc(v); }), {0, T(M_PI / 2)}, false, {1, T(2 / M_PI)}, 1},
+        {"besi0", f([](V* v) { return t_besi0(v); }), {above(E), -above(E), 0}, false, {B, B, 1}, 0},
+        {"besy1", f([](V* v) { return t_besy1(v); }), {0, -1}, false, {0, 0}, 0},
+    };
+    for (const Row<V>& r : rows) {
+        Vec<V> v(r.in, r.is_complex);
+        ASSERT_EQ(r.op(v.get()), 0) << r.name;
+        EXPECT_EQ(v->complex, r.want_complex < 0 ? int(r.is_complex) : r.want_complex) << r.name;
+        const std::vector<T> got = v.values();
+        ASSERT_EQ(got.size(), r.want.size()) << r.name;
+        for (size_t i = 0; i < got.size(); ++i) {
+            const bool ok = r.ulps == 0 ? same_bits(got[i], r.want[i]) || (std::isnan(got[i]) && std::isnan(r.want[i]))
+                                        : ulp_distance(got[i], r.want[i]) <= r.ulps;
+            EXPECT_TRUE(ok) << r.name << " scalar " << i << ": " << got[i] << " want " << r.want[i];
+        }
+    }
+}
+
+TYPED_TEST(Arith, RealOnlyRefusalStubsAndEmptyVectors) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const std::vector<std::function<int32_t(V*)>> real_only = {
+        [](V* v) { return t_abs(v); },   [](V* v) { return t_sin(v); },   [](V* v) { return t_acos(v); },
+        [](V* v) { return t_cosh(v); },  [](V* v) { return t_sinh(v); },  [](V* v) { return t_sinc(v); },
+        [](V* v) { return t_besi0(v); }, [](V* v) { return t_besj0(v); }, [](V* v) { return t_besy1(v); },
+    };
+    for (const auto& op : real_only) {
+        Vec<V> c({1, 2}, true), empty_c({}, true);
+        EXPECT_EQ(op(c.get()), -1);
+        EXPECT_EQ(c.values(), (std::vector<T>{1, 2}));
+        EXPECT_EQ(op(empty_c.get()), -1);
+    }
+    const std::vector<std::function<int32_t(V*)>> stubs = {
+        [](V* v) { return t_erf(v); }, [](V* v) { return t_erfc(v); },
+        [](V* v) { return t_gamma(v); }, [](V* v) { return t_lgamma(v); }};
+    for (const auto& op : stubs) {
+        Vec<V> r({T(0.5)}), empty;
+        EXPECT_EQ(op(r.get()), -1);
+        EXPECT_EQ(op(empty.get()), -1);
+        EXPECT_EQ(r.values(), (std::vector<T>{T(0.5)}));
+    }
+    Vec<V> mag_empty({}, true), magsq_empty({}, true), cscale_empty, timesi_empty;
+    EXPECT_EQ(t_mag(mag_empty.get()), 0);
+    EXPECT_EQ(t_magsq(magsq_empty.get()), 0);
+    EXPECT_EQ(mag_empty->complex, 0);
+    EXPECT_EQ(magsq_empty->complex, 0);
+    EXPECT_EQ(t_cscale(cscale_empty.get(), T(1), T(1)), 0);
+    EXPECT_EQ(t_timesi(timesi_empty.get()), 0);
+    EXPECT_EQ(cscale_empty->complex, 0);
+    EXPECT_EQ(timesi_empty->complex, 0);
+}
+
+// vlxu_ forms: src unchanged, dst a third vector, src itself, or a vector
+// that shares src's data; every result equals the in-place operation's.
+TYPED_TEST(Arith, OneSourceFormsWithEveryAliasing) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    using Ops = std::pair<std::function<int32_t(V*, V*)>, std::function<int32_t(V*)>>;
+    const std::vector<Ops> ops = {
+        {[](V* s, V* d) { return t_umag(s, d); }, [](V* v) { return t_mag(v); }},
+        {[](V* s, V* d) { return t_umagsq(s, d); }, [](V* v) { return t_magsq(v); }},
+        {[](V* s, V* d) { return t_usqrt(s, d); }, [](V* v) { return t_sqrt(v); }},
+    };
+    for (size_t k = 0; k < ops.size(); ++k) {
+        for (bool cplx : {false, true}) {
+            const std::vector<T> in = random_values<T>(cplx ? 202 : 101, 9 + k, -4, 4);
+            Vec<V> expected(in, cplx);
+            expected->delta = T(0.25);
+            ASSERT_EQ(ops[k].second(expected.get()), 0);
+            for (int alias = 0; alias < 3; ++alias) {
+                SCOPED_TRACE(::testing::Message() << "op " << k << " complex " << cplx << " alias " << alias);
+                Vec<V> src(in, cplx), third;
+                src->delta = T(0.25);
+                V shared = *src.get();  // lends src's data
+                shared.alloc = 0;
+                V* dst = alias == 0 ? third.get() : alias == 1 ? src.get() : &shared;
+                ASSERT_EQ(ops[k].first(src.get(), dst), 0);
+                EXPECT_EQ(dst->points, expected->points);
+                EXPECT_EQ(dst->complex, expected->complex);
+                EXPECT_EQ(dst->delta, T(0.25));
+                for (int64_t i = 0; i < expected.scalars(); ++i)
+                    ASSERT_TRUE(same_bits(dst->data[i], expected[i])) << i;
+                if (alias != 1) {
+                    EXPECT_EQ(src.values(), in);
+                }
+                if (alias == 2) t_destroy(&shared);
+            }
+        }
+    }
+}
+
+// Long vectors: the compiler's vector loops (dst apart from src) against the
+// in-place walk and the stated per-sample formula, bit for bit.
+TYPED_TEST(Arith, StreamingLoopsMatchScalarOrder) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const std::vector<T> in = random_values<T>(2 * 1003, 3, -1e3, 1e3);
+    Vec<V> v(in, true), power;
+    ASSERT_EQ(t_umagsq(v.get(), power.get()), 0);
+    ASSERT_EQ(t_scale(v.get(), T(0.7)), 0);
+    ASSERT_EQ(t_conj(v.get()), 0);
+    for (int64_t i = 0; i < 1003; ++i) {
+        const T a = in[2 * i], b = in[2 * i + 1];
+        ASSERT_TRUE(same_bits(power[i], b * b + a * a)) << i;
+        ASSERT_TRUE(same_bits(v[2 * i], a * T(0.7))) << i;
+        ASSERT_TRUE(same_bits(v[2 * i + 1], -(b * T(0.7)))) << i;
+    }
+}
+
+// The float twin takes cosh, sinh, the Bessel functions and hypot in double.
+TEST(ArithFloat, FunctionsThroughDouble) {
+    const std::vector<float> xs = random_values<float>(64, 17, 0.1, 30);
+    struct Case {
+        int32_t (*op)(vlxf_t*);
+        double (*ref)(double);
+    };
+    const Case cases[] = {{vlxfi_cosh, [](double x) { return std::cosh(x); }},
+                          {vlxfi_sinh, [](double x) { return std::sinh(x); }},
+                          {vlxfi_besj0, [](double x) { return j0(x); }},
+                          {vlxfi_besy1, [](double x) { return y1(x); }}};
+    for (const Case& c : cases) {
+        Vec<vlxf_t> v(xs, false);
+        ASSERT_EQ(c.op(v.get()), 0);
+        for (size_t i = 0; i < xs.size(); ++i) EXPECT_TRUE(same_bits(v[i], static_cast<float>(c.ref(xs[i])))) << i;
+    }
+    Vec<vlxf_t> z(xs, true);
+    ASSERT_EQ(vlxfi_mag(z.get()), 0);
+    for (size_t i = 0; i < xs.size() / 2; ++i)
+        EXPECT_TRUE(same_bits(z[i], static_cast<float>(std::hypot(double(xs[2 * i]), double(xs[2 * i + 1])))));
+}
+
+// A tone against the long-double cosine, across several restarts of the
+// recurrence; the complex form with flag 1 also gets the sine.
+TYPED_TEST(Arith, AddcosFollowsTheToneAcrossRestarts) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const int n = 1000;
+    const T freq = T(0.0123), amp = T(1.5), phase = T(0.4), delta = T(0.5);
+    for (uint32_t flags : {0u, 1u}) {
+        for (bool cplx : {false, true}) {
+            Vec<V> v(std::vector<T>(cplx ? 2 * n : n, T(1)), cplx);
+            v->delta = delta;
+            ASSERT_EQ(t_addcos(v.get(), flags, freq, amp, phase), 0);
+            const long double step = (long double)delta * 2 * 3.14159265358979323846L * freq;
+            const long double tol = is_double<V> ? 1e-12L : 2e-4L;
+            for (int k = 0; k < n; ++k) {
+                const long double angle = k * step + phase;
+                const T re = cplx ? v[2 * k] : v[k];
+                ASSERT_TRUE(near(re, 1 + amp * std::cos(angle), tol)) << k;
+                if (cplx) {
+                    ASSERT_TRUE(near(v[2 * k + 1], 1 + (flags ? amp * std::sin(angle) : 0), tol)) << k;
+                }
+            }
+        }
+    }
+    Vec<V> flat({1, 2, 3});
+    ASSERT_EQ(t_addcos(flat.get(), 0u, T(0), T(1), T(0)), 0);
+    EXPECT_EQ(flat.values(), (std::vector<T>{2, 3, 4}));
+}
+
+// I0 by its power series summed in long double to convergence.
+long double besi0_reference(long double x) {
+    const long double u = x * x / 4;
+    long double term = 1, sum = 1;
+    for (int k = 1; k < 500 && term > sum * 1e-22L; ++k) {
+        term *= u / ((long double)k * k);
+        sum += term;
+    }
+    return sum;
+}
+
+TYPED_TEST(Arith, Besi0KernelAgainstLongDoubleSeries) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const T edge = is_double<V> ? T(20) : T(16);
+    const double tol_ulps = is_double<V> ? 8 : 8;
+    std::vector<T> xs = {0, T(0.5), 1, 5, T(-7.25), edge, above(edge), T(25), T(34.5), Limits<V>::e};
+    for (T x : random_values<T>(200, 4, 0, double(Limits<V>::e))) xs.push_back(x);
+    for (T x : xs) {
+        const T want = static_cast<T>(besi0_reference(std::fabs((long double)x)));
+        EXPECT_LE(ulp_distance(kernel(x), want), tol_ulps) << x << ": " << kernel(x) << " vs " << want;
+    }
+    EXPECT_TRUE(same_bits(kernel(T(0)), T(1)));
+    EXPECT_TRUE(std::isnan(kernel(std::numeric_limits<T>::quiet_NaN())));
+}
+
+}  // namespace

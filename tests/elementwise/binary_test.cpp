@@ -1,0 +1,396 @@
+// Two-operand operations through the C interface: every shape with every
+// aliasing of the destination, against per-sample references in the stated
+// order of operations, plus the fixed values of the zero rule and the clamps.
+#include "vlx_test.hpp"
+
+#include <complex>
+#include <functional>
+
+namespace {
+
+using namespace vlxtest;
+
+VLX_TEST_TWIN(t_add, vlxb_add, vlxfb_add)
+VLX_TEST_TWIN(t_sub, vlxb_sub, vlxfb_sub)
+VLX_TEST_TWIN(t_mul, vlxb_mul, vlxfb_mul)
+VLX_TEST_TWIN(t_conj_mul, vlxb_conj_mul, vlxfb_conj_mul)
+VLX_TEST_TWIN(t_div, vlxb_div, vlxfb_div)
+VLX_TEST_TWIN(t_avg_add, vlxb_avg_add, vlxfb_avg_add)
+VLX_TEST_TWIN(t_max, vlxb_max, vlxfb_max)
+VLX_TEST_TWIN(t_min, vlxb_min, vlxfb_min)
+VLX_TEST_TWIN(t_inter, vlxb_inter, vlxfb_inter)
+VLX_TEST_TWIN(t_ritoc, vlxb_ritoc, vlxfb_ritoc)
+VLX_TEST_TWIN(t_pmul, vlxb_pmul, vlxfb_pmul)
+VLX_TEST_TWIN(t_dot, vlxbs_dot, vlxfbs_dot)
+VLX_TEST_TWIN(t_prepare, vlxb_prepare_dest, vlxfb_prepare_dest)
+
+template <class V>
+class Binary : public ::testing::Test {};
+TYPED_TEST_SUITE(Binary, Families);
+
+template <class T>
+using Sample = std::complex<T>;
+
+// Reads sample i of a vector as a complex number (im 0 for a real vector).
+template <class V>
+Sample<real_of<V>> at(V* v, int64_t i) {
+    return v->complex ? Sample<real_of<V>>(v->data[2 * i], v->data[2 * i + 1]) : Sample<real_of<V>>(v->data[i], 0);
+}
+
+enum class Alias { third, dst_a, dst_b };
+
+// Runs `op` on random sources of every shape with dst a third vector, a, or
+// b, and compares each result sample bit for bit with ref(a_i, b_i).  The
+// third-vector case takes the library's vectorised loops, the aliased ones
+// the scalar order, so both meet the same reference.
+template <class V, class Op, class Ref>
+void check_shapes(Op op, Ref ref, int32_t n = 67) {
+    using T = real_of<V>;
+    for (int shape = 0; shape < 4; ++shape) {
+        const bool ac = shape & 1, bc = shape & 2;
+        for (Alias alias : {Alias::third, Alias::dst_a, Alias::dst_b}) {
+            SCOPED_TRACE(::testing::Message() << "a complex " << ac << ", b complex " << bc << ", alias "
+                                              << static_cast<int>(alias));
+            Vec<V> a(random_values<T>(n * (ac ? 2 : 1), 11 + shape, -3, 3), ac);
+            Vec<V> b(random_values<T>(n * (bc ? 2 : 1), 23 + shape, -3, 3), bc);
+            a->delta = T(0.5);
+            b->delta = T(1.5);
+            Vec<V> a0(a.values(), ac), b0(b.values(), bc), third;
+            V* dst = alias == Alias::third ? third.get() : alias == Alias::dst_a ? a.get() : b.get();
+            ASSERT_EQ(op(a.get(), b.get(), dst), 0);
+            EXPECT_EQ(dst->points, n);
+            EXPECT_EQ(dst->complex, (ac || bc) ? 1 : 0);
+            EXPECT_EQ(dst->delta, T(1));
+            for (int64_t i = 0; i < n; ++i) {
+                const Sample<T> want = ref(at(a0.get(), i), at(b0.get(), i), ac, bc);
+                const Sample<T> got = at(dst, i);
+                ASSERT_TRUE(same_bits(got.real(), want.real())) << "re at " << i << ": " << got << " vs " << want;
+                if (ac || bc) {
+                    ASSERT_TRUE(same_bits(got.imag(), want.imag())) << "im at " << i << ": " << got << " vs " << want;
+                }
+            }
+        }
+    }
+}
+
+// Ranking value of max and min: power, or the bound once a part exceeds it.
+template <class V>
+real_of<V> rank(Sample<real_of<V>> z) {
+    const real_of<V> lim = is_double<V> ? real_of<V>(1e100) : real_of<V>(1e15f);
+    if (z.real() > lim || z.real() < -lim || z.imag() > lim || z.imag() < -lim) return lim;
+    return z.imag() * z.imag() + z.real() * z.real();
+}
+
+template <class V>
+struct ShapeCase {
+    const char* name;
+    std::function<int32_t(V*, V*, V*)> op;
+    std::function<Sample<real_of<V>>(Sample<real_of<V>>, Sample<real_of<V>>, bool, bool)> ref;
+};
+
+TYPED_TEST(Binary, EveryShapeWithEveryAliasingMatchesTheStatedOrder) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    using S = Sample<T>;
+    const T alpha = T(0.3);
+    const std::vector<ShapeCase<V>> cases = {
+        {"add", [](V* a, V* b, V* d) { return t_add(a, b, d); },
+         [](S a, S b, bool, bool) { return S(a.real() + b.real(), a.imag() + b.imag()); }},
+        {"sub", [](V* a, V* b, V* d) { return t_sub(a, b, d); },
+         [](S a, S b, bool ac, bool) { return S(a.real() - b.real(), ac ? a.imag() - b.imag() : -b.imag()); }},
+        {"mul", [](V* a, V* b, V* d) { return t_mul(a, b, d); },
+         [](S a, S b, bool ac, bool bc) {
+             if (ac && bc) return S(b.real() * a.real() - b.imag() * a.imag(), a.imag() * b.real() + b.imag() * a.real());
+             return ac ? S(a.real() * b.real(), a.imag() * b.real()) : S(a.real() * b.real(), a.real() * b.imag());
+         }},
+        {"conj_mul", [](V* a, V* b, V* d) { return t_conj_mul(a, b, d); },
+         [](S a, S b, bool ac, bool bc) {
+             if (ac && bc) return S(b.imag() * a.imag() + b.real() * a.real(), a.imag() * b.real() - b.imag() * a.real());
+             return ac ? S(a.real() * b.real(), a.imag() * b.real()) : S(a.real() * b.real(), -(a.real() * b.imag()));
+         }},
+        {"div", [](V* a, V* b, V* d) { return t_div(a, b, d); },
+         [](S a, S b, bool ac, bool bc) {
+             if (!bc) {
+                 const T r = T(1) / b.real();
+                 return ac ? S(a.real() * r, a.imag() * r) : S(a.real() / b.real(), 0);
+             }
+             const T m = b.imag() * b.imag() + b.real() * b.real();
+             const T r = T(1) / m;
+             return S((b.imag() * a.imag() + b.real() * a.real()) * r, (a.imag() * b.real() - b.imag() * a.real()) * r);
+         }},
+        {"avg_add", [alpha](V* a, V* b, V* d) { return t_avg_add(a, b, d, alpha); },
+         [alpha](S a, S b, bool ac, bool bc) {
+             const T re = (a.real() - b.real()) * alpha + b.real();
+             if (ac && bc) return S(re, (a.imag() - b.imag()) * alpha + b.imag());
+             return ac ? S(re, alpha * a.imag()) : S(re, b.imag() * (T(1) - alpha));
+         }},
+        {"max", [](V* a, V* b, V* d) { return t_max(a, b, d); },
+         [](S a, S b, bool ac, bool bc) {
+             if (!ac && !bc) return a.real() > b.real() ? a : b;
+             return rank<V>(a) > rank<V>(b) ? a : b;
+         }},
+        {"min", [](V* a, V* b, V* d) { return t_min(a, b, d); },
+         [](S a, S b, bool ac, bool bc) {
+             if (!ac && !bc) return a.real() < b.real() ? a : b;
+             return rank<V>(b) > rank<V>(a) ? a : b;
+         }},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.name);
+        check_shapes<V>(c.op, c.ref);
+    }
+}
+
+// The backward walk is what lets a real source grow into the complex result:
+// the growth moves the storage, so this also checks that the pointers are
+// read after the preparation.
+TYPED_TEST(Binary, RealSourceGrowsInPlaceIntoComplexResult) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    Vec<V> x({1, 2, 3});
+    Vec<V> w({1, 10, 2, 20, 3, 30}, true);
+    ASSERT_EQ(t_mul(x.get(), w.get(), x.get()), 0);
+    EXPECT_EQ(x->complex, 1);
+    EXPECT_EQ(x.values(), (std::vector<T>{1, 10, 4, 40, 9, 90}));
+    Vec<V> y({1, 2, 3});
+    ASSERT_EQ(t_mul(w.get(), y.get(), y.get()), 0);
+    EXPECT_EQ(y.values(), (std::vector<T>{1, 10, 4, 40, 9, 90}));
+}
+
+TYPED_TEST(Binary, UnequalLengthsZeroExtendInAddAndSub) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    struct Row {
+        bool a_shorter, dst_is_shorter, sub;
+        std::vector<T> want;
+    };
+    const std::vector<Row> rows = {
+        {true, false, false, {11, 22, 33, 40, 50}}, {false, false, false, {11, 22, 33, 40, 50}},
+        {true, true, false, {11, 22, 33, 40, 50}},  {true, false, true, {-9, -18, -27, -40, -50}},
+        {false, true, true, {9, 18, 27, 40, 50}},
+    };
+    for (const Row& r : rows) {
+        Vec<V> s({1, 2, 3}), l({10, 20, 30, 40, 50}), out;
+        s->delta = 1;
+        l->delta = 3;
+        V* a = r.a_shorter ? s.get() : l.get();
+        V* b = r.a_shorter ? l.get() : s.get();
+        V* d = r.dst_is_shorter ? s.get() : out.get();
+        ASSERT_EQ(r.sub ? t_sub(a, b, d) : t_add(a, b, d), 0);
+        EXPECT_EQ(d->points, 5);
+        EXPECT_EQ(d->delta, T(2));
+        EXPECT_EQ(std::vector<T>(d->data, d->data + 5), r.want) << r.a_shorter << r.dst_is_shorter << r.sub;
+        if (!r.dst_is_shorter) {
+            EXPECT_EQ(s.values(), (std::vector<T>{1, 2, 3}));
+        }
+    }
+}
+
+TYPED_TEST(Binary, DivisionByZeroGivesPositiveBound) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const T big = is_double<V> ? T(1e100) : T(1e15f);
+    const T tiny_b = is_double<V> ? T(1e-200) : T(1e-30f);  // its square underflows to 0
+    const T inf = std::numeric_limits<T>::infinity();
+    const T nan = std::numeric_limits<T>::quiet_NaN();
+    struct Row {
+        std::vector<T> a;
+        bool ac;
+        std::vector<T> b;
+        bool bc;
+        std::vector<T> want;
+    };
+    const std::vector<Row> rows = {
+        {{-1}, false, {0}, false, {big}},
+        {{0}, false, {0}, false, {0}},
+        {{3}, false, {T(-0.0)}, false, {big}},
+        {{nan}, false, {0}, false, {big}},  // NaN is not zero
+        {{-2, -3}, true, {0}, false, {big, big}},
+        {{0, 0}, true, {0}, false, {0, 0}},
+        {{0, 0}, true, {tiny_b, 0}, true, {big, big}},  // underflowing m
+        {{0, 0}, true, {0, 0}, true, {0, 0}},
+        {{-1, 0}, true, {T(-0.0), 0}, true, {big, big}},
+        {{0}, false, {0, T(-0.0)}, true, {0, 0}},
+        {{-5}, false, {0, 0}, true, {big, big}},
+        {{4}, false, {0, 2}, true, {0, -2}},
+        {{1}, false, {inf, 0}, true, {nan, nan}},  // b's infinity reaches both parts
+    };
+    for (const Row& r : rows) {
+        Vec<V> a(r.a, r.ac), b(r.b, r.bc), d;
+        ASSERT_EQ(t_div(a.get(), b.get(), d.get()), 0);
+        const std::vector<T> got = d.values();
+        ASSERT_EQ(got.size(), r.want.size());
+        for (size_t i = 0; i < got.size(); ++i) {
+            EXPECT_TRUE(same_bits(got[i], r.want[i]) || (std::isnan(got[i]) && std::isnan(r.want[i])))
+                << "a[0] " << r.a[0] << " b[0] " << r.b[0] << " part " << i << ": " << got[i];
+        }
+    }
+    // A vector divided by itself gives 0 where it holds 0, not 1.
+    Vec<V> x({2, 0, -3});
+    ASSERT_EQ(t_div(x.get(), x.get(), x.get()), 0);
+    EXPECT_EQ(x.values(), (std::vector<T>{1, 0, 1}));
+}
+
+TYPED_TEST(Binary, MaxAndMinRankByClampedPowerWithTiesToB) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const T over = is_double<V> ? T(1e101) : T(1e16f);
+    const T big_but_finite = is_double<V> ? T(1e60) : T(1e10f);  // power beyond the bound
+    struct Row {
+        std::vector<T> a;
+        bool ac;
+        std::vector<T> b;
+        bool bc;
+        std::vector<T> max, min;
+    };
+    const std::vector<Row> rows = {
+        {{2}, false, {0, 2}, true, {0, 2}, {0, 2}},  // tie: b both ways
+        {{0, 2}, true, {2}, false, {2, 0}, {2, 0}},
+        {{over, 0}, true, {big_but_finite, 0}, true, {big_but_finite, 0}, {over, 0}},
+        {{3, 4}, true, {-5}, false, {-5, 0}, {-5, 0}},
+        {{T(NAN)}, false, {1}, false, {1}, {1}},
+        {{1}, false, {T(NAN)}, false, {T(NAN)}, {T(NAN)}},
+        {{T(-0.0)}, false, {0}, false, {0}, {0}},
+    };
+    for (const Row& r : rows) {
+        for (bool is_max : {true, false}) {
+            Vec<V> a(r.a, r.ac), b(r.b, r.bc), d;
+            ASSERT_EQ(is_max ? t_max(a.get(), b.get(), d.get()) : t_min(a.get(), b.get(), d.get()), 0);
+            const std::vector<T>& want = is_max ? r.max : r.min;
+            const std::vector<T> got = d.values();
+            ASSERT_EQ(got.size(), want.size());
+            for (size_t i = 0; i < got.size(); ++i)
+                EXPECT_TRUE(same_bits(got[i], want[i])) << (is_max ? "max" : "min") << " a[0] " << r.a[0] << " part " << i;
+        }
+    }
+}
+
+TYPED_TEST(Binary, InterleaveAndRitoc) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    for (int alias = 0; alias < 3; ++alias) {
+        Vec<V> a({1, 2, 3}), b({10, 11, 20, 21, 30, 31}, true), third;
+        a->delta = 1;
+        b->delta = 1;
+        V* d = alias == 0 ? third.get() : alias == 1 ? a.get() : b.get();
+        ASSERT_EQ(t_inter(a.get(), b.get(), d), 0);
+        EXPECT_EQ(d->points, 6);
+        EXPECT_EQ(d->complex, 1);
+        EXPECT_EQ(d->delta, T(0.5));
+        EXPECT_EQ(std::vector<T>(d->data, d->data + 12), (std::vector<T>{1, 0, 10, 11, 2, 0, 20, 21, 3, 0, 30, 31}));
+    }
+    Vec<V> a({1, 2, 3}), b({4, 5, 6}), c({1, 0}, true), shorter({1});
+    ASSERT_EQ(t_inter(a.get(), a.get(), a.get()), 0);
+    EXPECT_EQ(a.values(), (std::vector<T>{1, 1, 2, 2, 3, 3}));
+    EXPECT_EQ(t_inter(b.get(), shorter.get(), b.get()), -1);
+    EXPECT_EQ(b->points, 3);
+
+    EXPECT_EQ(t_ritoc(c.get(), shorter.get(), b.get()), -1);
+    EXPECT_EQ(t_ritoc(b.get(), shorter.get(), b.get()), -1);
+    EXPECT_EQ(b->complex, 0);
+    Vec<V> re({1, 2, 3}), im({4, 5, 6});
+    ASSERT_EQ(t_ritoc(re.get(), im.get(), im.get()), 0);
+    EXPECT_EQ(im.values(), (std::vector<T>{1, 4, 2, 5, 3, 6}));
+}
+
+TYPED_TEST(Binary, PolynomialProductAgainstDirectConvolution) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    for (int shape = 0; shape < 4; ++shape) {
+        const bool ac = shape & 1, bc = shape & 2;
+        for (bool alias : {false, true}) {
+            const int na = 9, nb = 5;
+            Vec<V> a(random_values<T>(na * (ac ? 2 : 1), 5 + shape), ac);
+            Vec<V> b(random_values<T>(nb * (bc ? 2 : 1), 7 + shape), bc);
+            std::vector<std::complex<long double>> want(na + nb - 1);
+            for (int i = 0; i < na; ++i)
+                for (int j = 0; j < nb; ++j) want[i + j] += std::complex<long double>(at(a.get(), i)) * std::complex<long double>(at(b.get(), j));
+            Vec<V> out;
+            V* d = alias ? b.get() : out.get();
+            ASSERT_EQ(t_pmul(a.get(), b.get(), d), 0);
+            ASSERT_EQ(d->points, na + nb - 1);
+            EXPECT_EQ(d->complex, (ac || bc) ? 1 : 0);
+            const long double tol = 16 * std::numeric_limits<T>::epsilon();
+            for (int k = 0; k < na + nb - 1; ++k) {
+                EXPECT_TRUE(near(at(d, k).real(), want[k].real(), tol)) << k;
+                EXPECT_TRUE(near(at(d, k).imag(), want[k].imag(), tol)) << k;
+            }
+        }
+    }
+    Vec<V> a({1, 2}), empty, d({7});
+    ASSERT_EQ(t_pmul(a.get(), empty.get(), d.get()), 0);
+    EXPECT_EQ(d->points, 0);
+}
+
+TYPED_TEST(Binary, DotSumsEveryPointWithLanePartialSums) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const int lanes = is_double<V> ? 4 : 8;
+    for (int n : {0, 3, lanes, 4 * lanes + 3, 1001}) {
+        const std::vector<T> xa = random_values<T>(n, 1, -1e3, 1e3), xb = random_values<T>(n, 2);
+        T part[8] = {};
+        const int blocked = n - n % lanes;
+        for (int i = 0; i < blocked; ++i) part[i % lanes] = part[i % lanes] + xa[i] * xb[i];
+        T want = 0;
+        for (int k = 0; k < lanes; ++k) want = want + part[k];
+        for (int i = blocked; i < n; ++i) want = want + xa[i] * xb[i];
+        Vec<V> a(xa, false), b(xb, false);
+        a->delta = 4;
+        ASSERT_EQ(t_dot(a.get(), b.get(), a.get()), 0);  // dst a still sums all n
+        EXPECT_EQ(a->points, 1);
+        EXPECT_EQ(a->delta, T(4));
+        EXPECT_TRUE(same_bits(a[0], want)) << n << ": " << a[0] << " vs " << want;
+    }
+    Vec<V> c({1, 2, 3, 4}, true), r({10, 100});
+    ASSERT_EQ(t_dot(c.get(), c.get(), r.get()), 0);
+    EXPECT_EQ(r.values(), (std::vector<T>{(1 - 4) + (9 - 16), 4 + 24}));  // no conjugate
+}
+
+// Allocation failure of the destination through the hooks.
+template <class V>
+int32_t failing_alloc(V* v) {
+    if (v->alloc > 0) std::free(v->data);
+    v->data = nullptr;
+    return 0;
+}
+template <class V>
+int32_t failing_realloc(V* v, int32_t, int32_t) {
+    v->data = nullptr;
+    return 0;
+}
+VLX_TEST_TWIN(t_set_alloc_hook, vlx_lib_alloc, vlxf_lib_alloc)
+
+TYPED_TEST(Binary, PrepareDestFailures) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    Vec<V> a({1, 2}), b({1, 2, 3, 4}, true), longer({1, 2, 3}), d({5});
+    d->delta = 7;
+    EXPECT_EQ(t_prepare(a.get(), longer.get(), d.get()), -1);
+    EXPECT_EQ(d->points, 1);
+    EXPECT_EQ(d->delta, T(7));
+    if constexpr (is_double<V>) {
+        vlx_lib_alloc(failing_alloc<vlx_t>, nullptr);
+        vlx_lib_realloc(failing_realloc<vlx_t>, nullptr);
+    } else {
+        vlxf_lib_alloc(failing_alloc<vlxf_t>, nullptr);
+        vlxf_lib_realloc(failing_realloc<vlxf_t>, nullptr);
+    }
+    const int32_t r_third = t_mul(a.get(), b.get(), d.get());
+    const int32_t r_alias = t_add(a.get(), b.get(), a.get());
+    if constexpr (is_double<V>) {
+        vlx_lib_alloc(nullptr, nullptr);
+        vlx_lib_realloc(nullptr, nullptr);
+    } else {
+        vlxf_lib_alloc(nullptr, nullptr);
+        vlxf_lib_realloc(nullptr, nullptr);
+    }
+    EXPECT_EQ(r_third, -1);
+    EXPECT_EQ(d->points, 0);
+    EXPECT_EQ(d->alloc, 0);
+    EXPECT_EQ(d->complex, 1);
+    EXPECT_EQ(d->delta, T(1));
+    EXPECT_EQ(r_alias, -1);
+    EXPECT_EQ(a->data, nullptr);
+}
+
+}  // namespace
