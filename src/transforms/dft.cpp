@@ -45,14 +45,6 @@ int32_t chirp_free() {
     return a < 0 || b < 0 ? -1 : 0;
 }
 
-// Imaginary parts negated (a sign-bit flip); a real vector is left alone.
-template <VlxVector V>
-void conj_in_place(V* v) {
-    if (!v->complex) return;
-    real_t<V>* x = v->data;
-    for (int64_t k = 0; k < v->points; ++k) x[2 * k + 1] = -x[2 * k + 1];
-}
-
 // log2 of the convolution length: 2 - trunc(ln(n - 1.5) * -1/ln 2), the
 // smallest power of two of at least 2n - 2.  The float family rounds the
 // logarithm to float and multiplies in float, which can overshoot by one
@@ -98,12 +90,12 @@ int32_t update_chirp(ChirpState<V>& state, int32_t n, int32_t d, int32_t length)
     V* chirp = &state.chirp;
     V* spectrum = &state.spectrum;
     const int32_t old_n = chirp->points;
-    if (state.direction == 1) conj_in_place(chirp);
+    if (state.direction == 1 && conj(chirp) < 0) return -1;
     state.direction = d;
     chirp->points = n;
     if (realloc(chirp, old_n, 1) < 0) return -1;
     if (n != old_n) fill_chirp(chirp, n);
-    if (d == 1) conj_in_place(chirp);
+    if (d == 1 && conj(chirp) < 0) return -1;
 
     if (n != old_n) {
         spectrum->points = length;
@@ -129,7 +121,7 @@ int32_t update_chirp(ChirpState<V>& state, int32_t n, int32_t d, int32_t length)
     // Same length, other direction: the spectrum of the conjugate filter is
     // the conjugate of the spectrum with points 1 .. length-1 reversed, so no
     // transform is needed; only the 1/n moves.
-    conj_in_place(spectrum);
+    if (conj(spectrum) < 0) return -1;
     V tail = *spectrum;
     tail.data += 2;
     tail.points -= 1;
