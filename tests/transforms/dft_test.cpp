@@ -3,6 +3,8 @@
 // the cache turn on a change of direction, delta, and the real forms.
 #include "fft_reference.hpp"
 
+#include <thread>
+
 using namespace vlxtest;
 using fftref::cld;
 
@@ -217,4 +219,48 @@ TYPED_TEST(DftTest, RealFormsOfAnyLength) {
     Vec<TypeParam> c({1, 2, 3, 4}, true);
     EXPECT_EQ(t_rdft(&c), -1);
     EXPECT_EQ(c->complex, 1);
+}
+
+// Jobs of distinct lengths on several threads while another thread releases
+// the caches: each call finds its own entry or rebuilds it, so every result
+// must equal the single-threaded one bit for bit.  A cache shared without
+// lock 1 mixes chirps of different lengths.
+TEST(DftThreads, ChirpAndCosineCachesAreShared) {
+    vlx_lib_init();
+    struct Job {
+        int32_t n;
+        int kind;  // 0, 1, 2: vlxi_dft direction; 3, 4: vlxi_dct forward, inverse
+        std::vector<double> in, want;
+    };
+    auto run = [](Job& j, std::vector<double>& out) {
+        Vec<vlx_t> v(j.in, j.kind < 3);
+        const int32_t status = j.kind < 3 ? vlxi_dft(&v, j.kind) : vlxi_dct(&v, j.kind == 4 ? 1u : 0u);
+        out = v.values();
+        return status;
+    };
+    std::vector<Job> jobs = {{6, 0, {}, {}}, {10, 1, {}, {}}, {7, 2, {}, {}}, {100, 0, {}, {}}, {9, 3, {}, {}}, {11, 4, {}, {}}};
+    for (Job& j : jobs) {
+        j.in = random_values<double>(j.kind < 3 ? 2 * size_t(j.n) : size_t(j.n), j.n);
+        ASSERT_EQ(run(j, j.want), 0);
+    }
+    std::atomic<int> failures{0};
+    std::atomic<bool> done{false};
+    std::vector<std::thread> workers;
+    for (int t = 0; t < 3; ++t) {
+        workers.emplace_back([&, t] {
+            std::vector<double> out;
+            for (int r = 0; r < 1000; ++r) {
+                Job& j = jobs[(r + 2 * t) % jobs.size()];
+                if (run(j, out) != 0 || out.size() != j.want.size() || std::memcmp(out.data(), j.want.data(), out.size() * sizeof(double)) != 0)
+                    ++failures;
+            }
+        });
+    }
+    std::thread releaser([&] {
+        while (!done) vlx_free_internal();
+    });
+    for (auto& w : workers) w.join();
+    done = true;
+    releaser.join();
+    EXPECT_EQ(failures, 0);
 }
