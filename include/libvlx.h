@@ -218,7 +218,7 @@ VLX_API int32_t vlxi_irdft(vlx_t* v, int32_t odd);
 VLX_API int32_t vlxfi_irdft(vlxf_t* v, int32_t odd);
 /* Cosine transform of type II of a real vector, any length, in place, with
  * 1/N; flags: 1 inverse, 2 scaled form (bins doubled, bin 0 times sqrt(1/2)).
- * delta becomes 1/(2 N delta).  -1 if complex. */
+ * Forward, delta becomes 1/(2 N delta); the inverse undoes it.  -1 if complex. */
 VLX_API int32_t vlxi_dct(vlx_t* v, uint32_t flags);
 VLX_API int32_t vlxfi_dct(vlxf_t* v, uint32_t flags);
 /* Analytic signal in place, any length: real part the input, imaginary part
