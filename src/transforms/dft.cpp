@@ -143,7 +143,7 @@ int32_t chirp_transform(V* v, int32_t d) {
     }
     const int32_t n = v->points;
     const int32_t exponent = chirp_exponent<V>(n);
-    // 2 * length scalars must fit the vector's int32 capacity
+    // beyond this the length is no int32; the vector refuses 2^30 points itself
     if (exponent > 30) return -1;
     const int32_t length = int32_t(1) << exponent;
     if ((n != state.chirp.points || d != state.direction) && update_chirp(state, n, d, length) < 0) return -1;
