@@ -2,6 +2,7 @@
 #include "core/frame.hpp"
 #include "transforms/transforms.hpp"
 
+#include <algorithm>
 #include <cstdlib>
 
 namespace vlx {
@@ -122,34 +123,76 @@ const uint32_t* fixed_list(int32_t m) {
     return find_or_build<V>(bitrev_state<V>.fixed, m, (size_t(1) << (m / 2 + 1)) + 2, build_fixed);
 }
 
+// From this many bytes of samples on, the list order misses the caches at
+// almost every exchange (see swap_pairs).
+constexpr size_t tiled_bytes = size_t(1) << 20;
+
+template <class T, bool Scaled>
+inline void exchange(T* x, size_t width, uint32_t i, uint32_t j, T f) {
+    T* p = x + width * i;
+    T* q = x + width * j;
+    for (size_t c = 0; c < width; ++c) {
+        const T t = Scaled ? p[c] * f : p[c];
+        p[c] = Scaled ? q[c] * f : q[c];
+        q[c] = t;
+    }
+}
+
+// Exchanges the points of every pair of the list, each sample times f if
+// Scaled.  The pair of high halves (a, b), a < b, exchanges column r(b) of
+// row a with column r(a) of row b; rows are a power of two apart, so the list
+// order would meet each cache line once per point, in conflicting sets.  The
+// walk goes instead by tiles: a whose r(a) fill one cache line, b likewise,
+// so a tile uses its lines in full.  Each pair is still read from the list
+// and visited exactly once (the tile of (b, a) skips it).
+template <class T, bool Scaled>
+void swap_pairs(T* x, const uint32_t* list, int32_t m, size_t width, T f) {
+    if ((width * sizeof(T)) << m < tiled_bytes) {
+        // small enough to stay in cache: the list in its own order
+        for (const uint32_t* p = list; *p != 0; p += 2) exchange<T, Scaled>(x, width, p[0], p[1], f);
+        return;
+    }
+    const int32_t h = m / 2;
+    const size_t r = size_t(1) << h;
+    const size_t words_per_b = m % 2 == 0 ? 2 : 4;
+    constexpr size_t max_tile = 16;
+    const size_t tile = std::min(r, std::min(max_tile, std::max<size_t>(1, 64 / (width * sizeof(T)))));
+    size_t as[max_tile], bs[max_tile];
+    for (size_t i = 0; i < r; i += tile) {
+        for (size_t t = 0; t < tile; ++t) as[t] = reverse_bits(uint32_t(i + t), h);
+        for (size_t j = 0; j < r; j += tile) {
+            for (size_t t = 0; t < tile; ++t) bs[t] = reverse_bits(uint32_t(j + t), h);
+            for (size_t ta = 0; ta < tile; ++ta) {
+                const size_t a = as[ta];
+                // the run of a: pairs (a, a+1), (a, a+2), ...
+                const uint32_t* run = list + words_per_b * (a * r - a * (a + 1) / 2);
+                for (size_t tb = 0; tb < tile; ++tb) {
+                    const size_t b = bs[tb];
+                    if (b <= a) continue;
+                    const uint32_t* e = run + words_per_b * (b - a - 1);
+                    exchange<T, Scaled>(x, width, e[0], e[1], f);
+                    if (words_per_b == 4) exchange<T, Scaled>(x, width, e[2], e[3], f);
+                }
+            }
+        }
+    }
+}
+
 }  // namespace
 
 template <VlxVector V>
 int32_t bitrev(V* v) {
     using T = real_t<V>;
     if (!is_power_of_two(v->points)) return -1;
+    const int32_t m = log2_of(v->points);
     TableReader reader;
-    const uint32_t* swaps = swap_list<V>(log2_of(v->points));
+    const uint32_t* swaps = swap_list<V>(m);
     reader.release_lock();
     if (swaps == nullptr) return -1;
-    T* x = v->data;
-    if (v->complex) {
-        for (const uint32_t* p = swaps; *p != 0; p += 2) {
-            T* a = x + 2 * size_t(p[0]);
-            T* b = x + 2 * size_t(p[1]);
-            const T re = a[0], im = a[1];
-            a[0] = b[0];
-            a[1] = b[1];
-            b[0] = re;
-            b[1] = im;
-        }
-    } else {
-        for (const uint32_t* p = swaps; *p != 0; p += 2) {
-            const T t = x[p[0]];
-            x[p[0]] = x[p[1]];
-            x[p[1]] = t;
-        }
-    }
+    if (v->complex)
+        swap_pairs<T, false>(v->data, swaps, m, 2, T(1));
+    else
+        swap_pairs<T, false>(v->data, swaps, m, 1, T(1));
     return 0;
 }
 
@@ -168,26 +211,14 @@ int32_t bitrev_scale(V* v) {
     if (fixed == nullptr) return -1;
     T* x = v->data;
     if (v->complex) {
-        for (const uint32_t* p = swaps; *p != 0; p += 2) {
-            T* a = x + 2 * size_t(p[0]);
-            T* b = x + 2 * size_t(p[1]);
-            const T re = a[0] * f, im = a[1] * f;
-            a[0] = b[0] * f;
-            a[1] = b[1] * f;
-            b[0] = re;
-            b[1] = im;
-        }
+        swap_pairs<T, true>(x, swaps, m, 2, f);
         for (const uint32_t* p = fixed; *p != fixed_end; ++p) {
             T* a = x + 2 * size_t(*p);
             a[0] = a[0] * f;
             a[1] = a[1] * f;
         }
     } else {
-        for (const uint32_t* p = swaps; *p != 0; p += 2) {
-            const T t = x[p[0]] * f;
-            x[p[0]] = x[p[1]] * f;
-            x[p[1]] = t;
-        }
+        swap_pairs<T, true>(x, swaps, m, 1, f);
         for (const uint32_t* p = fixed; *p != fixed_end; ++p) x[*p] = x[*p] * f;
     }
     return 0;

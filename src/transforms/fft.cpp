@@ -4,6 +4,8 @@
 #include "elementwise/elementwise.hpp"
 #include "transforms/transforms.hpp"
 
+#include "transforms/fft_simd.hpp"
+
 #include <cmath>
 #include <cstdlib>
 
@@ -164,19 +166,102 @@ inline void two_point(T* x) {
     x[3] = i - x[3];
 }
 
+#ifdef VLX_FFT_AVX
+using fft_simd::Avx;
+using fft_simd::Floats128;
+using fft_simd::have_avx;
+using fft_simd::rotate_simd;
+
+template <class S, bool Inverse>
+__attribute__((target("avx"))) void l_block_simd(typename S::scalar* x, size_t q, const typename S::scalar* tw,
+                                                  size_t stride) {
+    using T = typename S::scalar;
+    T* x1 = x + 2 * q;
+    T* x2 = x + 4 * q;
+    T* x3 = x + 6 * q;
+    const size_t step = 6 * stride;
+    for (size_t k = 0; k < q; k += S::width) {
+        const size_t j = 2 * k;
+        const auto a0 = S::load(x + j), a1 = S::load(x1 + j), a2 = S::load(x2 + j), a3 = S::load(x3 + j);
+        const auto u = S::sub(a0, a2);
+        const auto w = S::swap(S::sub(a1, a3));
+        S::store(x + j, S::add(a0, a2));
+        S::store(x1 + j, S::add(a1, a3));
+        const auto plus = S::add(u, w);   // (ur + wi, ui + wr)
+        const auto minus = S::sub(u, w);  // (ur - wi, ui - wr)
+        auto z1 = Inverse ? S::re_im(minus, plus) : S::re_im(plus, minus);
+        auto z3 = Inverse ? S::re_im(plus, minus) : S::re_im(minus, plus);
+        const T* pair = tw + k * step;
+        typename S::reg c1, ab1, c3, ab3;
+        S::template triples<0>(pair, step, c1, ab1);
+        S::template triples<3>(pair, step, c3, ab3);
+        const auto r1 = rotate_simd<S, Inverse>(z1, c1, ab1);
+        const auto r3 = rotate_simd<S, Inverse>(z3, c3, ab3);
+        // index 0 is stored unrotated
+        z1 = k == 0 ? S::first_from(z1, r1) : r1;
+        z3 = k == 0 ? S::first_from(z3, r3) : r3;
+        S::store(x2 + j, z1);
+        S::store(x3 + j, z3);
+    }
+}
+
+// Quarter length 2: one AVX vector of doubles, or 128 bits of floats.
+template <class T, bool Inverse>
+void l_block_of_two(T* x, const T* tw, size_t stride) {
+    if constexpr (std::is_same_v<T, float>)
+        l_block_simd<Floats128, Inverse>(x, 2, tw, stride);
+    else
+        l_block_simd<Avx<double>, Inverse>(x, 2, tw, stride);
+}
+
+#endif
+
 // Depth first: a block of len points, then its half and its two quarters.
 // Blocks touch disjoint points, so this order does exactly the arithmetic of
 // the stage-by-stage walk while keeping small blocks in cache.
-template <class T, bool Inverse>
+template <class T, bool Inverse, bool Vector>
 void split_radix(T* x, size_t len, const T* tw, size_t n) {
-    if (len < 4) {
-        if (len == 2) two_point(x);
+    if (len <= 8) {
+        // the smallest blocks in line: no calls for the leaves
+        if (len == 8) {
+#ifdef VLX_FFT_AVX
+            if (Vector)
+                l_block_of_two<T, Inverse>(x, tw, n / 8);
+            else
+#endif
+                l_block<T, Inverse>(x, 2, tw, n / 8);
+            l_block<T, Inverse>(x, 1, tw, n / 4);
+            two_point(x);
+            two_point(x + 8);
+            two_point(x + 12);
+        } else if (len == 4) {
+            l_block<T, Inverse>(x, 1, tw, n / 4);
+            two_point(x);
+        } else if (len == 2) {
+            two_point(x);
+        }
         return;
     }
-    l_block<T, Inverse>(x, len / 4, tw, n / len);
-    split_radix<T, Inverse>(x, len / 2, tw, n);
-    split_radix<T, Inverse>(x + len, len / 4, tw, n);
-    split_radix<T, Inverse>(x + 3 * len / 2, len / 4, tw, n);
+#ifdef VLX_FFT_AVX
+    if (Vector && len / 4 >= Avx<T>::width)
+        l_block_simd<Avx<T>, Inverse>(x, len / 4, tw, n / len);
+    else
+#endif
+        l_block<T, Inverse>(x, len / 4, tw, n / len);
+    split_radix<T, Inverse, Vector>(x, len / 2, tw, n);
+    split_radix<T, Inverse, Vector>(x + len, len / 4, tw, n);
+    split_radix<T, Inverse, Vector>(x + 3 * len / 2, len / 4, tw, n);
+}
+
+template <class T, bool Inverse>
+void run_butterflies(T* x, size_t n, const T* tw) {
+#ifdef VLX_FFT_AVX
+    if (have_avx()) {
+        split_radix<T, Inverse, true>(x, n, tw, n);
+        return;
+    }
+#endif
+    split_radix<T, Inverse, false>(x, n, tw, n);
 }
 
 template <VlxVector V, bool Inverse>
@@ -190,7 +275,7 @@ int32_t native_fft(V* v) {
         const int32_t status = fft_table<V>(n, &tw);
         reader.release_lock();
         if (status < 0) return status;
-        split_radix<T, Inverse>(v->data, size_t(n), tw, size_t(n));
+        run_butterflies<T, Inverse>(v->data, size_t(n), tw);
     }
     // The reordering takes lock 0 for its lists: the counter must be down first.
     const int32_t status = Inverse ? bitrev(v) : bitrev_scale(v);
@@ -202,6 +287,7 @@ int32_t native_fft(V* v) {
 template <VlxVector V>
 int32_t fft_table(int32_t n, const real_t<V>** table_out) {
     using T = real_t<V>;
+    if (n < 4) return -1;  // pair 0 alone needs length 4
     TwiddleState<V>& state = twiddle_state<V>;
     const int32_t size = 3 * (n / 2);
     for (int32_t i = 0; i < state.count; ++i) {

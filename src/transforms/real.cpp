@@ -4,6 +4,7 @@
 // the reconstruction of a full spectrum from a half one.
 #include "core/frame.hpp"
 #include "elementwise/elementwise.hpp"
+#include "transforms/fft_simd.hpp"
 #include "transforms/transforms.hpp"
 
 #include <limits>
@@ -11,11 +12,46 @@
 namespace vlx {
 namespace {
 
+#ifdef VLX_FFT_AVX
+// The general elements k of a block, W at a time, for as long as W of them
+// remain; returns the first k left over.  Lane i holds element k + i: the
+// mirrored points p + h - k - i and p + 2h - k - i are read and written in
+// reverse.  Each lane does the scalar arithmetic of real_block.
+template <class S>
+__attribute__((target("avx"))) int64_t real_elements_simd(typename S::scalar* e, int64_t h,
+                                                          const typename S::scalar* tw, int64_t stride) {
+    using T = typename S::scalar;
+    constexpr int64_t w = S::width;
+    const T* o1 = e + 4 * h;
+    const T* o3 = e + 6 * h;
+    const size_t step = 6 * size_t(stride);
+    int64_t k = 1;
+    for (; k + w - 1 < h / 2; k += w) {
+        const int64_t j = 2 * k;
+        typename S::reg c1, ab1, c3, ab3;
+        S::template triples<0>(tw + size_t(k) * step, step, c1, ab1);
+        S::template triples<3>(tw + size_t(k) * step, step, c3, ab3);
+        const auto w1 = fft_simd::rotate_simd<S, false>(S::load(o1 + j), c1, ab1);
+        const auto w3 = fft_simd::rotate_simd<S, false>(S::load(o3 + j), c3, ab3);
+        const auto sum = S::add(w1, w3);
+        const auto dsw = S::swap(S::sub(w3, w1));  // (D.im, D.re)
+        const auto e1 = S::load(e + j);
+        T* at2 = e + 2 * (h - k - w + 1);
+        const auto e2 = S::reverse(S::load(at2));
+        S::store(e + j, S::add(e1, sum));
+        S::store(e + 2 * (2 * h - k - w + 1), S::reverse(S::re_im(S::sub(e1, sum), S::sub(sum, e1))));
+        S::store(at2, S::reverse(S::add(e2, dsw)));
+        S::store(e + 2 * (h + k), S::re_im(S::sub(e2, dsw), S::sub(dsw, e2)));
+    }
+    return k;
+}
+#endif
+
 // One block of n = 4h points at point p: from the half spectra of its even
 // part (p .. p+h), and of its two quarter parts (p+2h .. p+2h+h/2 and
 // p+3h .. p+3h+h/2) to its own half spectrum (p .. p+2h).
 template <VlxVector V>
-void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t stride) {
+void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t stride, bool vector) {
     using T = real_t<V>;
     T* e = x + 2 * p;
     T* o1 = e + 4 * h;
@@ -27,7 +63,13 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
     o1[0] = x0 - t;
     e[2 * h + 1] = x3 - x2;
 
-    for (int64_t k = 1; k < h / 2; ++k) {
+    int64_t k = 1;
+#ifdef VLX_FFT_AVX
+    if (vector) k = real_elements_simd<fft_simd::Avx<T>>(e, h, tw, stride);
+#else
+    (void)vector;
+#endif
+    for (; k < h / 2; ++k) {
         const T* pair = tw + 6 * k * stride;
         const int64_t j = 2 * k;
         T re = o1[j], im = o1[j + 1];
@@ -83,6 +125,11 @@ int32_t fft_real_forward(V* v) {
     reader.release_lock();
     if (status < 0) return status;
     T* x = v->data;
+#ifdef VLX_FFT_AVX
+    const bool vector = fft_simd::have_avx();
+#else
+    const bool vector = false;
+#endif
 
     for (int64_t pos = 0, spacing = 4, c = (n + 2) / 4; c > 0; pos = 4 * pos + 6, spacing *= 4, c = (c + 2) / 4) {
         for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) {
@@ -96,7 +143,7 @@ int32_t fft_real_forward(V* v) {
         const int64_t stride = n / (4 * h);
         for (int64_t pos = 0, spacing = 8, c = (stride + 1) / 2; c > 0;
              pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
-            for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) real_block<V>(x, p * h, h, tw, stride);
+            for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) real_block<V>(x, p * h, h, tw, stride, vector);
         }
     }
     v->points = static_cast<int32_t>(n / 2 + 1);

@@ -14,7 +14,7 @@ TYPED_TEST_SUITE(Bitrev, Families);
 // scaled form multiplies each sample by 1/N exactly once; twice is identity.
 TYPED_TEST(Bitrev, PermutesAndScales) {
     using T = real_of<TypeParam>;
-    for (int m = 0; m <= 14; ++m) {
+    for (int m = 0; m <= 18; ++m) {  // past 1 MB of samples in every layout
         const size_t n = size_t(1) << m;
         for (int cplx = 0; cplx <= 1; ++cplx) {
             const size_t width = cplx ? 2 : 1;

@@ -146,6 +146,56 @@ void literal_fft(std::vector<T>& x, bool inverse) {
     x = y;
 }
 
+// The real engine as the recipe reads, on n real samples (n >= 4): scaled
+// reversal, two-point pass, stages of blocks by levels; n/2 + 1 bins out.
+template <class T>
+std::vector<T> literal_rfft(const std::vector<T>& in) {
+    const size_t n = in.size();
+    const int m = log2i(n);
+    const std::vector<T> t = literal_table<T>(n);
+    const T r = std::is_same_v<T, double> ? T(0.7071067811865476) : T(0.70710677f);
+    std::vector<T> x(2 * n, T(0));
+    for (size_t i = 0; i < n; ++i) x[2 * reverse_index(i, m)] = in[i] * (T(1) / T(n));
+    for (size_t pos = 0, sp = 4, c = (n + 2) / 4; c > 0; pos = 4 * pos + 6, sp *= 4, c = (c + 2) / 4)
+        for (size_t b = 0, p = pos; b < c; ++b, p += sp) {
+            const T a = x[2 * p], bb = x[2 * p + 2];
+            x[2 * p] = a + bb, x[2 * p + 2] = a - bb;
+        }
+    auto re = [&](size_t i) -> T& { return x[2 * i]; };
+    auto im = [&](size_t i) -> T& { return x[2 * i + 1]; };
+    for (int s = 0; s <= m - 2; ++s) {
+        const size_t h = size_t(1) << s, len = 4 * h;
+        for (size_t pos = 0, sp = 8, c = (n / len + 1) / 2; c > 0; pos = 4 * pos + 12, sp *= 4, c = (c + 2) / 4)
+            for (size_t b = 0; b < c; ++b) {
+                const size_t p = (pos + b * sp) * h;
+                const T x0 = re(p), x2 = re(p + 2 * h), x3 = re(p + 3 * h), tt = x3 + x2;
+                re(p) = x0 + tt, re(p + 2 * h) = x0 - tt, im(p + h) = x3 - x2;
+                for (size_t k = 1; k < h / 2; ++k) {
+                    const T* pr = &t[6 * (k * (n / len))];
+                    T m1 = (re(p + 2 * h + k) + im(p + 2 * h + k)) * pr[0];
+                    const T w1r = m1 + pr[2] * im(p + 2 * h + k), w1i = m1 + pr[1] * re(p + 2 * h + k);
+                    T m3 = (re(p + 3 * h + k) + im(p + 3 * h + k)) * pr[3];
+                    const T w3r = m3 + pr[5] * im(p + 3 * h + k), w3i = m3 + pr[4] * re(p + 3 * h + k);
+                    const T sr = w1r + w3r, si = w1i + w3i, dr = w3r - w1r, di = w3i - w1i;
+                    const T e1r = re(p + k), e1i = im(p + k), e2r = re(p + h - k), e2i = im(p + h - k);
+                    re(p + k) = e1r + sr, im(p + k) = e1i + si;
+                    re(p + 2 * h - k) = e1r - sr, im(p + 2 * h - k) = si - e1i;
+                    re(p + h - k) = e2r + di, im(p + h - k) = dr + e2i;
+                    re(p + h + k) = e2r - di, im(p + h + k) = dr - e2i;
+                }
+                if (s > 0) {
+                    const size_t k = h / 2;
+                    const T u = -r * re(p + 3 * h + k), v = r * re(p + 2 * h + k);
+                    const T er = re(p + k), ei = im(p + k);
+                    re(p + k) = er + (u + v), im(p + k) = (u - v) + ei;
+                    re(p + h + k) = er - (u + v), im(p + h + k) = (u - v) - ei;
+                }
+            }
+    }
+    x.resize(n + 2);
+    return x;
+}
+
 using cld = std::complex<long double>;
 
 // Unscaled long-double sum with exp(sign j 2 pi n k / N): naive for small or
