@@ -3,6 +3,7 @@
 // may overwrite a source's attributes) and the data pointers after (growing
 // may move them).
 #include "elementwise/elementwise.hpp"
+#include "elementwise/simd.hpp"
 
 #include <type_traits>
 
@@ -18,11 +19,13 @@ struct Cx {
 //   rr(x, y)              real with real, forward; with by_scalar also the
 //                         scalars of complex with complex
 //   cc(ar, ai, br, bi)    complex with complex, forward, pair loaded whole
-//   cr(ar, ai, b)         complex with real, backward
-//   rc(a, br, bi)         real with complex, backward
-// The mixed shapes walk down from the last sample: the result needs two
-// scalars where the real source had one, and only that order lets dst be the
-// real source without overwriting a scalar still to be read.
+//   cr(ar, ai, b)         complex with real
+//   rc(a, br, bi)         real with complex
+// The mixed shapes walk down from the last sample when dst overlaps a
+// source: the result needs two scalars where the real source had one, and
+// only that order lets dst be the real source without overwriting a scalar
+// still to be read.  Apart from the sources the order cannot be seen, and the
+// forward loop is the one that vectorises.
 template <bool by_scalar, VlxVector V, class RR, class CC, class CR, class RC>
 int32_t run_shapes(V* a, V* b, V* dst, RR rr, CC cc, CR cr, RC rc) {
     using T = real_t<V>;
@@ -34,29 +37,45 @@ int32_t run_shapes(V* a, V* b, V* dst, RR rr, CC cc, CR cr, RC rc) {
     const T* y = b->data;
     T* d = dst->data;
     if (!ac && !bc) {
-        for (int64_t i = 0; i < n; ++i) d[i] = rr(x[i], y[i]);
+        simd::dispatch([=]() VLX_INLINE_LOOP {
+            for (int64_t i = 0; i < n; ++i) d[i] = rr(x[i], y[i]);
+        });
     } else if (ac && bc) {
         if constexpr (by_scalar) {
-            for (int64_t i = 0; i < 2 * n; ++i) d[i] = rr(x[i], y[i]);
+            simd::dispatch([=]() VLX_INLINE_LOOP {
+                for (int64_t i = 0; i < 2 * n; ++i) d[i] = rr(x[i], y[i]);
+            });
         } else {
-            for (int64_t i = 0; i < n; ++i) {
-                const Cx<T> r = cc(x[2 * i], x[2 * i + 1], y[2 * i], y[2 * i + 1]);
+            simd::dispatch([=]() VLX_INLINE_LOOP {
+                for (int64_t i = 0; i < n; ++i) {
+                    const Cx<T> r = cc(x[2 * i], x[2 * i + 1], y[2 * i], y[2 * i + 1]);
+                    d[2 * i] = r.re;
+                    d[2 * i + 1] = r.im;
+                }
+            });
+        }
+    } else if (simd::overlaps(d, 2 * n, x, ac ? 2 * n : n) || simd::overlaps(d, 2 * n, y, bc ? 2 * n : n)) {
+        if (ac) {
+            for (int64_t i = n - 1; i >= 0; --i) {
+                const Cx<T> r = cr(x[2 * i], x[2 * i + 1], y[i]);
+                d[2 * i] = r.re;
+                d[2 * i + 1] = r.im;
+            }
+        } else {
+            for (int64_t i = n - 1; i >= 0; --i) {
+                const Cx<T> r = rc(x[i], y[2 * i], y[2 * i + 1]);
                 d[2 * i] = r.re;
                 d[2 * i + 1] = r.im;
             }
         }
-    } else if (ac) {
-        for (int64_t i = n - 1; i >= 0; --i) {
-            const Cx<T> r = cr(x[2 * i], x[2 * i + 1], y[i]);
-            d[2 * i] = r.re;
-            d[2 * i + 1] = r.im;
-        }
     } else {
-        for (int64_t i = n - 1; i >= 0; --i) {
-            const Cx<T> r = rc(x[i], y[2 * i], y[2 * i + 1]);
-            d[2 * i] = r.re;
-            d[2 * i + 1] = r.im;
-        }
+        simd::dispatch([=]() VLX_INLINE_LOOP {
+            for (int64_t i = 0; i < n; ++i) {
+                const Cx<T> r = ac ? cr(x[2 * i], x[2 * i + 1], y[i]) : rc(x[i], y[2 * i], y[2 * i + 1]);
+                d[2 * i] = r.re;
+                d[2 * i + 1] = r.im;
+            }
+        });
     }
     return 0;
 }
@@ -160,7 +179,7 @@ int32_t conj_mul(V* a, V* b, V* dst) {
 }
 
 template <VlxVector V>
-int32_t div(V* a, V* b, V* dst) {
+int32_t divide(V* a, V* b, V* dst) {
     using T = real_t<V>;
     // The substitute for a division by zero is positive whatever the signs.
     constexpr T big = family<V>::bound;
@@ -255,13 +274,13 @@ int32_t pick(V* a, V* b, V* dst, Real take_a, Ranked take_a_by_rank) {
 }  // namespace
 
 template <VlxVector V>
-int32_t max(V* a, V* b, V* dst) {
+int32_t maximum(V* a, V* b, V* dst) {
     using T = real_t<V>;
     return pick(a, b, dst, [](T x, T y) { return x > y; }, [](T ra, T rb) { return ra > rb; });
 }
 
 template <VlxVector V>
-int32_t min(V* a, V* b, V* dst) {
+int32_t minimum(V* a, V* b, V* dst) {
     using T = real_t<V>;
     return pick(a, b, dst, [](T x, T y) { return x < y; }, [](T ra, T rb) { return rb > ra; });
 }
@@ -446,21 +465,21 @@ int32_t dot(V* a, V* b, V* dst) {
     return 0;
 }
 
-#define VLX_INSTANTIATE(V)                                              \
-    template int32_t prepare_dest<V>(V*, V*, V*);                     \
-    template int32_t add_equal<V>(V*, V*, V*);                        \
-    template int32_t sub_equal<V>(V*, V*, V*);                        \
-    template int32_t add<V>(V*, V*, V*);                              \
-    template int32_t sub<V>(V*, V*, V*);                              \
-    template int32_t mul<V>(V*, V*, V*);                              \
-    template int32_t conj_mul<V>(V*, V*, V*);                         \
-    template int32_t div<V>(V*, V*, V*);                              \
-    template int32_t avg_add<V>(V*, V*, V*, real_t<V>);               \
-    template int32_t max<V>(V*, V*, V*);                              \
-    template int32_t min<V>(V*, V*, V*);                              \
-    template int32_t inter<V>(V*, V*, V*);                            \
-    template int32_t ritoc<V>(V*, V*, V*);                            \
-    template int32_t pmul<V>(V*, V*, V*);                             \
+#define VLX_INSTANTIATE(V)                              \
+    template int32_t prepare_dest<V>(V*, V*, V*);       \
+    template int32_t add_equal<V>(V*, V*, V*);          \
+    template int32_t sub_equal<V>(V*, V*, V*);          \
+    template int32_t add<V>(V*, V*, V*);                \
+    template int32_t sub<V>(V*, V*, V*);                \
+    template int32_t mul<V>(V*, V*, V*);                \
+    template int32_t conj_mul<V>(V*, V*, V*);           \
+    template int32_t divide<V>(V*, V*, V*);             \
+    template int32_t avg_add<V>(V*, V*, V*, real_t<V>); \
+    template int32_t maximum<V>(V*, V*, V*);            \
+    template int32_t minimum<V>(V*, V*, V*);            \
+    template int32_t inter<V>(V*, V*, V*);              \
+    template int32_t ritoc<V>(V*, V*, V*);              \
+    template int32_t pmul<V>(V*, V*, V*);               \
     template int32_t dot<V>(V*, V*, V*);
 VLX_INSTANTIATE(vlx_t)
 VLX_INSTANTIATE(vlxf_t)
@@ -479,12 +498,12 @@ VLX_API int32_t vlxb_mul(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::mul(a, b,
 VLX_API int32_t vlxfb_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::mul(a, b, dst); }
 VLX_API int32_t vlxb_conj_mul(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::conj_mul(a, b, dst); }
 VLX_API int32_t vlxfb_conj_mul(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::conj_mul(a, b, dst); }
-VLX_API int32_t vlxb_div(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::div(a, b, dst); }
-VLX_API int32_t vlxfb_div(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::div(a, b, dst); }
-VLX_API int32_t vlxb_max(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::max(a, b, dst); }
-VLX_API int32_t vlxfb_max(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::max(a, b, dst); }
-VLX_API int32_t vlxb_min(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::min(a, b, dst); }
-VLX_API int32_t vlxfb_min(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::min(a, b, dst); }
+VLX_API int32_t vlxb_div(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::divide(a, b, dst); }
+VLX_API int32_t vlxfb_div(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::divide(a, b, dst); }
+VLX_API int32_t vlxb_max(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::maximum(a, b, dst); }
+VLX_API int32_t vlxfb_max(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::maximum(a, b, dst); }
+VLX_API int32_t vlxb_min(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::minimum(a, b, dst); }
+VLX_API int32_t vlxfb_min(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::minimum(a, b, dst); }
 VLX_API int32_t vlxb_inter(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::inter(a, b, dst); }
 VLX_API int32_t vlxfb_inter(vlxf_t* a, vlxf_t* b, vlxf_t* dst) { return vlx::inter(a, b, dst); }
 VLX_API int32_t vlxb_ritoc(vlx_t* a, vlx_t* b, vlx_t* dst) { return vlx::ritoc(a, b, dst); }

@@ -23,13 +23,13 @@ template <VlxVector V> int32_t mul(V* a, V* b, V* dst);
 // dst = a * conj(b) (vlxb_conj_mul).
 template <VlxVector V> int32_t conj_mul(V* a, V* b, V* dst);
 // dst = a / b; a division by zero gives the family's bound (vlxb_div).
-template <VlxVector V> int32_t div(V* a, V* b, V* dst);
+template <VlxVector V> int32_t divide(V* a, V* b, V* dst);
 // dst = (a - b) * alpha + b (vlxb_avg_add).
 template <VlxVector V> int32_t avg_add(V* a, V* b, V* dst, real_t<V> alpha);
 // The larger or smaller sample of each pair, by clamped power once either
 // source is complex; ties go to b (vlxb_max, vlxb_min).
-template <VlxVector V> int32_t max(V* a, V* b, V* dst);
-template <VlxVector V> int32_t min(V* a, V* b, V* dst);
+template <VlxVector V> int32_t maximum(V* a, V* b, V* dst);
+template <VlxVector V> int32_t minimum(V* a, V* b, V* dst);
 // a[0], b[0], a[1], b[1], ... (vlxb_inter).
 template <VlxVector V> int32_t inter(V* a, V* b, V* dst);
 // Complex vector from a real and an imaginary part (vlxb_ritoc).
@@ -49,7 +49,7 @@ template <VlxVector V> int32_t scale(V* v, real_t<V> s);
 template <VlxVector V> int32_t offset(V* v, real_t<V> c);
 template <VlxVector V> int32_t cscale(V* v, real_t<V> re, real_t<V> im);
 template <VlxVector V> int32_t neg(V* v);
-template <VlxVector V> int32_t abs(V* v);
+template <VlxVector V> int32_t abs_each(V* v);
 template <VlxVector V> int32_t conj(V* v);
 template <VlxVector V> int32_t timesi(V* v);
 // Magnitude and clamped power, packed to a real vector (vlxi_mag, vlxi_magsq),
@@ -61,29 +61,31 @@ template <VlxVector V> int32_t magsq_to(V* src, V* dst);
 // Clamped square, reciprocal and square root; sqrt_to is vlxu_sqrt.
 template <VlxVector V> int32_t square(V* v);
 template <VlxVector V> int32_t recip(V* v);
-template <VlxVector V> int32_t sqrt(V* v);
+template <VlxVector V> int32_t sqrt_each(V* v);
 template <VlxVector V> int32_t sqrt_to(V* src, V* dst);
 // Complex (magnitude, phase) to (re, im) (vlxi_ptor).
 template <VlxVector V> int32_t ptor(V* v);
 // Adds amp * cos(2 pi freq x + phase), and the sine to the imaginary part of
 // a complex vector when flags bit 1 is set (vlxi_addcos).
 template <VlxVector V> int32_t addcos(V* v, uint32_t flags, real_t<V> freq, real_t<V> amp, real_t<V> phase);
+// The functions of the math library keep a suffix here, so that these
+// templates never hide std's functions from code in namespace vlx.
 // Exponentials and logarithms with their clamps; db is factor * log10.
-template <VlxVector V> int32_t exp(V* v);
+template <VlxVector V> int32_t exp_each(V* v);
 template <VlxVector V> int32_t exp10(V* v);
-template <VlxVector V> int32_t log(V* v);
-template <VlxVector V> int32_t log10(V* v);
+template <VlxVector V> int32_t log_each(V* v);
+template <VlxVector V> int32_t log10_each(V* v);
 template <VlxVector V> int32_t db(V* v, real_t<V> factor);
 // Real-only functions of each sample.
-template <VlxVector V> int32_t sin(V* v);
-template <VlxVector V> int32_t cos(V* v);
-template <VlxVector V> int32_t tan(V* v);
-template <VlxVector V> int32_t atan(V* v);
-template <VlxVector V> int32_t tanh(V* v);
-template <VlxVector V> int32_t acos(V* v);
-template <VlxVector V> int32_t asin(V* v);
-template <VlxVector V> int32_t cosh(V* v);
-template <VlxVector V> int32_t sinh(V* v);
+template <VlxVector V> int32_t sin_each(V* v);
+template <VlxVector V> int32_t cos_each(V* v);
+template <VlxVector V> int32_t tan_each(V* v);
+template <VlxVector V> int32_t atan_each(V* v);
+template <VlxVector V> int32_t tanh_each(V* v);
+template <VlxVector V> int32_t acos_each(V* v);
+template <VlxVector V> int32_t asin_each(V* v);
+template <VlxVector V> int32_t cosh_each(V* v);
+template <VlxVector V> int32_t sinh_each(V* v);
 template <VlxVector V> int32_t sinc(V* v);
 template <VlxVector V> int32_t besi0(V* v);
 template <VlxVector V> int32_t besj0(V* v);

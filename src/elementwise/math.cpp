@@ -36,7 +36,7 @@ inline double y1_64(double x) { return ::y1(x); }
 }  // namespace
 
 template <VlxVector V>
-int32_t exp(V* v) {
+int32_t exp_each(V* v) {
     using T = real_t<V>;
     using L = limits<V>;
     return inplace::map_both(
@@ -82,7 +82,7 @@ int32_t exp10(V* v) {
 }
 
 template <VlxVector V>
-int32_t log(V* v) {
+int32_t log_each(V* v) {
     using T = real_t<V>;
     using L = limits<V>;
     const T log_tiny = inplace::own_log(L::tiny);
@@ -130,7 +130,7 @@ int32_t log10_scaled(V* v, real_t<V> factor, bool scaled) {
 }  // namespace
 
 template <VlxVector V>
-int32_t log10(V* v) {
+int32_t log10_each(V* v) {
     return log10_scaled(v, real_t<V>(1), false);
 }
 
@@ -146,16 +146,16 @@ int32_t db(V* v, real_t<V> factor) {
         using L [[maybe_unused]] = limits<V>;                            \
         return inplace::map_real(v, [](T x) -> T { return expr; });      \
     }
-VLX_REAL_FN(sin, inplace::own_sin(x))
-VLX_REAL_FN(cos, inplace::own_cos(x))
-VLX_REAL_FN(tan, inplace::own_tan(x))
-VLX_REAL_FN(atan, inplace::own_atan(x))
-VLX_REAL_FN(tanh, inplace::own_tanh(x))
-VLX_REAL_FN(acos, beyond(x, T(1)) ? T(0) : inplace::own_acos(x))
-VLX_REAL_FN(asin, beyond(x, T(1)) ? T(0) : inplace::own_asin(x))
+VLX_REAL_FN(sin_each, inplace::own_sin(x))
+VLX_REAL_FN(cos_each, inplace::own_cos(x))
+VLX_REAL_FN(tan_each, inplace::own_tan(x))
+VLX_REAL_FN(atan_each, inplace::own_atan(x))
+VLX_REAL_FN(tanh_each, inplace::own_tanh(x))
+VLX_REAL_FN(acos_each, beyond(x, T(1)) ? T(0) : inplace::own_acos(x))
+VLX_REAL_FN(asin_each, beyond(x, T(1)) ? T(0) : inplace::own_asin(x))
 // cosh and sinh go through double in the float twin too.
-VLX_REAL_FN(cosh, beyond(x, L::exp_max) ? L::big : inplace::wide_cosh(x))
-VLX_REAL_FN(sinh, x > L::exp_max ? L::big : x < -L::exp_max ? -L::big : inplace::wide_sinh(x))
+VLX_REAL_FN(cosh_each, beyond(x, L::exp_max) ? L::big : inplace::wide_cosh(x))
+VLX_REAL_FN(sinh_each, x > L::exp_max ? L::big : x < -L::exp_max ? -L::big : inplace::wide_sinh(x))
 // no factor of pi
 VLX_REAL_FN(sinc, x == T(0) ? T(1) : inplace::own_sin(x) / x)
 VLX_REAL_FN(besi0, beyond(x, L::exp_max) ? L::big : besi0_kernel<V>(x))
@@ -225,20 +225,20 @@ real_t<V> besi0_kernel(real_t<V> x) {
 }
 
 #define VLX_INSTANTIATE(V)                                 \
-    template int32_t exp<V>(V*);                         \
+    template int32_t exp_each<V>(V*);                         \
     template int32_t exp10<V>(V*);                       \
-    template int32_t log<V>(V*);                         \
-    template int32_t log10<V>(V*);                       \
+    template int32_t log_each<V>(V*);                         \
+    template int32_t log10_each<V>(V*);                       \
     template int32_t db<V>(V*, real_t<V>);               \
-    template int32_t sin<V>(V*);                         \
-    template int32_t cos<V>(V*);                         \
-    template int32_t tan<V>(V*);                         \
-    template int32_t atan<V>(V*);                        \
-    template int32_t tanh<V>(V*);                        \
-    template int32_t acos<V>(V*);                        \
-    template int32_t asin<V>(V*);                        \
-    template int32_t cosh<V>(V*);                        \
-    template int32_t sinh<V>(V*);                        \
+    template int32_t sin_each<V>(V*);                         \
+    template int32_t cos_each<V>(V*);                         \
+    template int32_t tan_each<V>(V*);                         \
+    template int32_t atan_each<V>(V*);                        \
+    template int32_t tanh_each<V>(V*);                        \
+    template int32_t acos_each<V>(V*);                        \
+    template int32_t asin_each<V>(V*);                        \
+    template int32_t cosh_each<V>(V*);                        \
+    template int32_t sinh_each<V>(V*);                        \
     template int32_t sinc<V>(V*);                        \
     template int32_t besi0<V>(V*);                       \
     template int32_t besj0<V>(V*);                       \
@@ -256,19 +256,19 @@ extern "C" {
 #define VLX_EXPORT_1(name, fn)                                           \
     VLX_API int32_t vlxi_##name(vlx_t* v) { return vlx::fn(v); }        \
     VLX_API int32_t vlxfi_##name(vlxf_t* v) { return vlx::fn(v); }
-VLX_EXPORT_1(exp, exp)
+VLX_EXPORT_1(exp, exp_each)
 VLX_EXPORT_1(exp10, exp10)
-VLX_EXPORT_1(log, log)
-VLX_EXPORT_1(log10, log10)
-VLX_EXPORT_1(sin, sin)
-VLX_EXPORT_1(cos, cos)
-VLX_EXPORT_1(tan, tan)
-VLX_EXPORT_1(atan, atan)
-VLX_EXPORT_1(tanh, tanh)
-VLX_EXPORT_1(acos, acos)
-VLX_EXPORT_1(asin, asin)
-VLX_EXPORT_1(cosh, cosh)
-VLX_EXPORT_1(sinh, sinh)
+VLX_EXPORT_1(log, log_each)
+VLX_EXPORT_1(log10, log10_each)
+VLX_EXPORT_1(sin, sin_each)
+VLX_EXPORT_1(cos, cos_each)
+VLX_EXPORT_1(tan, tan_each)
+VLX_EXPORT_1(atan, atan_each)
+VLX_EXPORT_1(tanh, tanh_each)
+VLX_EXPORT_1(acos, acos_each)
+VLX_EXPORT_1(asin, asin_each)
+VLX_EXPORT_1(cosh, cosh_each)
+VLX_EXPORT_1(sinh, sinh_each)
 VLX_EXPORT_1(sinc, sinc)
 VLX_EXPORT_1(besi0, besi0)
 VLX_EXPORT_1(besj0, besj0)

@@ -42,7 +42,8 @@ enum class Alias { third, dst_a, dst_b };
 // Runs `op` on random sources of every shape with dst a third vector, a, or
 // b, and compares each result sample bit for bit with ref(a_i, b_i).  The
 // third-vector case takes the library's vectorised loops, the aliased ones
-// the scalar order, so both meet the same reference.
+// the scalar order, so both meet the same reference; a real source that is
+// dst grows (and may move) into the complex result.
 template <class V, class Op, class Ref>
 void check_shapes(Op op, Ref ref, int32_t n = 67) {
     using T = real_of<V>;
@@ -139,22 +140,6 @@ TYPED_TEST(Binary, EveryShapeWithEveryAliasingMatchesTheStatedOrder) {
         SCOPED_TRACE(c.name);
         check_shapes<V>(c.op, c.ref);
     }
-}
-
-// The backward walk is what lets a real source grow into the complex result:
-// the growth moves the storage, so this also checks that the pointers are
-// read after the preparation.
-TYPED_TEST(Binary, RealSourceGrowsInPlaceIntoComplexResult) {
-    using V = TypeParam;
-    using T = real_of<V>;
-    Vec<V> x({1, 2, 3});
-    Vec<V> w({1, 10, 2, 20, 3, 30}, true);
-    ASSERT_EQ(t_mul(x.get(), w.get(), x.get()), 0);
-    EXPECT_EQ(x->complex, 1);
-    EXPECT_EQ(x.values(), (std::vector<T>{1, 10, 4, 40, 9, 90}));
-    Vec<V> y({1, 2, 3});
-    ASSERT_EQ(t_mul(w.get(), y.get(), y.get()), 0);
-    EXPECT_EQ(y.values(), (std::vector<T>{1, 10, 4, 40, 9, 90}));
 }
 
 TYPED_TEST(Binary, UnequalLengthsZeroExtendInAddAndSub) {
@@ -355,10 +340,10 @@ int32_t failing_alloc(V* v) {
 }
 template <class V>
 int32_t failing_realloc(V* v, int32_t, int32_t) {
+    if (v->alloc > 0) std::free(v->data);  // the library drops the block
     v->data = nullptr;
     return 0;
 }
-VLX_TEST_TWIN(t_set_alloc_hook, vlx_lib_alloc, vlxf_lib_alloc)
 
 TYPED_TEST(Binary, PrepareDestFailures) {
     using V = TypeParam;
