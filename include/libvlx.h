@@ -204,6 +204,32 @@ VLX_API int32_t vlxfi_recon(vlxf_t* v);
 
 /* --- any length, cosine transform, analytic signal --- */
 
+/* Complex transform of any length in place, real or complex input; inverse
+ * 0 forward with 1/N, non-zero inverse.  Fewer than 2 points: delta only. */
+VLX_API int32_t vlxi_dft(vlx_t* v, int32_t inverse);
+VLX_API int32_t vlxfi_dft(vlxf_t* v, int32_t inverse);
+/* Real vector of any length N to its half spectrum of N/2 + 1 bins, with
+ * 1/N.  -1 if complex. */
+VLX_API int32_t vlxi_rdft(vlx_t* v);
+VLX_API int32_t vlxfi_rdft(vlxf_t* v);
+/* Half spectrum of P points back to real samples: 2(P - 1) of them, or
+ * 2(P - 1) + 1 if odd is non-zero. */
+VLX_API int32_t vlxi_irdft(vlx_t* v, int32_t odd);
+VLX_API int32_t vlxfi_irdft(vlxf_t* v, int32_t odd);
+/* Cosine transform of type II of a real vector, any length, in place, with
+ * 1/N; flags: 1 inverse, 2 scaled form (bins doubled, bin 0 times sqrt(1/2)).
+ * Forward, delta becomes 1/(2 N delta); the inverse undoes it.  -1 if complex. */
+VLX_API int32_t vlxi_dct(vlx_t* v, uint32_t flags);
+VLX_API int32_t vlxfi_dct(vlxf_t* v, uint32_t flags);
+/* Analytic signal in place, any length: real part the input, imaginary part
+ * its Hilbert transform; complex for 2 points or more. */
+VLX_API int32_t vlxi_analytic(vlx_t* v);
+VLX_API int32_t vlxfi_analytic(vlxf_t* v);
+/* Hilbert transform in place, any length (DC and Nyquist go to 0); a real
+ * vector stays real, a complex one complex. */
+VLX_API int32_t vlxi_hilbert(vlx_t* v);
+VLX_API int32_t vlxfi_hilbert(vlxf_t* v);
+
 
 /* ======================================================================== */
 /* Element-wise: two-operand operations                                     */

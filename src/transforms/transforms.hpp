@@ -55,5 +55,13 @@ template <VlxVector V> int32_t orecon(V* v, int32_t odd);
 
 // Transform of any length (vlxi_dft).
 template <VlxVector V> int32_t dft(V* v, int32_t inverse);
+// Real vector of any length to its half spectrum, and back (vlxi_rdft, vlxi_irdft).
+template <VlxVector V> int32_t rdft(V* v);
+template <VlxVector V> int32_t irdft(V* v, int32_t odd);
+// Cosine transform of type II and its inverse, any length (vlxi_dct).
+template <VlxVector V> int32_t dct(V* v, uint32_t flags);
+// Analytic signal and Hilbert transform, any length (vlxi_analytic, vlxi_hilbert).
+template <VlxVector V> int32_t analytic(V* v);
+template <VlxVector V> int32_t hilbert(V* v);
 
 }  // namespace vlx

@@ -1,0 +1,164 @@
+// Transforms of any length: accuracy against long double, the chirp path bit
+// for bit against a literal chirp-z on the literal power-of-two engine
+// (through cache turns), delta, and the real forms.
+#include "fft_reference.hpp"
+
+using namespace vlxtest;
+
+namespace {
+
+VLX_TEST_TWIN(t_dft, vlxi_dft, vlxfi_dft)
+VLX_TEST_TWIN(t_rdft, vlxi_rdft, vlxfi_rdft)
+VLX_TEST_TWIN(t_irdft, vlxi_irdft, vlxfi_irdft)
+
+template <class V>
+int32_t free_caches() {
+    if constexpr (is_double<V>) return vlx_free_internal();
+    else return vlxf_free_internal();
+}
+
+template <class V>
+class DftTest : public ::testing::Test {};
+TYPED_TEST_SUITE(DftTest, Families);
+
+// v = v * c point by point, in the library's product order; v may be real.
+template <class T>
+void literal_mul(std::vector<T>& v, bool& cplx, const std::vector<T>& c) {
+    std::vector<T> out(c.size());
+    for (size_t i = 0; i < c.size() / 2; ++i) {
+        const T ar = cplx ? v[2 * i] : v[i], ai = cplx ? v[2 * i + 1] : 0, br = c[2 * i], bi = c[2 * i + 1];
+        out[2 * i] = cplx ? br * ar - bi * ai : ar * br;
+        out[2 * i + 1] = cplx ? ai * br + bi * ar : ar * bi;
+    }
+    v = out, cplx = true;
+}
+
+// The chirp-z transform from its recipe, in the last direction of `dirs`, on
+// a cache built for the first one and turned at every change since.
+template <class T>
+std::vector<T> literal_chirp_z(std::vector<T> x, bool cplx, const std::vector<int>& dirs) {
+    constexpr bool dbl = std::is_same_v<T, double>;
+    const size_t n = cplx ? x.size() / 2 : x.size();
+    size_t len = 4;
+    while (len < 2 * n - 2) len *= 2;
+    auto chirp = [&](bool conj) {  // m runs through i^2 mod 2n
+        std::vector<T> c(2 * n);
+        for (int64_t i = 0, m = 1; i < int64_t(n); ++i) {
+            m = (m + 2 * i - 1) % int64_t(2 * n);
+            const T a = (T(m) * (dbl ? T(-3.141592653589793) : T(-3.1415927f))) * (T(1) / T(n));
+            c[2 * i] = dbl ? T(std::cos(double(a))) : std::cos(float(a));
+            c[2 * i + 1] = (conj ? -1 : 1) * (dbl ? T(std::sin(double(a))) : std::sin(float(a)));
+        }
+        return c;
+    };
+    const std::vector<T> c0 = chirp(dirs[0] == 1), c = chirp(dirs.back() == 1);
+    std::vector<T> s(2 * len, T(0));
+    s[0] = 1;
+    for (size_t i = 1; i < n; ++i)
+        s[2 * i] = s[2 * (len - i)] = c0[2 * i], s[2 * i + 1] = s[2 * (len - i) + 1] = -c0[2 * i + 1];
+    if (dirs[0] == 0)
+        for (auto& e : s) e = e * (T(1) / T(n));
+    fftref::literal_fft(s, true);
+    for (size_t k = 1; k < dirs.size(); ++k) {  // conjugate, reverse 1 .. len-1, move 1/n
+        if (dirs[k] == dirs[k - 1]) continue;
+        const std::vector<T> t(s);
+        const T f = dirs[k] != 0 ? T(n) : T(1) / T(n);
+        for (size_t i = 0, j = 0; i < len; ++i, j = len - i)
+            s[2 * i] = t[2 * j] * f, s[2 * i + 1] = -t[2 * j + 1] * f;
+    }
+    literal_mul(x, cplx, c);
+    x.resize(2 * len, T(0));
+    fftref::literal_fft(x, true);
+    literal_mul(x, cplx, s);
+    fftref::literal_fft(x, false);
+    x.resize(2 * n);
+    literal_mul(x, cplx, c);
+    return x;
+}
+
+}  // namespace
+
+// Relative L2 error against a long-double sum, then the inverse restores the
+// input.  The chirp path is two power-of-two transforms of length L < 4N
+// between products with unit-modulus factors, so the bound is twice the
+// engine's for length L.  That one is not eps sqrt(log2 L): the engine's
+// twiddle recurrence adds up to min(L/8, 256) eps and dominates from L = 1024
+// (measured about 85 eps at L = 4096 against a bound of 540 eps).
+TYPED_TEST(DftTest, MatchesLongDoubleSumAndRoundTrips) {
+    using T = real_of<TypeParam>;
+    for (int32_t n : {1, 2, 3, 5, 6, 7, 12, 17, 31, 33, 60, 97, 127, 129, 255, 257, 360, 1000, 1023, 1025, 2187, 3001}) {
+        const std::vector<T> x = random_values<T>(2 * size_t(n), 7u + n);
+        Vec<TypeParam> v(x, true);
+        ASSERT_EQ(t_dft(&v, 0), 0) << n;
+        std::vector<fftref::cld> in(n);
+        for (int32_t i = 0; i < n; ++i) in[i] = fftref::cld(x[2 * i], x[2 * i + 1]);
+        int m = 2;
+        while ((int64_t(1) << m) < 2 * int64_t(n) - 2) ++m;
+        const double tol = 2 * fftref::transform_tolerance(std::numeric_limits<T>::epsilon(), m);
+        EXPECT_LE(double(fftref::rel_l2(v->data, fftref::exact_dft(in, false), n)), tol) << n;
+        ASSERT_EQ(t_dft(&v, 1), 0) << n;
+        EXPECT_LE(double(fftref::rel_l2(v->data, in, n)), tol) << n;
+    }
+}
+
+// Bit for bit, real and complex input, fresh and turned caches.  Direction 2
+// gets forward chirps without 1/N and turns without conjugation.
+TYPED_TEST(DftTest, ChirpPathIsBitExactThroughCacheTurns) {
+    using T = real_of<TypeParam>;
+    const std::vector<std::vector<int>> runs = {{0}, {1}, {2}, {0, 1}, {1, 0}, {0, 2}, {2, 0}, {0, 1, 0}};
+    for (int32_t n : {3, 5, 6, 9, 10, 100, 1025}) {
+        for (bool cplx : {true, false}) {
+            const std::vector<T> x = random_values<T>(cplx ? 2 * size_t(n) : size_t(n), 3u * n);
+            for (const auto& dirs : runs) {
+                ASSERT_EQ(free_caches<TypeParam>(), 0);
+                Vec<TypeParam> v;
+                for (int d : dirs) {
+                    v.assign(x, cplx);
+                    ASSERT_EQ(t_dft(&v, d), 0);
+                }
+                const std::vector<T> want = literal_chirp_z(x, cplx, dirs);
+                ASSERT_EQ(v.scalars(), int64_t(want.size()));
+                for (size_t i = 0; i < want.size(); ++i)
+                    ASSERT_TRUE(same_bits(v[i], want[i])) << n << " run of " << dirs.size() << " at " << i;
+            }
+        }
+    }
+}
+
+// delta is 1/(N delta) of the delta at entry, the fallback for a zero of
+// either sign, 1/delta below 2 points (no error for 0 points).
+TYPED_TEST(DftTest, DeltaFollowsTheEntryValue) {
+    using T = real_of<TypeParam>;
+    for (int32_t n : {0, 1, 6, 7, 8}) {
+        for (T delta : {T(0), T(-0.0), T(0.3), T(-2)}) {
+            Vec<TypeParam> v(random_values<T>(size_t(n), n), false);
+            v->delta = delta;
+            ASSERT_EQ(t_dft(&v, 0), 0);
+            const T want = delta == 0 ? (is_double<TypeParam> ? T(1e100) : T(999999986991104.0f))
+                                      : T(1) / (T(n > 1 ? n : 1) * delta);
+            EXPECT_TRUE(same_bits(v->delta, want)) << n << " " << delta << ": " << v->delta;
+            EXPECT_EQ(v->complex, n > 1 ? 1 : 0);
+        }
+    }
+}
+
+// rdft keeps the first N/2 + 1 bins of the complex transform (the same bits
+// off the powers of two); irdft gives back N real samples.
+TYPED_TEST(DftTest, RealFormsOfAnyLength) {
+    using T = real_of<TypeParam>;
+    for (int32_t n : {1, 2, 3, 6, 7, 8, 15, 16, 100, 101}) {
+        const std::vector<T> x = random_values<T>(size_t(n), 11u * n);
+        Vec<TypeParam> half(x, false), full(x, false);
+        ASSERT_EQ(t_rdft(&half), 0);
+        ASSERT_EQ(t_dft(&full, 0), 0);
+        ASSERT_EQ(half->points, n / 2 + 1);
+        const double tol = (n & (n - 1)) ? 0 : 40 * std::numeric_limits<T>::epsilon();
+        for (int64_t i = 0; i < half.scalars(); ++i) ASSERT_TRUE(near(half[i], full[i], tol)) << n << " at " << i;
+        ASSERT_EQ(t_irdft(&half, n & 1), 0);
+        ASSERT_EQ(half->points, n);
+        ASSERT_EQ(half->complex, 0);
+        for (int32_t i = 0; i < n; ++i) ASSERT_TRUE(near(half[i], x[i], 40 * std::numeric_limits<T>::epsilon()));
+    }
+    Vec<TypeParam> c({1, 2, 3, 4}, true);
+    EXPECT_EQ(t_rdft(&c), -1);
+}
