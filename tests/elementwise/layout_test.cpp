@@ -8,15 +8,10 @@ using namespace vlxtest;
 
 namespace {
 
-VLX_TEST_TWIN(t_real, vlxi_real, vlxfi_real)
-VLX_TEST_TWIN(t_imag, vlxi_imag, vlxfi_imag)
-VLX_TEST_TWIN(t_rev, vlxi_rev, vlxfi_rev)
-VLX_TEST_TWIN(t_shift, vlxi_shift, vlxfi_shift)
+VLX_TWIN(i, real) VLX_TWIN(i, imag) VLX_TWIN(i, rev) VLX_TWIN(i, shift) VLX_TWIN(i, zpad2) VLX_TWIN(i, unzpad)
+VLX_TWIN(i, zinter)
 VLX_TEST_TWIN(t_swap, vlxi_swap_halves, vlxfi_swap_halves)
 VLX_TEST_TWIN(t_swap2, vlxi_swap_halves2, vlxfi_swap_halves2)
-VLX_TEST_TWIN(t_zpad2, vlxi_zpad2, vlxfi_zpad2)
-VLX_TEST_TWIN(t_unzpad, vlxi_unzpad, vlxfi_unzpad)
-VLX_TEST_TWIN(t_zinter, vlxi_zinter, vlxfi_zinter)
 VLX_TEST_TWIN(t_uzinter, vlxu_zinter, vlxfu_zinter)
 
 // Sample k of a vector as (re, im); im is 0 for a real vector.

@@ -233,14 +233,11 @@ TYPED_TEST(Moments, InPlaceAndComplexShape) {
 
 // A failed allocation is a status: dst is left empty, nothing is written.
 TEST(MomentsHooks, AllocationFailureIsReported) {
-    vlx_alloc_hook_t old_alloc = nullptr;
-    vlx_realloc_hook_t old_realloc = nullptr;
-    vlx_lib_alloc([](vlx_t* v) -> int32_t { v->data = nullptr; return 0; }, &old_alloc);
-    vlx_lib_realloc([](vlx_t* v, int32_t, int32_t) -> int32_t { v->data = nullptr; return 0; }, &old_realloc);
     vlx_t src{1.0, nullptr, 0, 3, 0, 0};
     double lent[3] = {1, 2, 3};
     src.data = lent;  // lent storage: no allocation needed to read it
     Vec<vlx_t> dst;
+    FailingAlloc<vlx_t> failing;
     EXPECT_EQ(vlxs_sum(&src, dst.get()), -1);
     EXPECT_EQ(dst->points, 0);
     EXPECT_EQ(dst->data, nullptr);
@@ -248,6 +245,4 @@ TEST(MomentsHooks, AllocationFailureIsReported) {
     EXPECT_EQ(vlxs_hist(&src, dst.get(), 0, 1, 4), -1);
     EXPECT_EQ(vlxs_peak(&src, dst.get(), VLX_PEAK_SAMPLE, 0), -1);
     EXPECT_EQ(vlxs_peak(&src, &src, VLX_PEAK_SAMPLE, 0), -1);
-    vlx_lib_alloc(old_alloc, nullptr);
-    vlx_lib_realloc(old_realloc, nullptr);
 }
