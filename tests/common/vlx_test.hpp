@@ -123,6 +123,15 @@ inline ::testing::AssertionResult near(long double a, long double b, long double
     return ::testing::AssertionFailure() << a << " and " << b << " differ by more than " << tol;
 }
 
+// Points, complex flag and spacing of a vector in one check.
+template <class V>
+::testing::AssertionResult has_shape(const V* v, int32_t points, int32_t is_complex, double delta) {
+    if (v->points == points && v->complex == is_complex && v->delta == real_of<V>(delta))
+        return ::testing::AssertionSuccess();
+    return ::testing::AssertionFailure() << "points " << v->points << ", complex " << v->complex << ", delta "
+                                         << v->delta << "; want " << points << ", " << is_complex << ", " << delta;
+}
+
 // Every scalar of `got` within `ulps` of `want` (0: bit for bit); a NaN
 // matches only a NaN.
 template <class T>

@@ -323,9 +323,7 @@ TEST(Vector, ConversionToFloatRoundsAndRefusesItself) {
     d->delta = 0.1;
     Vec<vlxf_t> f;
     ASSERT_EQ(vlxu_tof(d.get(), f.get()), 0);
-    EXPECT_EQ(f->points, 2);
-    EXPECT_EQ(f->complex, 1);
-    EXPECT_EQ(f->delta, 0.1f);
+    EXPECT_TRUE(has_shape(f.get(), 2, 1, double(0.1f)));
     EXPECT_EQ(f.values(), (std::vector<float>{0.1f, std::numeric_limits<float>::infinity(), -2.5f, 1.0f / 3}));
     EXPECT_EQ(vlxu_tof(reinterpret_cast<vlx_t*>(f.get()), f.get()), -1);
 

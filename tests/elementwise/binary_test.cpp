@@ -50,9 +50,7 @@ void check_shapes(Op op, Ref ref, int32_t n = 67) {
             Vec<V> a0(a.values(), ac), b0(b.values(), bc), third;
             V* dst = alias == Alias::third ? third.get() : alias == Alias::dst_a ? a.get() : b.get();
             ASSERT_EQ(op(a.get(), b.get(), dst), 0);
-            EXPECT_EQ(dst->points, n);
-            EXPECT_EQ(dst->complex, (ac || bc) ? 1 : 0);
-            EXPECT_EQ(dst->delta, T(1));
+            EXPECT_TRUE(has_shape(dst, n, (ac || bc) ? 1 : 0, 1));
             for (int64_t i = 0; i < n; ++i) {
                 const Sample<T> want = ref(at(a0.get(), i), at(b0.get(), i), ac, bc);
                 const Sample<T> got = at(dst, i);
@@ -241,9 +239,7 @@ TYPED_TEST(Binary, InterleaveAndRitoc) {
         b->delta = 1;
         V* d = alias == 0 ? third.get() : alias == 1 ? a.get() : b.get();
         ASSERT_EQ(t_inter(a.get(), b.get(), d), 0);
-        EXPECT_EQ(d->points, 6);
-        EXPECT_EQ(d->complex, 1);
-        EXPECT_EQ(d->delta, T(0.5));
+        EXPECT_TRUE(has_shape(d, 6, 1, 0.5));
         EXPECT_EQ(std::vector<T>(d->data, d->data + 12), (std::vector<T>{1, 0, 10, 11, 2, 0, 20, 21, 3, 0, 30, 31}));
     }
     Vec<V> a({1, 2, 3}), b({4, 5, 6}), c({1, 0}, true), shorter({1});
@@ -304,8 +300,7 @@ TYPED_TEST(Binary, DotSumsEveryPointWithLanePartialSums) {
         Vec<V> a(xa, false), b(xb, false);
         a->delta = 4;
         ASSERT_EQ(t_dot(a.get(), b.get(), a.get()), 0);  // dst a still sums all n
-        EXPECT_EQ(a->points, 1);
-        EXPECT_EQ(a->delta, T(4));
+        EXPECT_TRUE(has_shape(a.get(), 1, 0, 4));
         EXPECT_TRUE(same_bits(a[0], want)) << n << ": " << a[0] << " vs " << want;
     }
     Vec<V> c({1, 2, 3, 4}, true), r({10, 100});
