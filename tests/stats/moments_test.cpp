@@ -35,17 +35,11 @@ T saturated(T x, T b) {
 
 }  // namespace
 
-// Tolerance: each add of a sequential sum rounds by at most half an ulp of the
-// partial, and on these positive, well-conditioned data the errors have no
-// preferred sign, so they grow like the square root of the adds in one block
-// (the block totals add few more).  We allow 2 * sqrt(adds per block) ulps of
-// the result, plus 8 for the roundings after the sums (divisions, the root,
-// the three-term combination of the skewness about a pivot that is not quite
-// the mean): 13 ulps at 7 points, 98 at a full block.  The double twin lands
-// within a few ulps, the float twin within about 35.  The
-// excess kurtosis is m4/m2^2 - 3, whose subtraction cancels: it is measured in
-// ulps of m4/m2^2, the quantity actually computed.  A wrong divisor (n against
-// n - 1), a lost block or a wrong pivot is off by far more.
+// Tolerance: rounding errors of a sequential sum grow like the square root of
+// the adds in one block, so 2 * sqrt(adds per block) ulps, plus 8 for the
+// divisions, root and pivoted combination after the sums.  The excess kurtosis
+// is measured in ulps of m4/m2^2, the quantity actually computed.  A wrong
+// divisor (n against n - 1), a lost block or a wrong pivot is off by far more.
 TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     using T = real_of<TypeParam>;
     for (const int64_t n : {int64_t(7), int64_t(1000), int64_t(5000), int64_t(2 * 8 * kBlock + 700)}) {

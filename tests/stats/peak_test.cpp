@@ -104,12 +104,11 @@ double hann_lobe(double f) {
     return std::fabs(f) < 1e-9 ? 1.0 : std::sin(M_PI * f) / (M_PI * f) / (1.0 - f * f);
 }
 
-// The log ratio puts the Gaussian lobe its constant belongs to,
-// exp(-(x - x0)^2 / (2 * 0.792233...)), at its true position.  On the power
-// of a Hann window's main lobe, sampled at the spacing where the power one
-// sample off the top is that Gaussian's, exp(-0.5 / 0.792233...), both forms
-// move monotonically with the true position, across the change of bracketing
-// pair too, and stay near it.  Complex sources are refined on their power.
+// The log ratio puts the Gaussian lobe of its constant at its true position.
+// On a Hann window's main-lobe power, sampled where one sample off the top
+// matches that Gaussian, both forms move monotonically with the true position
+// (across a change of bracketing pair too) and stay near it.  Complex sources
+// are refined on their power.
 TYPED_TEST(Peak, LogRatioFollowsTheLobe) {
     using T = real_of<TypeParam>;
     const long double width = 0.792233201343665L;
