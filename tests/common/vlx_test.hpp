@@ -9,6 +9,7 @@
 
 #include <cmath>
 #include <cstdint>
+#include <cstdlib>
 #include <cstring>
 #include <initializer_list>
 #include <limits>
@@ -35,6 +36,9 @@ constexpr bool is_double = std::is_same_v<V, vlx_t>;
     inline auto name(vlx_t* v, A&&... a) { return dfn(v, std::forward<A>(a)...); }              \
     template <class... A>                                                                        \
     inline auto name(vlxf_t* v, A&&... a) { return ffn(v, std::forward<A>(a)...); }
+
+// The usual prefixes: VLX_TWIN(i, neg) is t_neg over vlxi_neg and vlxfi_neg.
+#define VLX_TWIN(prefix, name) VLX_TEST_TWIN(t_##name, vlx##prefix##_##name, vlxf##prefix##_##name)
 
 VLX_TEST_TWIN(t_init, vlx_init, vlxf_init)
 VLX_TEST_TWIN(t_destroy, vlx_destroy, vlxf_destroy)
@@ -118,5 +122,53 @@ inline ::testing::AssertionResult near(long double a, long double b, long double
     if (std::fabs(a - b) <= tol) return ::testing::AssertionSuccess();
     return ::testing::AssertionFailure() << a << " and " << b << " differ by more than " << tol;
 }
+
+// Points, complex flag and spacing of a vector in one check.
+template <class V>
+::testing::AssertionResult has_shape(const V* v, int32_t points, int32_t is_complex, double delta) {
+    if (v->points == points && v->complex == is_complex && v->delta == real_of<V>(delta))
+        return ::testing::AssertionSuccess();
+    return ::testing::AssertionFailure() << "points " << v->points << ", complex " << v->complex << ", delta "
+                                         << v->delta << "; want " << points << ", " << is_complex << ", " << delta;
+}
+
+// Every scalar of `got` within `ulps` of `want` (0: bit for bit); a NaN
+// matches only a NaN.
+template <class T>
+::testing::AssertionResult same_scalars(const std::vector<T>& got, const std::vector<T>& want, double ulps = 0) {
+    if (got.size() != want.size()) return ::testing::AssertionFailure() << got.size() << " scalars, want " << want.size();
+    for (size_t i = 0; i < got.size(); ++i) {
+        const bool ok = (std::isnan(got[i]) && std::isnan(want[i])) ||
+                        (ulps == 0 ? same_bits(got[i], want[i]) : ulp_distance(got[i], want[i]) <= ulps);
+        if (!ok) return ::testing::AssertionFailure() << "scalar " << i << ": " << got[i] << " want " << want[i];
+    }
+    return ::testing::AssertionSuccess();
+}
+
+// Installs the family's storage hooks; null restores the library's own.
+template <class V>
+void set_hooks(int32_t (*a)(V*), int32_t (*r)(V*, int32_t, int32_t), int32_t (*f)(V*) = nullptr) {
+    if constexpr (is_double<V>) {
+        vlx_lib_alloc(a, nullptr), vlx_lib_realloc(r, nullptr), vlx_lib_free(f, nullptr);
+    } else {
+        vlxf_lib_alloc(a, nullptr), vlxf_lib_realloc(r, nullptr), vlxf_lib_free(f, nullptr);
+    }
+}
+
+// While in scope every allocation of the family fails: the hooks release the
+// old block and hand back no storage.
+template <class V>
+struct FailingAlloc {
+    static int32_t alloc(V* v) {
+        if (v->alloc > 0) std::free(v->data);
+        v->data = nullptr;
+        return 0;
+    }
+    static int32_t realloc(V* v, int32_t, int32_t) { return alloc(v); }
+    FailingAlloc() { set_hooks<V>(alloc, realloc); }
+    ~FailingAlloc() { set_hooks<V>(nullptr, nullptr); }
+    FailingAlloc(const FailingAlloc&) = delete;
+    FailingAlloc& operator=(const FailingAlloc&) = delete;
+};
 
 }  // namespace vlxtest

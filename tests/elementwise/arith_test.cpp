@@ -12,37 +12,12 @@ namespace {
 
 using namespace vlxtest;
 
-VLX_TEST_TWIN(t_scale, vlxi_scale, vlxfi_scale)
-VLX_TEST_TWIN(t_offset, vlxi_offset, vlxfi_offset)
-VLX_TEST_TWIN(t_cscale, vlxi_cscale, vlxfi_cscale)
-VLX_TEST_TWIN(t_neg, vlxi_neg, vlxfi_neg)
-VLX_TEST_TWIN(t_abs, vlxi_abs, vlxfi_abs)
-VLX_TEST_TWIN(t_conj, vlxi_conj, vlxfi_conj)
-VLX_TEST_TWIN(t_timesi, vlxi_timesi, vlxfi_timesi)
-VLX_TEST_TWIN(t_mag, vlxi_mag, vlxfi_mag)
-VLX_TEST_TWIN(t_magsq, vlxi_magsq, vlxfi_magsq)
-VLX_TEST_TWIN(t_square, vlxi_square, vlxfi_square)
-VLX_TEST_TWIN(t_recip, vlxi_recip, vlxfi_recip)
-VLX_TEST_TWIN(t_sqrt, vlxi_sqrt, vlxfi_sqrt)
-VLX_TEST_TWIN(t_exp, vlxi_exp, vlxfi_exp)
-VLX_TEST_TWIN(t_exp10, vlxi_exp10, vlxfi_exp10)
-VLX_TEST_TWIN(t_log, vlxi_log, vlxfi_log)
-VLX_TEST_TWIN(t_log10, vlxi_log10, vlxfi_log10)
-VLX_TEST_TWIN(t_db, vlxi_db, vlxfi_db)
-VLX_TEST_TWIN(t_ptor, vlxi_ptor, vlxfi_ptor)
-VLX_TEST_TWIN(t_addcos, vlxi_addcos, vlxfi_addcos)
-VLX_TEST_TWIN(t_sin, vlxi_sin, vlxfi_sin)
-VLX_TEST_TWIN(t_acos, vlxi_acos, vlxfi_acos)
-VLX_TEST_TWIN(t_cosh, vlxi_cosh, vlxfi_cosh)
-VLX_TEST_TWIN(t_sinh, vlxi_sinh, vlxfi_sinh)
-VLX_TEST_TWIN(t_sinc, vlxi_sinc, vlxfi_sinc)
-VLX_TEST_TWIN(t_besi0, vlxi_besi0, vlxfi_besi0)
-VLX_TEST_TWIN(t_besj0, vlxi_besj0, vlxfi_besj0)
-VLX_TEST_TWIN(t_besy1, vlxi_besy1, vlxfi_besy1)
-VLX_TEST_TWIN(t_erf, vlxi_erf, vlxfi_erf)
-VLX_TEST_TWIN(t_erfc, vlxi_erfc, vlxfi_erfc)
-VLX_TEST_TWIN(t_gamma, vlxi_gamma, vlxfi_gamma)
-VLX_TEST_TWIN(t_lgamma, vlxi_lgamma, vlxfi_lgamma)
+VLX_TWIN(i, scale) VLX_TWIN(i, offset) VLX_TWIN(i, cscale) VLX_TWIN(i, neg) VLX_TWIN(i, abs) VLX_TWIN(i, conj)
+VLX_TWIN(i, timesi) VLX_TWIN(i, mag) VLX_TWIN(i, magsq) VLX_TWIN(i, square) VLX_TWIN(i, recip) VLX_TWIN(i, sqrt)
+VLX_TWIN(i, exp) VLX_TWIN(i, exp10) VLX_TWIN(i, log) VLX_TWIN(i, log10) VLX_TWIN(i, db) VLX_TWIN(i, ptor)
+VLX_TWIN(i, addcos) VLX_TWIN(i, sin) VLX_TWIN(i, acos) VLX_TWIN(i, cosh) VLX_TWIN(i, sinh) VLX_TWIN(i, sinc)
+VLX_TWIN(i, besi0) VLX_TWIN(i, besj0) VLX_TWIN(i, besy1) VLX_TWIN(i, erf) VLX_TWIN(i, erfc) VLX_TWIN(i, gamma)
+VLX_TWIN(i, lgamma)
 VLX_TEST_TWIN(t_umag, vlxu_mag, vlxfu_mag)
 VLX_TEST_TWIN(t_umagsq, vlxu_magsq, vlxfu_magsq)
 VLX_TEST_TWIN(t_usqrt, vlxu_sqrt, vlxfu_sqrt)
@@ -139,48 +114,38 @@ TYPED_TEST(Arith, ClampsAndFixedValues) {
         Vec<V> v(r.in, r.is_complex);
         ASSERT_EQ(r.op(v.get()), 0) << r.name;
         EXPECT_EQ(v->complex, r.want_complex < 0 ? int(r.is_complex) : r.want_complex) << r.name;
-        const std::vector<T> got = v.values();
-        ASSERT_EQ(got.size(), r.want.size()) << r.name;
-        for (size_t i = 0; i < got.size(); ++i) {
-            const bool ok = r.ulps == 0 ? same_bits(got[i], r.want[i]) || (std::isnan(got[i]) && std::isnan(r.want[i]))
-                                        : ulp_distance(got[i], r.want[i]) <= r.ulps;
-            EXPECT_TRUE(ok) << r.name << " scalar " << i << ": " << got[i] << " want " << r.want[i];
-        }
+        EXPECT_TRUE(same_scalars(v.values(), r.want, r.ulps)) << r.name;
     }
 }
 
 TYPED_TEST(Arith, RealOnlyRefusalStubsAndEmptyVectors) {
     using V = TypeParam;
     using T = real_of<V>;
-    const std::vector<std::function<int32_t(V*)>> real_only = {
-        [](V* v) { return t_abs(v); },   [](V* v) { return t_sin(v); },   [](V* v) { return t_acos(v); },
-        [](V* v) { return t_cosh(v); },  [](V* v) { return t_sinh(v); },  [](V* v) { return t_sinc(v); },
-        [](V* v) { return t_besi0(v); }, [](V* v) { return t_besj0(v); }, [](V* v) { return t_besy1(v); },
+    // Real-only operations refuse complex input, even empty; the stubs always fail.
+    const std::vector<std::pair<bool, std::function<int32_t(V*)>>> refusing = {
+        {true, [](V* v) { return t_abs(v); }},    {true, [](V* v) { return t_sin(v); }},
+        {true, [](V* v) { return t_acos(v); }},   {true, [](V* v) { return t_cosh(v); }},
+        {true, [](V* v) { return t_sinh(v); }},   {true, [](V* v) { return t_sinc(v); }},
+        {true, [](V* v) { return t_besi0(v); }},  {true, [](V* v) { return t_besj0(v); }},
+        {true, [](V* v) { return t_besy1(v); }},  {false, [](V* v) { return t_erf(v); }},
+        {false, [](V* v) { return t_erfc(v); }},  {false, [](V* v) { return t_gamma(v); }},
+        {false, [](V* v) { return t_lgamma(v); }},
     };
-    for (const auto& op : real_only) {
-        Vec<V> c({1, 2}, true), empty_c({}, true);
-        EXPECT_EQ(op(c.get()), -1);
-        EXPECT_EQ(c.values(), (std::vector<T>{1, 2}));
-        EXPECT_EQ(op(empty_c.get()), -1);
-    }
-    const std::vector<std::function<int32_t(V*)>> stubs = {
-        [](V* v) { return t_erf(v); }, [](V* v) { return t_erfc(v); },
-        [](V* v) { return t_gamma(v); }, [](V* v) { return t_lgamma(v); }};
-    for (const auto& op : stubs) {
-        Vec<V> r({T(0.5)}), empty;
-        EXPECT_EQ(op(r.get()), -1);
+    for (const auto& [cx, op] : refusing) {
+        Vec<V> v({1, 2}, cx), empty({}, cx);
+        EXPECT_EQ(op(v.get()), -1);
         EXPECT_EQ(op(empty.get()), -1);
-        EXPECT_EQ(r.values(), (std::vector<T>{T(0.5)}));
+        EXPECT_EQ(v.values(), (std::vector<T>{1, 2}));
     }
-    Vec<V> mag_empty({}, true), magsq_empty({}, true), cscale_empty, timesi_empty;
-    EXPECT_EQ(t_mag(mag_empty.get()), 0);
-    EXPECT_EQ(t_magsq(magsq_empty.get()), 0);
-    EXPECT_EQ(mag_empty->complex, 0);
-    EXPECT_EQ(magsq_empty->complex, 0);
-    EXPECT_EQ(t_cscale(cscale_empty.get(), T(1), T(1)), 0);
-    EXPECT_EQ(t_timesi(timesi_empty.get()), 0);
-    EXPECT_EQ(cscale_empty->complex, 0);
-    EXPECT_EQ(timesi_empty->complex, 0);
+    // Empty vectors: mag and magsq still turn real, cscale and timesi stay real.
+    const std::vector<std::pair<bool, std::function<int32_t(V*)>>> empty_ok = {
+        {true, [](V* v) { return t_mag(v); }}, {true, [](V* v) { return t_magsq(v); }},
+        {false, [](V* v) { return t_cscale(v, T(1), T(1)); }}, {false, [](V* v) { return t_timesi(v); }}};
+    for (const auto& [cx, op] : empty_ok) {
+        Vec<V> empty({}, cx);
+        EXPECT_EQ(op(empty.get()), 0);
+        EXPECT_EQ(empty->complex, 0);
+    }
 }
 
 // vlxu_ forms: src unchanged, dst a third vector, src itself, or a vector
@@ -208,9 +173,7 @@ TYPED_TEST(Arith, OneSourceFormsWithEveryAliasing) {
                 shared.alloc = 0;
                 V* dst = alias == 0 ? third.get() : alias == 1 ? src.get() : &shared;
                 ASSERT_EQ(ops[k].first(src.get(), dst), 0);
-                EXPECT_EQ(dst->points, expected->points);
-                EXPECT_EQ(dst->complex, expected->complex);
-                EXPECT_EQ(dst->delta, T(0.25));
+                EXPECT_TRUE(has_shape(dst, expected->points, expected->complex, 0.25));
                 for (int64_t i = 0; i < expected.scalars(); ++i)
                     ASSERT_TRUE(same_bits(dst->data[i], expected[i])) << i;
                 if (alias != 1) {
@@ -328,13 +291,6 @@ TYPED_TEST(Arith, ComplexRoundTrips) {
     }
 }
 
-template <class V>
-int32_t refuse_realloc(V* v, int32_t, int32_t) {
-    if (v->alloc > 0) std::free(v->data);
-    v->data = nullptr;
-    return 0;
-}
-
 // Growth fails in the operations that make a real vector complex: -1, and
 // the vector is empty and safe to destroy.
 TYPED_TEST(Arith, GrowthFailureLeavesAnEmptyVector) {
@@ -344,15 +300,13 @@ TYPED_TEST(Arith, GrowthFailureLeavesAnEmptyVector) {
         [](V* v) { return t_cscale(v, T(1), T(2)); }, [](V* v) { return t_timesi(v); }};
     for (const auto& op : growing) {
         Vec<V> v({1, 2, 3});
-        if constexpr (is_double<V>) vlx_lib_realloc(refuse_realloc<vlx_t>, nullptr);
-        else vlxf_lib_realloc(refuse_realloc<vlxf_t>, nullptr);
-        const int32_t r = op(v.get());
-        if constexpr (is_double<V>) vlx_lib_realloc(nullptr, nullptr);
-        else vlxf_lib_realloc(nullptr, nullptr);
+        int32_t r;
+        {
+            FailingAlloc<V> failing;
+            r = op(v.get());
+        }
         EXPECT_EQ(r, -1);
-        EXPECT_EQ(v->points, 0);
-        EXPECT_EQ(v->alloc, 0);
-        EXPECT_EQ(v->data, nullptr);
+        EXPECT_TRUE(v->points == 0 && v->alloc == 0 && v->data == nullptr);
     }
 }
 
@@ -371,12 +325,11 @@ TYPED_TEST(Arith, Besi0KernelAgainstLongDoubleSeries) {
     using V = TypeParam;
     using T = real_of<V>;
     const T edge = is_double<V> ? T(20) : T(16);
-    const double tol_ulps = is_double<V> ? 8 : 8;
     std::vector<T> xs = {0, T(0.5), 1, 5, T(-7.25), edge, above(edge), T(25), T(34.5), Limits<V>::e};
     for (T x : random_values<T>(200, 4, 0, double(Limits<V>::e))) xs.push_back(x);
     for (T x : xs) {
         const T want = static_cast<T>(besi0_reference(std::fabs((long double)x)));
-        EXPECT_LE(ulp_distance(kernel(x), want), tol_ulps) << x << ": " << kernel(x) << " vs " << want;
+        EXPECT_LE(ulp_distance(kernel(x), want), 8.0) << x << ": " << kernel(x) << " vs " << want;
     }
     EXPECT_TRUE(same_bits(kernel(T(0)), T(1)));
     EXPECT_TRUE(std::isnan(kernel(std::numeric_limits<T>::quiet_NaN())));

@@ -8,15 +8,10 @@ using namespace vlxtest;
 
 namespace {
 
-VLX_TEST_TWIN(t_real, vlxi_real, vlxfi_real)
-VLX_TEST_TWIN(t_imag, vlxi_imag, vlxfi_imag)
-VLX_TEST_TWIN(t_rev, vlxi_rev, vlxfi_rev)
-VLX_TEST_TWIN(t_shift, vlxi_shift, vlxfi_shift)
+VLX_TWIN(i, real) VLX_TWIN(i, imag) VLX_TWIN(i, rev) VLX_TWIN(i, shift) VLX_TWIN(i, zpad2) VLX_TWIN(i, unzpad)
+VLX_TWIN(i, zinter)
 VLX_TEST_TWIN(t_swap, vlxi_swap_halves, vlxfi_swap_halves)
 VLX_TEST_TWIN(t_swap2, vlxi_swap_halves2, vlxfi_swap_halves2)
-VLX_TEST_TWIN(t_zpad2, vlxi_zpad2, vlxfi_zpad2)
-VLX_TEST_TWIN(t_unzpad, vlxi_unzpad, vlxfi_unzpad)
-VLX_TEST_TWIN(t_zinter, vlxi_zinter, vlxfi_zinter)
 VLX_TEST_TWIN(t_uzinter, vlxu_zinter, vlxfu_zinter)
 
 // Sample k of a vector as (re, im); im is 0 for a real vector.
@@ -46,42 +41,36 @@ TYPED_TEST(Layout, RealAndImaginaryParts) {
     EXPECT_EQ(r.values(), (R{0, 0, 0}));
 }
 
-TYPED_TEST(Layout, ReverseAndShiftAgainstIndexFormulas) {
+// Reversal, the two half rotations and the shift against their index
+// formulas, on both parities and lengths past the vector loops' widths.
+TYPED_TEST(Layout, PermutationsAndShiftMatchIndexFormulas) {
     using V = TypeParam;
+    struct Case {
+        const char* name;
+        int32_t (*op)(V*);
+        int64_t (*from)(int64_t j, int64_t n);  // where sample j comes from
+    };
+    const Case cases[] = {
+        {"rev", [](V* v) { return t_rev(v); }, [](int64_t j, int64_t n) { return n - 1 - j; }},
+        {"swap_halves2", [](V* v) { return t_swap2(v); }, [](int64_t j, int64_t n) { return (j + n / 2) % n; }},
+        {"swap_halves", [](V* v) { return t_swap(v); }, [](int64_t j, int64_t n) { return (j + n - n / 2) % n; }},
+    };
     for (bool cx : {false, true})
-        for (int32_t n : {0, 1, 2, 5, 8}) {
-            const auto x = random_values<real_of<V>>(size_t(n) * (cx ? 2 : 1), uint32_t(n));
+        for (int32_t n : {0, 1, 2, 3, 4, 5, 6, 7, 15, 16, 63, 64, 1001}) {
+            const auto x = random_values<real_of<V>>(size_t(n) * (cx ? 2 : 1), uint32_t(n + 7));
             Vec<V> ref(x, cx);
-            Vec<V> v(x, cx);
-            ASSERT_EQ(t_rev(&v), 0);
-            for (int64_t k = 0; k < n; ++k) EXPECT_EQ(sample(v, k), sample(ref, n - 1 - k));
+            for (const Case& c : cases) {
+                Vec<V> v(x, cx);
+                ASSERT_EQ(c.op(&v), 0);
+                for (int64_t j = 0; j < n; ++j) ASSERT_EQ(sample(v, j), sample(ref, c.from(j, n))) << c.name << " n=" << n;
+            }
             for (int32_t k : {INT_MIN, -1, 0, 1, n - 1, n, n + 1, INT_MAX}) {
                 Vec<V> s(x, cx);
                 ASSERT_EQ(t_shift(&s, k), 0);
                 const int32_t drop = k < 0 ? 0 : std::min(k, n);
                 ASSERT_EQ(s->points, n - drop) << "n=" << n << " k=" << k;
-                for (int64_t j = 0; j < s->points; ++j) EXPECT_EQ(sample(s, j), sample(ref, j + drop));
+                for (int64_t j = 0; j < s->points; ++j) ASSERT_EQ(sample(s, j), sample(ref, j + drop));
             }
-        }
-}
-
-TYPED_TEST(Layout, RotationsMatchIndexFormulaAndUndoEachOther) {
-    using V = TypeParam;
-    for (bool cx : {false, true})
-        for (int32_t n : {0, 1, 2, 3, 4, 5, 6, 7, 15, 16, 63, 64, 1001}) {
-            const auto x = random_values<real_of<V>>(size_t(n) * (cx ? 2 : 1), uint32_t(n + 7));
-            Vec<V> ref(x, cx);
-            Vec<V> a(x, cx), b(x, cx);
-            ASSERT_EQ(t_swap2(&a), 0);
-            ASSERT_EQ(t_swap(&b), 0);
-            for (int64_t j = 0; j < n; ++j) {
-                EXPECT_EQ(sample(a, j), sample(ref, (j + n / 2) % n)) << "n=" << n;
-                EXPECT_EQ(sample(b, j), sample(ref, (j + n - n / 2) % n)) << "n=" << n;
-            }
-            ASSERT_EQ(t_swap(&a), 0);
-            ASSERT_EQ(t_swap2(&b), 0);
-            EXPECT_EQ(a.values(), x);
-            EXPECT_EQ(b.values(), x);
         }
 }
 

@@ -35,17 +35,11 @@ T saturated(T x, T b) {
 
 }  // namespace
 
-// Tolerance: each add of a sequential sum rounds by at most half an ulp of the
-// partial, and on these positive, well-conditioned data the errors have no
-// preferred sign, so they grow like the square root of the adds in one block
-// (the block totals add few more).  We allow 2 * sqrt(adds per block) ulps of
-// the result, plus 8 for the roundings after the sums (divisions, the root,
-// the three-term combination of the skewness about a pivot that is not quite
-// the mean): 13 ulps at 7 points, 98 at a full block.  The double twin lands
-// within a few ulps, the float twin within about 35.  The
-// excess kurtosis is m4/m2^2 - 3, whose subtraction cancels: it is measured in
-// ulps of m4/m2^2, the quantity actually computed.  A wrong divisor (n against
-// n - 1), a lost block or a wrong pivot is off by far more.
+// Tolerance: rounding errors of a sequential sum grow like the square root of
+// the adds in one block, so 2 * sqrt(adds per block) ulps, plus 8 for the
+// divisions, root and pivoted combination after the sums.  The excess kurtosis
+// is measured in ulps of m4/m2^2, the quantity actually computed.  A wrong
+// divisor (n against n - 1), a lost block or a wrong pivot is off by far more.
 TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     using T = real_of<TypeParam>;
     for (const int64_t n : {int64_t(7), int64_t(1000), int64_t(5000), int64_t(2 * 8 * kBlock + 700)}) {
@@ -185,7 +179,6 @@ TYPED_TEST(Moments, FixedResults) {
         {"complex min of huge or NaN", STAT(t_min), {nan, 0, 10 * b, 0}, true, b, b},
         {"complex min: first of equal power", STAT(t_min), {0, 2, 2, 0, -2, 0, 3, 3}, true, 0, 2},
         {"complex max: first of equal power", STAT(t_max), {0, -2, 1, 1, 2, 0}, true, 0, -2},
-        {"complex median by power", STAT(t_median), {3, 0, 0, 1}, true, 1.5, 0.5},
         {"complex gmean of 2i and 8i", STAT(t_gmean), {0, 2, 0, 8}, true, 0, 4},
         {"complex hmean of 1+i and 1-i", STAT(t_hmean), {1, 1, 1, -1}, true, 2, 0},
     };
@@ -219,11 +212,8 @@ TYPED_TEST(Moments, InPlaceAndComplexShape) {
     Vec<TypeParam> v({1, 2, 3, 4, 5, 6}, true);
     v->delta = T(0.25);
     ASSERT_EQ(t_mean(v.get(), v.get()), 0);
-    EXPECT_EQ(v->points, 1);
-    EXPECT_EQ(v->complex, 1);
-    EXPECT_EQ(v[0], T(3));
-    EXPECT_EQ(v[1], T(4));
-    EXPECT_EQ(v->delta, T(0.25));
+    EXPECT_TRUE(has_shape(v.get(), 1, 1, 0.25));
+    EXPECT_EQ(v.values(), (std::vector<T>{3, 4}));
     // complex variance is that of re plus that of im; the result is real
     Vec<TypeParam> c({1, 10, 3, 10, 5, 40}, true);
     const auto r = STAT(t_pop_var)(c);
@@ -233,14 +223,11 @@ TYPED_TEST(Moments, InPlaceAndComplexShape) {
 
 // A failed allocation is a status: dst is left empty, nothing is written.
 TEST(MomentsHooks, AllocationFailureIsReported) {
-    vlx_alloc_hook_t old_alloc = nullptr;
-    vlx_realloc_hook_t old_realloc = nullptr;
-    vlx_lib_alloc([](vlx_t* v) -> int32_t { v->data = nullptr; return 0; }, &old_alloc);
-    vlx_lib_realloc([](vlx_t* v, int32_t, int32_t) -> int32_t { v->data = nullptr; return 0; }, &old_realloc);
     vlx_t src{1.0, nullptr, 0, 3, 0, 0};
     double lent[3] = {1, 2, 3};
     src.data = lent;  // lent storage: no allocation needed to read it
     Vec<vlx_t> dst;
+    FailingAlloc<vlx_t> failing;
     EXPECT_EQ(vlxs_sum(&src, dst.get()), -1);
     EXPECT_EQ(dst->points, 0);
     EXPECT_EQ(dst->data, nullptr);
@@ -248,6 +235,4 @@ TEST(MomentsHooks, AllocationFailureIsReported) {
     EXPECT_EQ(vlxs_hist(&src, dst.get(), 0, 1, 4), -1);
     EXPECT_EQ(vlxs_peak(&src, dst.get(), VLX_PEAK_SAMPLE, 0), -1);
     EXPECT_EQ(vlxs_peak(&src, &src, VLX_PEAK_SAMPLE, 0), -1);
-    vlx_lib_alloc(old_alloc, nullptr);
-    vlx_lib_realloc(old_realloc, nullptr);
 }

@@ -7,32 +7,15 @@
 
 namespace vlxtest {
 
-VLX_TEST_TWIN(t_sum, vlxs_sum, vlxfs_sum)
-VLX_TEST_TWIN(t_mean, vlxs_mean, vlxfs_mean)
-VLX_TEST_TWIN(t_magsq_sum, vlxs_magsq_sum, vlxfs_magsq_sum)
-VLX_TEST_TWIN(t_rms, vlxs_rms, vlxfs_rms)
-VLX_TEST_TWIN(t_pop_var, vlxs_pop_var, vlxfs_pop_var)
-VLX_TEST_TWIN(t_samp_var, vlxs_samp_var, vlxfs_samp_var)
-VLX_TEST_TWIN(t_pop_stddev, vlxs_pop_stddev, vlxfs_pop_stddev)
-VLX_TEST_TWIN(t_samp_stddev, vlxs_samp_stddev, vlxfs_samp_stddev)
-VLX_TEST_TWIN(t_skew, vlxs_skew, vlxfs_skew)
-VLX_TEST_TWIN(t_excess, vlxs_excess, vlxfs_excess)
-VLX_TEST_TWIN(t_gmean, vlxs_gmean, vlxfs_gmean)
-VLX_TEST_TWIN(t_hmean, vlxs_hmean, vlxfs_hmean)
-VLX_TEST_TWIN(t_min, vlxs_min, vlxfs_min)
-VLX_TEST_TWIN(t_max, vlxs_max, vlxfs_max)
-VLX_TEST_TWIN(t_median, vlxs_median, vlxfs_median)
-VLX_TEST_TWIN(t_hist, vlxs_hist, vlxfs_hist)
+VLX_TWIN(s, sum) VLX_TWIN(s, mean) VLX_TWIN(s, magsq_sum) VLX_TWIN(s, rms) VLX_TWIN(s, pop_var) VLX_TWIN(s, samp_var)
+VLX_TWIN(s, pop_stddev) VLX_TWIN(s, samp_stddev) VLX_TWIN(s, skew) VLX_TWIN(s, excess) VLX_TWIN(s, gmean)
+VLX_TWIN(s, hmean) VLX_TWIN(s, min) VLX_TWIN(s, max) VLX_TWIN(s, median) VLX_TWIN(s, hist) VLX_TWIN(s, peak)
 VLX_TEST_TWIN(t_sort, vlxi_sort, vlxfi_sort)
-VLX_TEST_TWIN(t_peak, vlxs_peak, vlxfs_peak)
 
 // The family's saturation bound.
 template <class V>
 constexpr real_of<V> bound_of() {
-    if constexpr (is_double<V>)
-        return 1e100;
-    else
-        return 1e15f;
+    return is_double<V> ? real_of<V>(1e100) : real_of<V>(1e15f);
 }
 
 // A statistic of src as (status, re, im, complex flag of the result).
