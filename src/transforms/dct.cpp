@@ -3,6 +3,7 @@
 // followed by a rotation of each bin by a quarter-sample twiddle.  The work
 // vector and the twiddle table are cached for each precision under lock 1.
 #include "core/frame.hpp"
+#include "core/precise_math.hpp"
 #include "elementwise/elementwise.hpp"
 #include "transforms/transforms.hpp"
 
@@ -14,11 +15,6 @@
 
 namespace vlx {
 namespace {
-
-inline double cos_d(double x) { return std::cos(x); }
-inline double sin_d(double x) { return std::sin(x); }
-inline float cos_f(float x) { return std::cos(x); }
-inline float sin_f(float x) { return std::sin(x); }
 
 constexpr uint32_t dct_inverse = 1;
 constexpr uint32_t dct_scaled = 2;

@@ -3,6 +3,7 @@
 // a one-entry cache of the chirp and its filter spectrum under lock 1.  Also
 // the real transform of any length and its inverse.
 #include "core/frame.hpp"
+#include "core/precise_math.hpp"
 #include "elementwise/elementwise.hpp"
 #include "transforms/transforms.hpp"
 
@@ -12,12 +13,6 @@
 
 namespace vlx {
 namespace {
-
-inline double cos_d(double x) { return std::cos(x); }
-inline double sin_d(double x) { return std::sin(x); }
-inline float cos_f(float x) { return std::cos(x); }
-inline float sin_f(float x) { return std::sin(x); }
-inline double log_d(double x) { return std::log(x); }
 
 // The chirp-z cache of one precision.  `chirp.points` is the length it
 // stands for; `direction` is the direction the two vectors hold.

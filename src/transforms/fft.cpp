@@ -1,6 +1,7 @@
 // The complex power-of-two transform: split-radix decimation in frequency on
 // interleaved data, with a shared cache of twiddle tables.
 #include "core/frame.hpp"
+#include "core/precise_math.hpp"
 #include "elementwise/elementwise.hpp"
 #include "transforms/transforms.hpp"
 
@@ -11,11 +12,6 @@
 
 namespace vlx {
 namespace {
-
-inline double cos_d(double x) { return std::cos(x); }
-inline double sin_d(double x) { return std::sin(x); }
-inline float cos_f(float x) { return std::cos(x); }
-inline float sin_f(float x) { return std::sin(x); }
 
 template <class T>
 struct TwiddleRecord {
