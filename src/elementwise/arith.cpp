@@ -103,7 +103,7 @@ inline T mag_real(T x) {
 }
 template <class T>
 inline T mag_pair(T a, T b) {
-    return inplace::wide_hypot(a, b);
+    return wide_hypot(a, b);
 }
 // The tests are combined without short-circuit so that the loops vectorise.
 template <VlxVector V>
@@ -261,18 +261,18 @@ namespace {
 
 template <VlxVector V>
 inline real_t<V> sqrt_real(real_t<V> x) {
-    return x < real_t<V>(0) ? real_t<V>(0) : inplace::own_sqrt(x);
+    return x < real_t<V>(0) ? real_t<V>(0) : own_sqrt(x);
 }
 
 template <VlxVector V>
 inline Cx<real_t<V>> sqrt_pair(real_t<V> a, real_t<V> b) {
     using T = real_t<V>;
     constexpr T big = family<V>::bound;
-    const T r = beyond(a, big) || beyond(b, big) ? big : inplace::own_sqrt(a * a + b * b);
-    const T q = inplace::own_sqrt(r);
+    const T r = beyond(a, big) || beyond(b, big) ? big : own_sqrt(a * a + b * b);
+    const T q = own_sqrt(r);
     if (q <= T(0)) return {T(0), T(0)};
-    const T p = inplace::own_atan2(b, a) * T(0.5);
-    return {q * inplace::own_cos(p), q * inplace::own_sin(p)};
+    const T p = own_atan2(b, a) * T(0.5);
+    return {q * own_cos(p), q * own_sin(p)};
 }
 
 }  // namespace
@@ -307,7 +307,7 @@ int32_t ptor(V* v) {
     using T = real_t<V>;
     if (!v->complex) return 0;
     return inplace::map_both(v, [](T x) { return x; }, [](T a, T b) {
-        return Cx<T>{a * inplace::own_cos(b), a * inplace::own_sin(b)};
+        return Cx<T>{a * own_cos(b), a * own_sin(b)};
     });
 }
 
@@ -318,8 +318,8 @@ int32_t addcos(V* v, uint32_t flags, real_t<V> freq, real_t<V> amp, real_t<V> ph
     if (n < 1) return 0;
     // one angle per sample, multiplied in this order
     const T step = v->delta * T(2) * family<V>::pi * freq;
-    const T cs = inplace::own_cos(step);
-    const T sn = inplace::own_sin(step);
+    const T cs = own_cos(step);
+    const T sn = own_sin(step);
     const bool with_sine = v->complex && (flags & 1u);
     const int64_t stride = v->complex ? 2 : 1;
     T* d = v->data;
@@ -331,11 +331,11 @@ int32_t addcos(V* v, uint32_t flags, real_t<V> freq, real_t<V> amp, real_t<V> ph
         if constexpr (std::is_same_v<T, float>) {
             // the float twin restarts through double, reduced to one turn
             const double turn = std::fmod(static_cast<double>(angle), 6.283185307179586);
-            c = static_cast<float>(inplace::cos64(turn));
-            s = static_cast<float>(inplace::sin64(turn));
+            c = static_cast<float>(cos64(turn));
+            s = static_cast<float>(sin64(turn));
         } else {
-            c = inplace::cos64(angle);
-            s = inplace::sin64(angle);
+            c = cos64(angle);
+            s = sin64(angle);
         }
         const int64_t end = k0 + 256 < n ? k0 + 256 : n;
         for (int64_t k = k0; k < end; ++k) {

@@ -1,5 +1,6 @@
 // Layout operations: where the samples of a vector stand.
 #include "elementwise/elementwise.hpp"
+#include "core/precise_math.hpp"
 
 #include <cmath>
 #include <cstring>
@@ -10,17 +11,6 @@
 
 namespace vlx {
 namespace {
-
-inline double sqrt_double(double x) { return std::sqrt(x); }
-inline float sqrt_single(float x) { return std::sqrt(x); }
-
-template <class T>
-T sqrt_in(T x) {
-    if constexpr (std::is_same_v<T, float>)
-        return sqrt_single(x);
-    else
-        return sqrt_double(x);
-}
 
 // Bits 0-1 of the padding flags: the scale mode; bits 8-10: the layout.
 constexpr int32_t kScaleMask = 0x3;
@@ -53,7 +43,7 @@ PadScale<real_t<V>> decide_scale(int32_t flags, int32_t from, int32_t to) {
     const T ratio = static_cast<T>(to) / static_cast<T>(from);
     if (mode == kScaleRatio) return {true, true, ratio};
     static_assert(kScaleSqrt == 1);
-    return {true, true, sqrt_in<T>(ratio)};
+    return {true, true, own_sqrt<T>(ratio)};
 }
 
 template <class T>

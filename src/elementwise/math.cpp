@@ -40,10 +40,10 @@ int32_t exp_each(V* v) {
     using T = real_t<V>;
     using L = limits<V>;
     return inplace::map_both(
-        v, [](T x) { return x > L::exp_max ? L::big : inplace::own_exp(x); },
+        v, [](T x) { return x > L::exp_max ? L::big : own_exp(x); },
         [](T a, T b) {
-            const T e = a > L::exp_max ? L::big : inplace::own_exp(a);
-            return Cx<T>{e * inplace::own_cos(b), e * inplace::own_sin(b)};
+            const T e = a > L::exp_max ? L::big : own_exp(a);
+            return Cx<T>{e * own_cos(b), e * own_sin(b)};
         });
 }
 
@@ -64,10 +64,10 @@ int32_t exp10(V* v) {
             else if (a < -L::big)
                 e = -L::big;
             else
-                e = inplace::own_exp(a * L::ln10);
+                e = own_exp(a * L::ln10);
             const T p = b * L::ln10;
-            d[2 * i] = e * inplace::own_cos(p);
-            d[2 * i + 1] = e * inplace::own_sin(p);
+            d[2 * i] = e * own_cos(p);
+            d[2 * i + 1] = e * own_sin(p);
         }
         return 0;
     }
@@ -76,7 +76,7 @@ int32_t exp10(V* v) {
         // The first sample below -B ends the walk: it and every later sample
         // stay as they are.  Settled behaviour, kept.
         if (x < -L::big) break;
-        d[i] = x > L::exp10_max ? L::big : inplace::own_exp(x * L::ln10);
+        d[i] = x > L::exp10_max ? L::big : own_exp(x * L::ln10);
     }
     return 0;
 }
@@ -85,9 +85,9 @@ template <VlxVector V>
 int32_t log_each(V* v) {
     using T = real_t<V>;
     using L = limits<V>;
-    const T log_tiny = inplace::own_log(L::tiny);
+    const T log_tiny = own_log(L::tiny);
     return inplace::map_both(
-        v, [log_tiny](T x) { return x < L::tiny ? log_tiny : inplace::own_log(x); },
+        v, [log_tiny](T x) { return x < L::tiny ? log_tiny : own_log(x); },
         [log_tiny](T a, T b) {
             T m;
             if (beyond(a, L::big) || beyond(b, L::big)) {
@@ -97,7 +97,7 @@ int32_t log_each(V* v) {
                 m = b * b + a * a;
                 if (m < L::tiny) return Cx<T>{log_tiny, T(0)};
             }
-            return Cx<T>{inplace::own_log(m) * T(0.5), inplace::own_atan2(b, a)};
+            return Cx<T>{own_log(m) * T(0.5), own_atan2(b, a)};
         });
 }
 
@@ -109,11 +109,11 @@ template <VlxVector V>
 int32_t log10_scaled(V* v, real_t<V> factor, bool scaled) {
     using T = real_t<V>;
     using L = limits<V>;
-    const T log10_tiny = inplace::own_log10(L::tiny);
+    const T log10_tiny = own_log10(L::tiny);
     return inplace::map_both(
         v,
         [=](T x) {
-            const T l = x < L::tiny ? log10_tiny : inplace::own_log10(x);
+            const T l = x < L::tiny ? log10_tiny : own_log10(x);
             return scaled ? factor * l : l;
         },
         [=](T a, T b) {
@@ -121,9 +121,9 @@ int32_t log10_scaled(V* v, real_t<V> factor, bool scaled) {
             b = inplace::clamp_part(b, L::big);
             const T m = b * b + a * a;
             if (m < L::tiny) return Cx<T>{scaled ? factor * log10_tiny : log10_tiny, T(0)};
-            const T phase = inplace::own_atan2(b, a);
-            if (!scaled) return Cx<T>{inplace::own_log10(m) * T(0.5), phase * L::log10e};
-            return Cx<T>{inplace::own_log10(m) * factor * T(0.5), phase * factor * L::log10e};
+            const T phase = own_atan2(b, a);
+            if (!scaled) return Cx<T>{own_log10(m) * T(0.5), phase * L::log10e};
+            return Cx<T>{own_log10(m) * factor * T(0.5), phase * factor * L::log10e};
         });
 }
 
@@ -146,18 +146,18 @@ int32_t db(V* v, real_t<V> factor) {
         using L [[maybe_unused]] = limits<V>;                            \
         return inplace::map_real(v, [](T x) -> T { return expr; });      \
     }
-VLX_REAL_FN(sin_each, inplace::own_sin(x))
-VLX_REAL_FN(cos_each, inplace::own_cos(x))
-VLX_REAL_FN(tan_each, inplace::own_tan(x))
-VLX_REAL_FN(atan_each, inplace::own_atan(x))
-VLX_REAL_FN(tanh_each, inplace::own_tanh(x))
-VLX_REAL_FN(acos_each, beyond(x, T(1)) ? T(0) : inplace::own_acos(x))
-VLX_REAL_FN(asin_each, beyond(x, T(1)) ? T(0) : inplace::own_asin(x))
+VLX_REAL_FN(sin_each, own_sin(x))
+VLX_REAL_FN(cos_each, own_cos(x))
+VLX_REAL_FN(tan_each, own_tan(x))
+VLX_REAL_FN(atan_each, own_atan(x))
+VLX_REAL_FN(tanh_each, own_tanh(x))
+VLX_REAL_FN(acos_each, beyond(x, T(1)) ? T(0) : own_acos(x))
+VLX_REAL_FN(asin_each, beyond(x, T(1)) ? T(0) : own_asin(x))
 // cosh and sinh go through double in the float twin too.
-VLX_REAL_FN(cosh_each, beyond(x, L::exp_max) ? L::big : inplace::wide_cosh(x))
-VLX_REAL_FN(sinh_each, x > L::exp_max ? L::big : x < -L::exp_max ? -L::big : inplace::wide_sinh(x))
+VLX_REAL_FN(cosh_each, beyond(x, L::exp_max) ? L::big : wide_cosh(x))
+VLX_REAL_FN(sinh_each, x > L::exp_max ? L::big : x < -L::exp_max ? -L::big : wide_sinh(x))
 // no factor of pi
-VLX_REAL_FN(sinc, x == T(0) ? T(1) : inplace::own_sin(x) / x)
+VLX_REAL_FN(sinc, x == T(0) ? T(1) : own_sin(x) / x)
 VLX_REAL_FN(besi0, beyond(x, L::exp_max) ? L::big : besi0_kernel<V>(x))
 VLX_REAL_FN(besj0, static_cast<T>(j0_64(x)))
 VLX_REAL_FN(besj1, static_cast<T>(j1_64(x)))
@@ -221,7 +221,7 @@ real_t<V> besi0_kernel(real_t<V> x) {
     const T w = T(0.125) / x;
     T p = static_cast<T>(besi0_asymptotic.a[S::asymptotic_terms - 1]);
     for (int k = S::asymptotic_terms - 2; k >= 0; --k) p = p * w + static_cast<T>(besi0_asymptotic.a[k]);
-    return inplace::own_exp(x) * p / inplace::own_sqrt(x * T(2) * family<V>::pi);
+    return own_exp(x) * p / own_sqrt(x * T(2) * family<V>::pi);
 }
 
 #define VLX_INSTANTIATE(V)                                 \

@@ -2,6 +2,7 @@
 // number helpers that turn computed quantities into point counts.
 #include "filters/filters.hpp"
 
+#include "core/precise_math.hpp"
 #include "elementwise/elementwise.hpp"
 
 #include <cmath>
@@ -35,26 +36,6 @@ struct tolerance<vlxf_t> {
     // compared in float, where 2147483647 is not representable
     static constexpr float max_points = 2147483648.0f;
 };
-
-inline double ceil_double(double x) { return std::ceil(x); }
-inline double floor_double(double x) { return std::floor(x); }
-inline float ceil_single(float x) { return std::ceil(x); }
-inline float floor_single(float x) { return std::floor(x); }
-
-template <class T>
-T ceil_in(T x) {
-    if constexpr (std::is_same_v<T, float>)
-        return ceil_single(x);
-    else
-        return ceil_double(x);
-}
-template <class T>
-T floor_in(T x) {
-    if constexpr (std::is_same_v<T, float>)
-        return floor_single(x);
-    else
-        return floor_double(x);
-}
 
 // Whole-number result to i32; a float just below 2^31 can round up to 2^31.
 inline int32_t to_points(double whole) {
@@ -185,10 +166,10 @@ int32_t ceil_pts(real_t<V> x) {
     using tol = tolerance<V>;
     if (x > tol::max_points) return std::numeric_limits<int32_t>::max();
     if (!(x >= T(0))) return 0;  // negative, or not a number
-    if (x <= T(0.5)) return to_points(ceil_in<T>(x - tol::noise));
-    if (relative_noise<V>(x)) return to_points(ceil_in<T>(x * tol::ratio_low));
+    if (x <= T(0.5)) return to_points(own_ceil<T>(x - tol::noise));
+    if (relative_noise<V>(x)) return to_points(own_ceil<T>(x * tol::ratio_low));
     // the absolute allowance is formed in double in both families
-    return to_points(ceil_double(static_cast<double>(x) - 0.01));
+    return to_points(ceil64(static_cast<double>(x) - 0.01));
 }
 
 template <VlxVector V>
@@ -197,9 +178,9 @@ int32_t floor_pts(real_t<V> x) {
     using tol = tolerance<V>;
     if (x > tol::max_points) return std::numeric_limits<int32_t>::max();
     if (!(x >= T(0))) return 0;
-    if (x <= T(0.5)) return to_points(floor_in<T>(x + tol::noise));
-    if (relative_noise<V>(x)) return to_points(floor_in<T>(x * tol::ratio_high));
-    return to_points(floor_double(static_cast<double>(x) + 0.01));
+    if (x <= T(0.5)) return to_points(own_floor<T>(x + tol::noise));
+    if (relative_noise<V>(x)) return to_points(own_floor<T>(x * tol::ratio_high));
+    return to_points(floor64(static_cast<double>(x) + 0.01));
 }
 
 #define VLX_INSTANTIATE(V)                                                                         \

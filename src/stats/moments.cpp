@@ -179,7 +179,7 @@ int32_t rms(const V* src, V* dst) {
     using T = real_t<V>;
     T s = magsq(src);
     const int64_t n = points_of(src);
-    if (n > 0) s = stats::sqrt_own(s / static_cast<T>(n));
+    if (n > 0) s = own_sqrt(s / static_cast<T>(n));
     return put(dst, false, s);
 }
 
@@ -200,13 +200,13 @@ int32_t samp_var(const V* src, V* dst) {
 
 template <VlxVector V>
 int32_t pop_stddev(const V* src, V* dst) {
-    return put(dst, false, stats::sqrt_own(variance(src)));
+    return put(dst, false, own_sqrt(variance(src)));
 }
 
 template <VlxVector V>
 int32_t samp_stddev(const V* src, V* dst) {
     using T = real_t<V>;
-    return put(dst, false, stats::sqrt_own(variance(src) * bessel<T>(points_of(src))));
+    return put(dst, false, own_sqrt(variance(src) * bessel<T>(points_of(src))));
 }
 
 template <VlxVector V>
@@ -234,9 +234,9 @@ int32_t skew(const V* src, V* dst) {
     // The single-precision twin takes this one root in double and narrows it.
     T root;
     if constexpr (std::is_same_v<T, float>)
-        root = stats::sqrt_in_double(v);
+        root = wide_sqrt(v);
     else
-        root = stats::sqrt_own(v);
+        root = own_sqrt(v);
     const T q = root * v;
     T result;
     if (q != T(0))  // a NaN counts as different from 0
@@ -301,14 +301,14 @@ int32_t gmean(const V* src, V* dst) {
         }
         const T m = p * p + q * q;
         if (n == 0 || m < tiny) return put(dst, true, T(0), T(0));
-        const T radius = stats::exp_own(stats::log_own(m) / (T(2) * tn));
-        const T angle = stats::atan2_own(q, p) / tn;
-        return put(dst, true, radius * stats::cos_own(angle), radius * stats::sin_own(angle));
+        const T radius = own_exp(own_log(m) / (T(2) * tn));
+        const T angle = own_atan2(q, p) / tn;
+        return put(dst, true, radius * own_cos(angle), radius * own_sin(angle));
     }
     T p = T(1);
     for (int64_t i = 0; i < n; ++i) p = p * x[i];
     if (n == 0 || p < tiny) return put(dst, false, T(0));
-    return put(dst, false, stats::exp_own(stats::log_own(p) / tn));
+    return put(dst, false, own_exp(own_log(p) / tn));
 }
 
 template <VlxVector V>

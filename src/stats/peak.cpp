@@ -117,7 +117,7 @@ int32_t peak_core(const V* src, V* dst, int32_t flags, int32_t index) {
     int64_t k = i;
     if (i == n - 1 || (i > 0 && power(src, i - 1) > power(src, i + 1))) k = i - 1;
     const T y0 = power(src, k), y1 = power(src, k + 1);
-    T d = K::ratio_scale * stats::log_own(y1 / y0);
+    T d = K::ratio_scale * own_log(y1 / y0);
     if (method == VLX_PEAK_LOG_RATIO_CORRECTED) d = d * (T(1) - (d * d - T(0.25)) * K::cubic);
     d = d + T(0.5);
     // An offset outside its range means the two samples are not on one lobe:
@@ -130,7 +130,7 @@ int32_t peak_core(const V* src, V* dst, int32_t flags, int32_t index) {
         d = T(1.5);
         status = -1;
     }
-    out[0] = stats::exp_own(K::height * d * d) * y0;
+    out[0] = own_exp(K::height * d * d) * y0;
     out[1] = static_cast<T>(k) + d;
     return status;
 }

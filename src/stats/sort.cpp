@@ -111,7 +111,7 @@ int32_t hist_core(const V* src, V* dst, real_t<V> origin, real_t<V> width, int32
         T value;
         if (src->complex) {
             const T re = x[2 * i], im = x[2 * i + 1];
-            value = (beyond(re, bound) || beyond(im, bound)) ? bound : stats::sqrt_own(re * re + im * im);
+            value = (beyond(re, bound) || beyond(im, bound)) ? bound : own_sqrt(re * re + im * im);
         } else {
             value = x[i];
         }

@@ -5,6 +5,7 @@
 #pragma once
 
 #include "core/core.hpp"
+#include "core/precise_math.hpp"
 
 #include <cmath>
 #include <cstdint>
@@ -90,17 +91,6 @@ template <class T>
 inline bool beyond(T x, T bound) {
     return x > bound || x < -bound;
 }
-
-// Math calls in the sample's own precision: the float overloads for float,
-// the double functions for double.
-template <class T> inline T sqrt_own(T x) { return std::sqrt(x); }
-template <class T> inline T log_own(T x) { return std::log(x); }
-template <class T> inline T exp_own(T x) { return std::exp(x); }
-template <class T> inline T cos_own(T x) { return std::cos(x); }
-template <class T> inline T sin_own(T x) { return std::sin(x); }
-template <class T> inline T atan2_own(T y, T x) { return std::atan2(y, x); }
-// The square root of the double function, narrowed back to T.
-template <class T> inline T sqrt_in_double(T x) { return static_cast<T>(std::sqrt(static_cast<double>(x))); }
 
 static_assert(std::is_same_v<decltype(std::sqrt(1.0f)), float>, "float overloads expected");
 

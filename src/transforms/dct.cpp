@@ -78,12 +78,12 @@ int32_t dct_table(DctState<V>& state, int32_t n) {
     T eps, c1, s1;
     if constexpr (std::is_same_v<V, vlx_t>) {
         eps = family<V>::pi / (2.0 * n);
-        c1 = cos_d(eps);
-        s1 = sin_d(eps);
+        c1 = cos64(eps);
+        s1 = sin64(eps);
     } else {
         eps = family<V>::pi / static_cast<float>(2 * static_cast<int64_t>(n));
-        c1 = cos_f(eps);
-        s1 = sin_f(eps);
+        c1 = cos32(eps);
+        s1 = sin32(eps);
     }
     T c = c1, s = s1;
     int32_t run = 0;
@@ -91,8 +91,8 @@ int32_t dct_table(DctState<V>& state, int32_t n) {
         if (run == 256) {
             // restarts in double for both families
             const T angle = static_cast<T>(k) * eps;
-            c = static_cast<T>(cos_d(static_cast<double>(angle)));
-            s = static_cast<T>(sin_d(static_cast<double>(angle)));
+            c = static_cast<T>(cos64(static_cast<double>(angle)));
+            s = static_cast<T>(sin64(static_cast<double>(angle)));
             run = 0;
         }
         table[2 * (k - 1)] = c;

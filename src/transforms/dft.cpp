@@ -46,7 +46,7 @@ int32_t chirp_free() {
 // near powers of two; the result is then merely longer than needed.
 template <VlxVector V>
 int32_t chirp_exponent(int32_t n) {
-    const double ln = log_d(static_cast<double>(n) - 1.5);
+    const double ln = log64(static_cast<double>(n) - 1.5);
     if constexpr (std::is_same_v<V, vlx_t>)
         return 2 - static_cast<int32_t>(ln * -1.4426950408889634);
     else
@@ -67,11 +67,11 @@ void fill_chirp(V* chirp, int32_t n) {
         m = (m + 2 * i - 1) % two_n;
         const T angle = (static_cast<T>(m) * -family<V>::pi) * inv_n;
         if constexpr (std::is_same_v<V, vlx_t>) {
-            x[2 * i] = cos_d(angle);
-            x[2 * i + 1] = sin_d(angle);
+            x[2 * i] = cos64(angle);
+            x[2 * i + 1] = sin64(angle);
         } else {
-            x[2 * i] = cos_f(angle);
-            x[2 * i + 1] = sin_f(angle);
+            x[2 * i] = cos32(angle);
+            x[2 * i + 1] = sin32(angle);
         }
     }
 }

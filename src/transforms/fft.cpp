@@ -60,11 +60,11 @@ void fill_twiddles(real_t<V>* t, int32_t n) {
     const T e = family<V>::two_pi / static_cast<T>(n);
     T c1, s1;
     if constexpr (std::is_same_v<V, vlx_t>) {
-        c1 = cos_d(e);
-        s1 = sin_d(e);
+        c1 = cos64(e);
+        s1 = sin64(e);
     } else {
-        c1 = cos_f(e);
-        s1 = sin_f(e);
+        c1 = cos32(e);
+        s1 = sin32(e);
     }
     // Angles up to pi/4 by recurrence, each also giving its reflection about
     // pi/4.  Runs of at most 256 entries keep the rounding from piling up;
@@ -74,8 +74,8 @@ void fill_twiddles(real_t<V>* t, int32_t n) {
     for (int32_t k = 1; k < n / 8; ++k) {
         if (run == 256) {
             const T angle = static_cast<T>(k) * e;
-            c = static_cast<T>(cos_d(static_cast<double>(angle)));
-            s = static_cast<T>(sin_d(static_cast<double>(angle)));
+            c = static_cast<T>(cos64(static_cast<double>(angle)));
+            s = static_cast<T>(sin64(static_cast<double>(angle)));
             run = 0;
         }
         put_triple(t + 6 * size_t(k), c, s);
