@@ -152,7 +152,7 @@ double median(std::vector<double> v) {
 
 template <class V>
 void interleaved_table(int reps) {
-    using T = typename Ops<V>::T;
+    using T [[maybe_unused]] = typename Ops<V>::T;
     std::printf("\ncomplex %s, seconds per transform (median of %d interleaved repetitions)\n", Ops<V>::name(), reps);
     std::printf("%8s %12s %12s %10s\n", "N", "libvlx", "FFTW", "ratio");
     for (int m = 6; m <= 20; ++m) {
@@ -224,7 +224,7 @@ long double rel_l2(const T* got, const std::vector<cld>& want) {
 
 template <class V>
 void accuracy_table() {
-    using T = typename Ops<V>::T;
+    using T [[maybe_unused]] = typename Ops<V>::T;
     std::printf("\ncomplex %s forward, relative L2 error against long double\n", Ops<V>::name());
     std::printf("%8s %12s %12s\n", "N", "libvlx", "FFTW");
     for (int m = 6; m <= 20; m += 2) {
