@@ -1,5 +1,5 @@
-// Stand-in for the vendor DFT module, built as libmkl_rt.so.2: a plain DFT in
-// the descriptor's precision, a trace of every call that the tests read, and
+// Stand-in for the vendor DFT module, built as libmkl_rt.so.2: plain DFTs in
+// the descriptor's precision, a trace of the calls for the tests, and
 // refusals on demand through STANDIN_FAIL ("create", "compute" or "free").
 #include <cmath>
 #include <cstdarg>
@@ -11,16 +11,16 @@
 
 #define EXPORT extern "C" __attribute__((visibility("default")))
 
-namespace {
 struct Handle {
     int precision, domain;
     long n;
     double scale;
 };
-std::string trace;
-int live = 0;
+static std::string trace;
 
-bool refuse(const char* op) {
+// Notes the call; true if the test asked for this operation to be refused.
+static bool refuse(const char* op, const std::string& note) {
+    trace += note + " ";
     const char* f = std::getenv("STANDIN_FAIL");
     return f != nullptr && std::strcmp(f, op) == 0;
 }
@@ -28,7 +28,7 @@ bool refuse(const char* op) {
 // In place: n complex points, or n real samples to n/2 + 1 complex points;
 // long-double sums, times scale, rounded once.
 template <class T>
-void plain_dft(T* x, long n, bool real_in, bool inverse, long double scale) {
+static void plain_dft(T* x, long n, bool real_in, bool inverse, long double scale) {
     std::vector<long double> re(n), im(n, 0.0L);
     for (long j = 0; j < n; ++j) re[j] = real_in ? x[j] : x[2 * j], im[j] = real_in ? 0 : x[2 * j + 1];
     for (long k = 0; k < (real_in ? n / 2 + 1 : n); ++k) {
@@ -41,26 +41,24 @@ void plain_dft(T* x, long n, bool real_in, bool inverse, long double scale) {
         x[2 * k] = static_cast<T>(sr * scale), x[2 * k + 1] = static_cast<T>(si * scale);
     }
 }
-}  // namespace
 
-// For the tests: the module's own transform, the trace, descriptors not freed.
+// For the tests: the module's own transform, and the calls so far.
 EXPORT void standin_dft(int precision, void* x, long n, int real_in, int inverse, double scale) {
     if (precision == 36) plain_dft(static_cast<double*>(x), n, real_in, inverse, scale);
     else plain_dft(static_cast<float*>(x), n, real_in, inverse, scale);
 }
 EXPORT const char* standin_trace() { return trace.c_str(); }
-EXPORT int standin_live() { return live; }
 
 EXPORT long DftiCreateDescriptor(void** out, int precision, int domain, long dimension, ...) {
     va_list ap;
     va_start(ap, dimension);
     const long n = va_arg(ap, long);
     va_end(ap);
-    trace += "c" + std::to_string(precision) + "." + std::to_string(domain) + "." + std::to_string(dimension) + "/" +
-             std::to_string(n) + " ";
-    if (refuse("create")) return 1;
-    *out = new Handle{precision, domain, n, 1.0};
-    return ++live, 0;
+    using std::to_string;
+    if (refuse("create", "c" + to_string(precision) + "." + to_string(domain) + "." + to_string(dimension) + "/" +
+                             to_string(n)))
+        return 1;
+    return *out = new Handle{precision, domain, n, 1.0}, 0;
 }
 EXPORT long DftiSetValue(void* h, int param, ...) {
     va_list ap;
@@ -68,23 +66,21 @@ EXPORT long DftiSetValue(void* h, int param, ...) {
     const double v = param == 4 ? va_arg(ap, double) : va_arg(ap, int);
     va_end(ap);
     if (param == 4) static_cast<Handle*>(h)->scale = v;
-    char text[48];
-    std::snprintf(text, sizeof text, "s%d=%.17g ", param, v);
-    return trace += text, 0;
+    char text[40];
+    std::snprintf(text, sizeof text, "s%d=%.17g", param, v);
+    return refuse("", text), 0;
 }
-EXPORT long DftiCommitDescriptor(void*) { return trace += "m ", 0; }
+EXPORT long DftiCommitDescriptor(void*) { return refuse("", "m"), 0; }
 static long compute(void* p, void* x, int inverse) {
     const Handle* h = static_cast<Handle*>(p);
-    trace += inverse ? "b " : "f ";
-    if (refuse("compute")) return 3;
+    if (refuse("compute", inverse ? "b" : "f")) return 3;
     standin_dft(h->precision, x, h->n, h->domain == 33, inverse, inverse ? 1.0 : h->scale);
     return 0;
 }
 EXPORT long DftiComputeForward(void* h, void* x, ...) { return compute(h, x, 0); }
 EXPORT long DftiComputeBackward(void* h, void* x, ...) { return compute(h, x, 1); }
 EXPORT long DftiFreeDescriptor(void** h) {
-    trace += "x ";
     delete static_cast<Handle*>(*h);
-    *h = nullptr, --live;
-    return refuse("free") ? 2 : 0;
+    *h = nullptr;
+    return refuse("free", "x") ? 2 : 0;
 }
