@@ -166,6 +166,43 @@ VLX_API int32_t vlx_version(void);
 VLX_API int32_t vlxf_version(void);
 
 /* ======================================================================== */
+/* Optional vendor transform binding                                        */
+/* ======================================================================== */
+/* If the DFT module libmkl_rt.so.2 and the OpenMP runtime libiomp5.so can be
+ * loaded (loader search path) at a family's first transform or binding call,
+ * power-of-two vlxi_fft and vlxi_rfft go to them.  Without them every call
+ * below is inert and returns 0.  Each family has its own state.  Binding
+ * sets MKL_DISABLE_FAST_MM=YES and KMP_BLOCKTIME=0 where they are unset. */
+
+/* Bits of the flags word; other bits are stored and returned unused. */
+#define VLX_DFT_BOUND  0x1000 /* both modules loaded; set by binding, kept by vlx_dft_set_flags */
+#define VLX_DFT_FAST   0x2000 /* power-of-two transforms take the modules (on after binding) */
+#define VLX_DFT_KEEP   0x4000 /* keep descriptors between transforms, not freed after each */
+
+/* Binds if first; stores the flags word unless flags is NULL.  Returns 0. */
+VLX_API int32_t vlx_dft_get_flags(uint32_t* flags);
+VLX_API int32_t vlxf_dft_get_flags(uint32_t* flags);
+/* Binds if first; sets the flags word (VLX_DFT_BOUND kept when bound; without
+ * the modules VLX_DFT_BOUND, VLX_DFT_FAST and VLX_DFT_KEEP are cleared).  Returns 0. */
+VLX_API int32_t vlx_dft_set_flags(uint32_t flags);
+VLX_API int32_t vlxf_dft_set_flags(uint32_t flags);
+/* Stores the runtime's block time in ms (0 if the flags word is 0); NULL ms
+ * returns at once, without binding.  Returns 0. */
+VLX_API int32_t vlx_kmp_get_blocktime(int32_t* ms);
+VLX_API int32_t vlxf_kmp_get_blocktime(int32_t* ms);
+/* Binds if first; sets the runtime's block time in ms if the flags word is not 0.  Returns 0. */
+VLX_API int32_t vlx_kmp_set_blocktime(int32_t ms);
+VLX_API int32_t vlxf_kmp_set_blocktime(int32_t ms);
+/* Stores the runtime's maximum thread count (0 if the flags word is 0); NULL n
+ * returns at once, without binding.  Returns 0. */
+VLX_API int32_t vlx_omp_get_max_threads(int32_t* n);
+VLX_API int32_t vlxf_omp_get_max_threads(int32_t* n);
+/* Binds if first; if the flags word is not 0 sets the runtime's thread count
+ * and frees the family's descriptors.  0, or -1 if a descriptor release failed. */
+VLX_API int32_t vlx_omp_set_num_threads(int32_t n);
+VLX_API int32_t vlxf_omp_set_num_threads(int32_t n);
+
+/* ======================================================================== */
 /* Transforms                                                               */
 /* ======================================================================== */
 /* Forward transforms carry 1/N, inverse ones nothing.  After a transform
