@@ -238,6 +238,7 @@ int32_t quintic(const V* src, V* dst) {
 template <VlxVector V>
 int32_t proots_core(const V* src, V* dst) {
     using T = real_t<V>;
+    if (src->complex) return -1;
     const int32_t n = src->points;
     if (n <= 1) {
         dst->points = 0;
@@ -282,7 +283,6 @@ int32_t proots_core(const V* src, V* dst) {
 
 template <VlxVector V>
 int32_t proots(const V* src, V* dst) {
-    if (src->complex) return -1;
     if (src != dst) return proots_core(src, dst);
     V local;
     init(&local);
