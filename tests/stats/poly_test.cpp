@@ -125,6 +125,8 @@ TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialAndExpandBack) {
                 // Each root comes from a deflated polynomial, so earlier
                 // deflations' rounding adds up; clusters take the most.
                 EXPECT_LT(relative_residual(a, z), 256 * degree * eps) << "kind " << kind << ", degree " << degree << ", root " << z;
+                // sorted by power first
+                EXPECT_TRUE(i == 0 || std::norm(LC(v[2 * i - 2], v[2 * i - 1])) <= std::norm(z) * (1 + 4 * eps));
             }
             // Roots back to coefficients: the monic polynomial, to the size of its terms.
             ASSERT_EQ(t_pztoc(v.get()), 0);
