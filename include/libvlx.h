@@ -668,6 +668,44 @@ VLX_API int32_t vlxs_peak(const vlx_t* src, vlx_t* dst, int32_t flags, int32_t i
 VLX_API int32_t vlxfs_peak(const vlxf_t* src, vlxf_t* dst, int32_t flags, int32_t index);
 
 /* ======================================================================== */
+/* Statistics: polynomials and roots                                        */
+/* ======================================================================== */
+
+/* A polynomial is a real vector with data[k] the coefficient of x^k (constant
+ * first); complex coefficient vectors are refused with -1. */
+
+/* dst becomes one real point: the polynomial at x by Horner's rule (0 for an
+ * empty vector).  dst may be src. */
+VLX_API int32_t vlxs_peval(const vlx_t* src, vlx_t* dst, double x);
+VLX_API int32_t vlxfs_peval(const vlxf_t* src, vlxf_t* dst, float x);
+/* One real root, searched from x (moved inside the bounds on the real roots)
+ * by Laguerre's, then Newton's step: dst becomes one real point.  dst may be
+ * src.  -1 if no root passes the residual test (dst holds the last iterate). */
+VLX_API int32_t vlxs_psolve(const vlx_t* src, vlx_t* dst, double x);
+VLX_API int32_t vlxfs_psolve(const vlxf_t* src, vlxf_t* dst, float x);
+/* One real or complex root, searched from (re, im) with restarts and polished
+ * by Newton's step: dst becomes one point, complex 0 for a root classed real
+ * (re, im still stored).  dst may be src.  -1 if no root was found. */
+VLX_API int32_t vlxs_pcsolve(const vlx_t* src, vlx_t* dst, double re, double im);
+VLX_API int32_t vlxfs_pcsolve(const vlxf_t* src, vlxf_t* dst, float re, float im);
+/* All roots of up to 6 coefficients in closed form (degree 5 with one searched
+ * real root); leading zeros lower the degree.  A real list ascends; a complex
+ * one has the real roots first (imaginary part 0), then conjugate pairs.
+ * Fewer than 2 coefficients or a constant: 0 points.  dst may be src.  -1 for
+ * more than 6 coefficients or a failure. */
+VLX_API int32_t vlxs_proots(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_proots(const vlxf_t* src, vlxf_t* dst);
+/* All roots of any degree, in place: the coefficients become a complex list
+ * sorted as vlxi_sort sorts, found by search and deflation.  A search failure
+ * returns its status with v partly deflated. */
+VLX_API int32_t vlxi_proots(vlx_t* v);
+VLX_API int32_t vlxfi_proots(vlxf_t* v);
+/* A list of roots (real or complex) becomes the coefficients of the monic
+ * polynomial with those roots, of the same complex flag; empty: 1. */
+VLX_API int32_t vlxi_pztoc(vlx_t* v);
+VLX_API int32_t vlxfi_pztoc(vlxf_t* v);
+
+/* ======================================================================== */
 /* Internal helpers, exported for the library's own layers and for tests.   */
 /* Applications do not normally need them.                                  */
 /* ======================================================================== */
@@ -710,6 +748,52 @@ VLX_API int32_t vlxf_ceil_pts(float x);
 /* As vlx_ceil_pts, rounded down. */
 VLX_API int32_t vlx_floor_pts(double x);
 VLX_API int32_t vlxf_floor_pts(float x);
+
+/* --- polynomial root searches --- */
+
+/* Step functions: a real step returns dx (next point x - dx); a complex step
+ * writes dz[0], dz[1] (next point z - dz) and returns 0. */
+typedef double (*vlx_root_step_real_t)(const vlx_t* poly, double x);
+typedef float (*vlxf_root_step_real_t)(const vlxf_t* poly, float x);
+typedef int32_t (*vlx_root_step_t)(const vlx_t* poly, double re, double im, double* dz);
+typedef int32_t (*vlxf_root_step_t)(const vlxf_t* poly, float re, float im, float* dz);
+
+/* Largest |coefficient| over the smallest one not below largest * epsilon;
+ * 1 for a zero or empty polynomial.  Returns the spread. */
+VLX_API double vlxs_coef_spread(const vlx_t* poly);
+VLX_API float vlxfs_coef_spread(const vlxf_t* poly);
+/* Real Laguerre step at x (BOUND for a zero denominator, 0 at a root). */
+VLX_API double vlxs_laguerre_step_real(const vlx_t* poly, double x);
+VLX_API float vlxfs_laguerre_step_real(const vlxf_t* poly, float x);
+/* Real Newton step p/p' at x (p * BOUND when p' is 0). */
+VLX_API double vlxs_newton_step_real(const vlx_t* poly, double x);
+VLX_API float vlxfs_newton_step_real(const vlxf_t* poly, float x);
+/* Iterates step from x inside [lo, hi], storing the last point in *result;
+ * 0 if it passes the residual test, -1 otherwise. */
+VLX_API int32_t vlxs_root_iterate_real(const vlx_t* poly, double* result, vlx_root_step_real_t step, double x, double lo, double hi);
+VLX_API int32_t vlxfs_root_iterate_real(const vlxf_t* poly, float* result, vlxf_root_step_real_t step, float x, float lo, float hi);
+/* Lagrange's bound above the positive roots (at least 1; 0 if empty). */
+VLX_API double vlxs_root_upper_bound(const vlx_t* poly);
+VLX_API float vlxfs_root_upper_bound(const vlxf_t* poly);
+/* Lagrange's bound below the negative roots (at most -1; 0 if empty). */
+VLX_API double vlxs_root_lower_bound(const vlx_t* poly);
+VLX_API float vlxfs_root_lower_bound(const vlxf_t* poly);
+/* Complex Newton step p/p' at (re, im) into dz; returns 0. */
+VLX_API int32_t vlxs_newton_step(const vlx_t* poly, double re, double im, double* dz);
+VLX_API int32_t vlxfs_newton_step(const vlxf_t* poly, float re, float im, float* dz);
+/* Complex Laguerre step at (re, im) into dz; returns 0. */
+VLX_API int32_t vlxs_laguerre_step(const vlx_t* poly, double re, double im, double* dz);
+VLX_API int32_t vlxfs_laguerre_step(const vlxf_t* poly, float re, float im, float* dz);
+/* Iterates step from (re, im); on success stores the root as dst's first
+ * point (dst needs room for one complex point; an empty dst is sized) and
+ * sets dst's complex flag to its class.  relaxed widens the final limit.
+ * 0 or -1. */
+VLX_API int32_t vlxs_root_iterate(const vlx_t* poly, vlx_t* dst, vlx_root_step_t step, double re, double im, int32_t relaxed);
+VLX_API int32_t vlxfs_root_iterate(const vlxf_t* poly, vlxf_t* dst, vlxf_root_step_t step, float re, float im, int32_t relaxed);
+/* vlxs_root_iterate from (re, im) and three derived starts, the last one
+ * relaxed if relaxed is set; 0 at the first success, -1 if all fail. */
+VLX_API int32_t vlxs_root_restarts(const vlx_t* poly, vlx_t* dst, vlx_root_step_t step, double re, double im, int32_t relaxed);
+VLX_API int32_t vlxfs_root_restarts(const vlxf_t* poly, vlxf_t* dst, vlxf_root_step_t step, float re, float im, int32_t relaxed);
 
 #ifdef __cplusplus
 }

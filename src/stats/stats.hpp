@@ -37,6 +37,39 @@ template <VlxVector V> int32_t sort(V* v);
 
 template <VlxVector V> int32_t peak(const V* src, V* dst, int32_t flags, int32_t index);
 
+// ---- polynomials (data[k] the coefficient of x^k) and their roots ----
+
+// One real point: the polynomial at x by Horner's rule (vlxs_peval).
+template <VlxVector V> int32_t peval(const V* src, V* dst, real_t<V> x);
+// One root from a start: real (vlxs_psolve), or real or complex with the
+// class in dst's complex flag (vlxs_pcsolve).  dst may be src.
+template <VlxVector V> int32_t psolve(const V* src, V* dst, real_t<V> x);
+template <VlxVector V> int32_t pcsolve(const V* src, V* dst, real_t<V> re, real_t<V> im);
+// All roots up to degree 5 in closed form (vlxs_proots), of any degree by
+// search and deflation (vlxi_proots), and roots back to the monic
+// polynomial (vlxi_pztoc).
+template <VlxVector V> int32_t proots(const V* src, V* dst);
+template <VlxVector V> int32_t proots_inplace(V* v);
+template <VlxVector V> int32_t pztoc(V* v);
+
+// The layers of the root searches, exported for tests.  A real step gives dx
+// (next point x - dx); a complex step writes dz to dz[0], dz[1].
+template <VlxVector V> using real_step_fn = real_t<V> (*)(const V*, real_t<V>);
+template <VlxVector V> using complex_step_fn = int32_t (*)(const V*, real_t<V>, real_t<V>, real_t<V>*);
+template <VlxVector V> real_t<V> coef_spread(const V* p);
+template <VlxVector V> real_t<V> laguerre_step_real(const V* p, real_t<V> x);
+template <VlxVector V> real_t<V> newton_step_real(const V* p, real_t<V> x);
+template <VlxVector V>
+int32_t root_iterate_real(const V* p, real_t<V>* result, real_step_fn<V> step, real_t<V> x, real_t<V> lo, real_t<V> hi);
+template <VlxVector V> real_t<V> root_upper_bound(const V* p);
+template <VlxVector V> real_t<V> root_lower_bound(const V* p);
+template <VlxVector V> int32_t newton_step(const V* p, real_t<V> re, real_t<V> im, real_t<V>* dz);
+template <VlxVector V> int32_t laguerre_step(const V* p, real_t<V> re, real_t<V> im, real_t<V>* dz);
+template <VlxVector V>
+int32_t root_iterate(const V* p, V* dst, complex_step_fn<V> step, real_t<V> re, real_t<V> im, int32_t relaxed);
+template <VlxVector V>
+int32_t root_restarts(const V* p, V* dst, complex_step_fn<V> step, real_t<V> re, real_t<V> im, int32_t relaxed);
+
 namespace stats {
 
 // Every sum over samples runs in blocks of this many samples (points).
