@@ -178,8 +178,11 @@ int32_t zpad(V* v, int32_t new_n) {
 template <VlxVector V>
 int32_t append(V* dst, V* src) {
     if (src->complex && !dst->complex && rtoc(dst) < 0) return -1;
-    const int32_t n = src->points;
-    const int32_t old = dst->points;
+    // Negative lengths count as empty, and a sum beyond what points can hold
+    // fails before anything moves.
+    const int32_t n = src->points < 0 ? 0 : src->points;
+    const int32_t old = dst->points < 0 ? 0 : dst->points;
+    if (int64_t(old) + n > std::numeric_limits<int32_t>::max()) return -1;
     dst->points = old + n;
     if (realloc(dst, old, dst->complex) < 0) return -1;
     // Read src->data only now: appending a vector to itself may have moved it.
@@ -207,14 +210,18 @@ int32_t subvec(V* src, V* dst, int32_t start, int32_t count) {
     dst->points = r.count;
     dst->complex = src->complex;
     dst->delta = src->delta;
+    // A vector trimmed in place out of lent storage reads the lent block,
+    // which the allocation leaves alone, not the new block of fewer scalars.
+    const real_t<V>* lent = src == dst && dst->alloc <= 0 ? src->data : nullptr;
     if (alloc(dst) < 0) return -1;
+    const real_t<V>* from = lent != nullptr ? lent : src->data;
     const int64_t width = src->complex ? 2 : 1;
     const int64_t s = width * r.start;
     const int64_t c = width * r.count;
-    if (dst->data != src->data)
-        copy_scalars<V>(dst->data, src->data + s, c);
+    if (dst->data != from)
+        copy_scalars<V>(dst->data, from + s, c);
     else if (s != 0)
-        move_scalars<V>(dst->data, src->data + s, c);
+        move_scalars<V>(dst->data, from + s, c);
     return 0;
 }
 

@@ -63,7 +63,9 @@ int32_t stage_io(V* in, V** out_ref, V* other, V** hist_ref, int32_t hist_points
             const int32_t r = in->complex ? rtoc(hist) : real_part(hist);
             if (r != 0) return -1;
         }
-        // grows a short history, never shortens a long one
+        // grows a short history, never shortens a long one; one that claims
+        // samples without storage starts from silence
+        if (hist->data == nullptr && hist->points > 0 && zero(hist) != 0) return -1;
         if (zpad(hist, hist_points) != 0) return -1;
     }
 
@@ -119,7 +121,9 @@ template <VlxVector V>
 int32_t deci(V* in, V* out, int32_t factor, V* hist) {
     using T = real_t<V>;
     if (factor < 1) factor = 1;
-    const int64_t skip = (hist != nullptr && hist->points >= 1) ? read_skip<V>(hist->data[0]) : 0;
+    // A history without storage starts from silence, as an empty one does.
+    const bool has_skip = hist != nullptr && hist->points >= 1 && hist->data != nullptr;
+    const int64_t skip = has_skip ? read_skip<V>(hist->data[0]) : 0;
     const int64_t n = in->points < 0 ? 0 : in->points;
     const DeciPlan plan = deci_plan(skip, n, factor);
 
@@ -130,10 +134,15 @@ int32_t deci(V* in, V* out, int32_t factor, V* hist) {
     const T in_delta = in->delta;
 
     // A forward selection within one vector is safe, so no aliasing check.
+    const int32_t old_points = out->points;
     out->points = static_cast<int32_t>(plan.count);
     if (stage_io<V>(in, &out, nullptr, hist != nullptr ? &hist : nullptr, 1, VLX_STAGE_KEEP_POINTS,
-                    nullptr, nullptr, nullptr) != 0)
+                    nullptr, nullptr, nullptr) != 0) {
+        // A failed history leaves out (which may be in) as it was; a failed
+        // allocation has left it empty.
+        out->points = out->data != nullptr ? old_points : 0;
         return -1;
+    }
     out->delta = static_cast<T>(factor) * in_delta;
 
     T* dst = out->data;

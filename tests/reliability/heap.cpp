@@ -1,0 +1,161 @@
+// The counted allocator: malloc, calloc and realloc of this executable (and
+// so of the library, which calls them through the dynamic linker) and the
+// vector hooks of both families share one per-thread window.  The real
+// allocator is glibc's, or the sanitizer's when one is linked in.
+#include "harness.hpp"
+
+#include <csignal>
+#include <cstdio>
+#include <cstring>
+#include <mutex>
+#include <unistd.h>
+
+extern "C" {
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+void* __interceptor_malloc(size_t);
+void* __interceptor_calloc(size_t, size_t);
+void* __interceptor_realloc(void*, size_t);
+#define REL_REAL(f) __interceptor_##f
+#else
+void* __libc_malloc(size_t);
+void* __libc_calloc(size_t, size_t);
+void* __libc_realloc(void*, size_t);
+#define REL_REAL(f) __libc_##f
+#endif
+}
+
+namespace rel {
+namespace {
+thread_local Window tls_window;
+}
+
+Window& window() { return tls_window; }
+
+bool should_fail(size_t bytes) {
+    Window& w = tls_window;
+    if (!w.open || w.paused > 0) return false;
+    if (bytes > kCapBytes) return true;
+    if (++w.count != w.fail_at) return false;
+    ++w.failed;
+    return true;
+}
+
+void* raw_malloc(size_t bytes) { return REL_REAL(malloc)(bytes); }
+void raw_free(void* p) { std::free(p); }
+
+// ---- hook blocks, tracked so that a leak through the hooks is seen in any build.
+namespace {
+std::mutex live_mutex;
+std::vector<void*>* live = nullptr;  // made paused, on first use
+
+void track(void* p, void* gone) {
+    std::lock_guard<std::mutex> lock(live_mutex);
+    if (live == nullptr) {
+        Pause pause;
+        live = new std::vector<void*>();
+        live->reserve(1 << 12);
+    }
+    if (gone != nullptr)
+        for (auto& q : *live)
+            if (q == gone) {
+                q = live->back();
+                live->pop_back();
+                break;
+            }
+    if (p != nullptr) {
+        Pause pause;
+        live->push_back(p);
+    }
+}
+
+template <class V>
+size_t bytes_of(const V* v) {
+    const int64_t n = v->complex ? 2 * int64_t(v->points) : int64_t(v->points);
+    return size_t(n > 0 ? n : 0) * sizeof(*v->data);
+}
+
+template <class V>
+int32_t hook_alloc(V* v) {
+    if (v->alloc > 0) track(nullptr, v->data), std::free(v->data);
+    v->data = nullptr;
+    const size_t b = bytes_of(v);
+    if (should_fail(b)) return 0;
+    v->data = static_cast<decltype(v->data)>(REL_REAL(malloc)(b));
+    track(v->data, nullptr);
+    return 0;
+}
+
+template <class V>
+int32_t hook_realloc(V* v, int32_t, int32_t) {
+    const size_t b = bytes_of(v);
+    void* old = v->alloc > 0 ? v->data : nullptr;
+    if (should_fail(b)) {  // the failing hook gives the old block back itself
+        track(nullptr, old), std::free(old);
+        v->data = nullptr;
+        return 0;
+    }
+    void* p = REL_REAL(realloc)(old, b);
+    if (p != nullptr) track(p, old);
+    v->data = static_cast<decltype(v->data)>(p);
+    return 0;
+}
+
+template <class V>
+int32_t hook_free(V* v) {
+    track(nullptr, v->data);
+    std::free(v->data);
+    return 0;
+}
+}  // namespace
+
+long live_hook_blocks() {
+    std::lock_guard<std::mutex> lock(live_mutex);
+    return live == nullptr ? 0 : long(live->size());
+}
+
+void release_hook_blocks() {
+    std::lock_guard<std::mutex> lock(live_mutex);
+    if (live == nullptr) return;
+    for (void* p : *live) std::free(p);
+    live->clear();
+}
+
+void install_hooks() {
+    vlxtest::set_hooks<vlx_t>(hook_alloc<vlx_t>, hook_realloc<vlx_t>, hook_free<vlx_t>);
+    vlxtest::set_hooks<vlxf_t>(hook_alloc<vlxf_t>, hook_realloc<vlxf_t>, hook_free<vlxf_t>);
+}
+
+// ---- watchdog ---------------------------------------------------------------------
+namespace {
+char watched[512];
+size_t watched_len = 0;
+
+void on_alarm(int) {
+    static const char head[] = "\nreliability: call did not return in time: ";
+    (void)!write(2, head, sizeof head - 1);
+    (void)!write(2, watched, watched_len);
+    (void)!write(2, "\n", 1);
+    _exit(3);
+}
+}  // namespace
+
+void watch(const std::string& what, unsigned seconds) {
+    watched_len = std::min(what.size(), sizeof watched);
+    std::memcpy(watched, what.data(), watched_len);
+    std::signal(SIGALRM, on_alarm);
+    alarm(seconds);
+}
+
+void unwatch() { alarm(0); }
+
+}  // namespace rel
+
+// The interposed standard heap.  free needs no wrapper: every block comes from
+// the real allocator.
+extern "C" {
+void* malloc(size_t n) { return rel::should_fail(n) ? nullptr : REL_REAL(malloc)(n); }
+void* calloc(size_t n, size_t m) {
+    return rel::should_fail(m != 0 && n > SIZE_MAX / m ? SIZE_MAX : n * m) ? nullptr : REL_REAL(calloc)(n, m);
+}
+void* realloc(void* p, size_t n) { return n != 0 && rel::should_fail(n) ? nullptr : REL_REAL(realloc)(p, n); }
+}

@@ -1,0 +1,165 @@
+// The operation table: one row per exported operation (a few operations have
+// a second row for another path), each a representative call written once for
+// both families.  The context decides which argument is spoiled or aliased.
+#include "harness.hpp"
+
+namespace rel {
+namespace {
+
+// Points doubled, for a vector that must grow (hostile lengths left alone).
+template <class V>
+V* bump(V* v) {
+    if (v->points > 0 && v->points < (1 << 20)) v->points *= 2;
+    return v;
+}
+
+// A vector of given samples that the operation may resize.
+template <class V>
+V* gvals(Ctx<V>& c, std::initializer_list<double> x) {
+    V* v = c.grow(int32_t(x.size()));
+    if (v->alloc >= int32_t(x.size()) && v->points == int32_t(x.size()) && c.mode.kind == VKind::normal) {
+        int i = 0;
+        for (double d : x) v->data[i++] = vlxtest::real_of<V>(d);
+    }
+    return v;
+}
+
+// A staged filter call closed as a filter closes it.
+template <class V, class S, class U>
+int staged(Ctx<V>& c, S stage, U unstage, int32_t flags) {
+    V* out = c.out();
+    V* hist = c.hist();
+    V* tmp = c.out();
+    V* saved = nullptr;
+    int32_t aliased = 0;
+    const int r = stage(c.in(64), &out, nullptr, &hist, c.n(16), c.n(flags), &aliased, tmp, &saved);
+    if (r < 0) return r;
+    return unstage(out, aliased, saved);
+}
+
+#define POLY c.vals({-6, 11, -6, 1})
+#define BINARY(name) REL_ROW(b, name, return fn(c.in(32, true), c.in(32), c.out());)
+#define INPLACE(name, cplx) REL_ROW(i, name, return fn(c.io(32, cplx));)
+#define STAT(name, cplx) REL_ROW(s, name, return fn(c.in(64, cplx), c.out());)
+
+const std::vector<Row> table = {
+    // ---- vectors and memory
+    REL_ROW(, alloc, return fn(bump(c.grow(16)));),
+    REL_ROW(, realloc, V* v = c.grow(16); const int32_t p = v->points; return fn(bump(v), p, v->complex);),
+    REL_ROW(, destroy, return fn(c.grow(16, true));),
+    REL_ROW(i, zero, return fn(c.bare(16, true));),
+    REL_ROW(i, rtoc, return fn(c.grow(16));),
+    REL_ROW(i, zpad, return fn(c.grow(16, true), c.n(40));),
+    REL_ROW(, append, return fn(c.grow(16), c.in(8, true));),
+    REL_ROW(, copy, return fn(c.out(), c.in(16, true));),
+    REL_ROW(, copy_at_most, return fn(c.out(), c.in(16), c.n(5));),
+    REL_ROW(u, subvec, return fn(c.in(16, true), c.out(), c.n(2), c.n(5));),
+    REL_ROW(, insert_subvec, return fn(c.in(8, true), c.io(16), c.n(1), c.n(5), c.n(3));),
+    REL_ROW(u, tof, return fn(c.in(16, true), c.fout());),
+    REL_ROW(, cmp, int32_t r = 0; return fn(c.in(16, true), c.in(16), c.s(0.1), &r);),
+    // ---- binding calls (inert without the modules); the flags word is restored
+    REL_ROW(, dft_set_flags, uint32_t old = 0; REL_TW(, dft_get_flags)(&old);
+            const int r = fn(c.u(VLX_DFT_KEEP)); REL_TW(, dft_set_flags)(old); return r;),
+    REL_ROW(, kmp_set_blocktime, return fn(c.n(0));),
+    REL_ROW(, omp_set_num_threads, return fn(c.n(1));),
+    // ---- transforms
+    REL_ROW(i, fft, return fn(c.grow(64), c.n(0));),
+    REL_ROW(i, fft, return fn(c.io(64, true), c.n(1));),
+    REL_ROW(i, bitrev, return fn(c.io(64, true));),
+    REL_ROW(i, bitrev_scale, return fn(c.io(64));),
+    REL_ROW(i, rfft, return fn(c.grow(64));),
+    REL_ROW(i, irfft, return fn(c.grow(33, true));),
+    REL_ROW(i, orecon, return fn(c.grow(33, true), c.n(1));),
+    REL_ROW(i, recon, return fn(c.grow(33, true));),
+    REL_ROW(i, dft, return fn(c.grow(48), c.n(0));),
+    REL_ROW(i, dft, return fn(c.io(64, true), c.n(1));),
+    REL_ROW(i, rdft, return fn(c.grow(48));),
+    REL_ROW(i, irdft, return fn(c.grow(25, true), c.n(1));),
+    REL_ROW(i, dct, return fn(c.io(48), c.u(0));),
+    REL_ROW(i, dct, return fn(c.io(48), c.u(3));),
+    REL_ROW(i, analytic, return fn(c.grow(48));),
+    REL_ROW(i, hilbert, return fn(c.io(48, true));),
+    // ---- two-operand
+    BINARY(add), BINARY(sub), BINARY(mul), BINARY(conj_mul), BINARY(div), BINARY(max), BINARY(min),
+    BINARY(inter), BINARY(prepare_dest),
+    REL_ROW(b, avg_add, return fn(c.in(32, true), c.in(32), c.out(), c.s(0.3));),
+    REL_ROW(b, ritoc, return fn(c.in(32), c.in(32), c.out());),
+    REL_ROW(b, pmul, return fn(c.in(16), c.in(12, true), c.out());),
+    REL_ROW(bs, dot, return fn(c.in(32, true), c.in(32), c.out());),
+    // ---- arithmetic and math
+    REL_ROW(i, scale, return fn(c.io(32, true), c.s(2.5));),
+    REL_ROW(i, offset, return fn(c.io(32), c.s(1));),
+    REL_ROW(i, cscale, return fn(c.grow(32), c.s(1), c.s(2));),
+    REL_ROW(i, timesi, return fn(c.grow(32));),
+    REL_ROW(i, db, return fn(c.io(32, true), c.s(20));),
+    REL_ROW(i, addcos, return fn(c.io(32, true), c.u(1), c.s(0.1), c.s(2), c.s(0.3));),
+    INPLACE(neg, true), INPLACE(abs, false), INPLACE(conj, true), INPLACE(mag, true), INPLACE(magsq, true),
+    INPLACE(square, true), INPLACE(recip, true), INPLACE(sqrt, true), INPLACE(exp, true), INPLACE(exp10, false),
+    INPLACE(log, true), INPLACE(log10, false), INPLACE(ptor, true), INPLACE(sin, false), INPLACE(cos, false),
+    INPLACE(tan, false), INPLACE(atan, false), INPLACE(tanh, false), INPLACE(acos, false), INPLACE(asin, false),
+    INPLACE(cosh, false), INPLACE(sinh, false), INPLACE(sinc, false), INPLACE(besi0, false),
+    INPLACE(besj0, false), INPLACE(besj1, false), INPLACE(besy0, false), INPLACE(besy1, false),
+    INPLACE(erf, false), INPLACE(erfc, false), INPLACE(gamma, false), INPLACE(lgamma, false),
+    REL_ROW(u, mag, return fn(c.in(32, true), c.out());),
+    REL_ROW(u, magsq, return fn(c.in(32, true), c.out());),
+    REL_ROW(u, sqrt, return fn(c.in(32, true), c.out());),
+    REL_ROW(, besi0_kernel, return fn(c.s(3)) >= 0 ? 0 : -1;),
+    // ---- layout
+    INPLACE(real, true), INPLACE(rev, true), INPLACE(imag, false), INPLACE(swap_halves, true),
+    INPLACE(swap_halves2, false),
+    REL_ROW(i, shift, return fn(c.io(32, true), c.n(5));),
+    REL_ROW(i, zpad2, return fn(c.grow(20, true), c.n(32), c.n(VLX_PAD_CENTRE | VLX_PAD_SCALE_SQRT));),
+    REL_ROW(i, unzpad, return fn(c.io(32), c.n(20), c.n(VLX_PAD_SPLIT));),
+    REL_ROW(i, zinter, return fn(c.grow(16, true));),
+    REL_ROW(u, zinter, return fn(c.in(16), c.out(), c.s(2));),
+    // ---- generators, noise, resampling tables
+    REL_ROW(c, line, return fn(c.bare(32), c.s(0.5), c.s(1));),
+    REL_ROW(c, cos, return fn(c.bare(32), c.s(0.1), c.s(0.2));),
+    REL_ROW(c, cexp, return fn(c.bare(32, true), c.s(0.1), c.s(0.2));),
+    REL_ROW(c, rand, return fn(c.bare(32), c.n(1));),
+    REL_ROW(c, rand, return fn(c.bare(32, true), c.n(0));),
+    REL_ROW(i, shuffle, return fn(c.io(32, true));),
+    REL_ROW(c, rsmp, return fn(c.bare(66), c.n(0));),
+    REL_ROW(c, rsmp_cos, return fn(c.bare(66), c.vals({8, 0.5, 0.5}));),
+    REL_ROW(c, rsmp_pcos, return fn(c.bare(66), c.vals({8, 0.5, 0.25, 0.25}));),
+    // ---- staging and decimation
+    REL_ROW(d, deci, return fn(c.in(64), c.out(), c.n(3), c.hist());),
+    REL_ROW(, stage_io, return staged(c, fn, REL_TW(, unstage_io), VLX_STAGE_ALIAS);),
+    REL_ROW(, nearly_equal, return fn(c.s(1), c.s(1)) >= 0 ? 0 : -1;),
+    REL_ROW(, ceil_pts, return fn(c.s(3.5)) >= 0 ? 0 : -1;),
+    REL_ROW(, floor_pts, return fn(c.s(3.5)) >= 0 ? 0 : -1;),
+    // ---- statistics
+    STAT(sum, true), STAT(mean, true), STAT(magsq_sum, true), STAT(rms, true), STAT(pop_var, true),
+    STAT(samp_var, false), STAT(pop_stddev, true), STAT(samp_stddev, false), STAT(skew, false),
+    STAT(excess, false), STAT(gmean, true), STAT(hmean, false), STAT(min, true), STAT(max, false),
+    STAT(median, true), STAT(median, false),
+    REL_ROW(s, hist, return fn(c.in(64, true), c.out(), c.s(-1), c.s(0.25), c.n(8));),
+    REL_ROW(i, sort, return fn(c.io(64, true));),
+    REL_ROW(s, peak, return fn(c.in(64), c.out(), c.n(VLX_PEAK_PARABOLA), c.n(3));),
+    REL_ROW(s, peak, return fn(c.in(64, true), c.out(), c.n(VLX_PEAK_LOG_RATIO_CORRECTED | VLX_PEAK_AT_INDEX), c.n(3));),
+    // ---- polynomials and roots
+    REL_ROW(s, peval, return fn(POLY, c.out(), c.s(0.5));),
+    REL_ROW(s, psolve, return fn(POLY, c.out(), c.s(0.5));),
+    REL_ROW(s, pcsolve, return fn(c.vals({1, 0, 1}), c.out(), c.s(0.1), c.s(0.9));),
+    REL_ROW(s, proots, return fn(POLY, c.out());),
+    REL_ROW(s, proots, return fn(c.vals({1, -2, 3, -4, 5, 6}), c.out());),
+    REL_ROWF(kSettledLeak, i, proots, V* v = c.io(8); return fn(v);),
+    REL_ROW(i, pztoc, return fn(c.io(4));),
+    REL_ROW(s, coef_spread, return fn(POLY) >= 0 ? 0 : -1;),
+    REL_ROW(s, laguerre_step_real, return fn(POLY, c.s(0.5)) >= 0 ? 0 : -1;),
+    REL_ROW(s, newton_step_real, return fn(POLY, c.s(0.5)) >= 0 ? 0 : -1;),
+    REL_ROW(s, root_upper_bound, return fn(POLY) >= 0 ? 0 : -1;),
+    REL_ROW(s, root_lower_bound, return fn(POLY) >= 0 ? 0 : -1;),
+    REL_ROW(s, root_iterate_real, T r = 0;
+            return fn(POLY, &r, REL_TW(s, laguerre_step_real), c.s(0.5), c.s(-10), c.s(10));),
+    REL_ROW(s, newton_step, T dz[2]; return fn(POLY, c.s(0.5), c.s(0.5), dz);),
+    REL_ROW(s, laguerre_step, T dz[2]; return fn(POLY, c.s(0.5), c.s(0.5), dz);),
+    REL_ROW(s, root_iterate, return fn(c.vals({1, 0, 1}), c.fixed(1, true), REL_TW(s, laguerre_step), c.s(0.1), c.s(0.9), c.n(0));),
+    REL_ROW(s, root_restarts, return fn(c.vals({1, 0, 1}), c.fixed(1, true), REL_TW(s, newton_step), c.s(0.1), c.s(0.9), c.n(1));),
+};
+
+}  // namespace
+
+const std::vector<Row>& rows() { return table; }
+
+}  // namespace rel

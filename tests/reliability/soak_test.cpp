@@ -1,0 +1,137 @@
+// Concurrency soak: worker threads run cached-table operations of both
+// families while another thread releases the caches in a loop; every result
+// must equal the single-threaded one bit for bit.  VLX_SOAK_SECONDS and
+// VLX_SOAK_THREADS set the length and the number of workers.
+#include "harness.hpp"
+
+#include <atomic>
+#include <chrono>
+#include <cstdio>
+#include <functional>
+#include <mutex>
+#include <thread>
+
+namespace rel {
+namespace {
+
+struct Result {
+    int rc = 0;
+    int32_t points = 0, is_complex = 0;
+    double delta = 0;
+    std::vector<double> x;
+    bool operator==(const Result& o) const {
+        if (rc != o.rc || points != o.points || is_complex != o.is_complex || !vlxtest::same_bits(delta, o.delta) ||
+            x.size() != o.x.size())
+            return false;
+        for (size_t i = 0; i < x.size(); ++i)
+            if (!vlxtest::same_bits(x[i], o.x[i])) return false;
+        return true;
+    }
+};
+
+struct Job {
+    std::string name;
+    std::function<Result()> run;
+};
+
+// Runs op on a fresh vector of n deterministic points; check may turn a
+// random result into a reproducible one (sorted, or a range test).
+template <class V>
+Job job(const char* name, int32_t n, bool cplx, int (*op)(V*), void (*check)(V*) = nullptr) {
+    return {std::string(name) + (vlxtest::is_double<V> ? "" : " (float)"), [=] {
+                using T = vlxtest::real_of<V>;
+                V v;
+                vlxtest::t_init(&v);
+                v.points = n, v.complex = cplx, v.delta = T(0.5);
+                vlxtest::t_alloc(&v);
+                const auto in = vlxtest::random_values<T>(size_t(cplx ? 2 * n : n), uint32_t(n));
+                for (size_t i = 0; i < in.size(); ++i) v.data[i] = in[i];
+                Result r;
+                r.rc = op(&v);
+                if (check != nullptr) check(&v);
+                r.points = v.points, r.is_complex = v.complex, r.delta = double(v.delta);
+                const int64_t s = v.complex ? 2 * int64_t(v.points) : v.points;
+                for (int64_t i = 0; i < s; ++i) r.x.push_back(double(v.data[i]));
+                vlxtest::t_destroy(&v);
+                return r;
+            }};
+}
+
+template <class V>
+void sort_it(V* v) {
+    REL_TW(i, sort)(v);
+}
+
+// Uniform noise lies in [-1, 1): replaced by the count of samples outside.
+template <class V>
+void count_outside(V* v) {
+    int32_t bad = 0;
+    for (int32_t i = 0; i < v->points; ++i) bad += !(v->data[i] >= -1 && v->data[i] < 1);
+    v->points = 1, v->data[0] = decltype(v->data[0] + 0)(bad);
+}
+
+template <class V>
+void add_jobs(std::vector<Job>& jobs) {
+    jobs.push_back(job<V>("fft", 1024, true, [](V* v) { return REL_TW(i, fft)(v, 0); }));
+    jobs.push_back(job<V>("inverse fft", 256, true, [](V* v) { return REL_TW(i, fft)(v, 1); }));
+    jobs.push_back(job<V>("rfft", 2048, false, [](V* v) { return REL_TW(i, rfft)(v); }));
+    jobs.push_back(job<V>("bitrev", 512, true, [](V* v) { return REL_TW(i, bitrev_scale)(v); }));
+    jobs.push_back(job<V>("dft", 1000, true, [](V* v) { return REL_TW(i, dft)(v, 0); }));
+    jobs.push_back(job<V>("rdft", 999, false, [](V* v) { return REL_TW(i, rdft)(v); }));
+    jobs.push_back(job<V>("dct", 300, false, [](V* v) { return REL_TW(i, dct)(v, 2); }));
+    jobs.push_back(job<V>("analytic", 500, false, [](V* v) { return REL_TW(i, analytic)(v); }));
+    jobs.push_back(job<V>("noise", 4096, false, [](V* v) { return REL_TW(c, rand)(v, 0); }, count_outside<V>));
+    jobs.push_back(job<V>("shuffle", 1000, true, [](V* v) { return REL_TW(i, shuffle)(v); }, sort_it<V>));
+}
+
+double env_number(const char* name, double fallback) {
+    const char* e = std::getenv(name);
+    return e != nullptr && *e != '\0' ? std::atof(e) : fallback;
+}
+
+}  // namespace
+
+TEST(ReliabilitySoak, CachesReleasedUnderRunningOperations) {
+    install_hooks();
+    vlx_lib_init();
+    std::vector<Job> jobs;
+    add_jobs<vlx_t>(jobs);
+    add_jobs<vlxf_t>(jobs);
+    std::vector<Result> want;
+    for (const Job& j : jobs) want.push_back(j.run());
+    for (size_t i = 0; i < jobs.size(); ++i) ASSERT_GE(want[i].rc, 0) << jobs[i].name;
+
+    const double seconds = env_number("VLX_SOAK_SECONDS", 2);
+    const int workers = std::max(1, int(env_number("VLX_SOAK_THREADS", 3)));
+    std::atomic<bool> stop{false};
+    std::atomic<long> calls{0}, releases{0}, release_failures{0};
+    std::mutex m;
+    std::vector<std::string> wrong;
+    std::vector<std::thread> threads;
+    for (int t = 0; t < workers; ++t)
+        threads.emplace_back([&, t] {
+            for (size_t i = size_t(t); !stop.load(); i = (i + 1) % jobs.size(), ++calls)
+                if (!(jobs[i].run() == want[i])) {
+                    std::lock_guard<std::mutex> lock(m);
+                    wrong.push_back(jobs[i].name);
+                }
+        });
+    std::thread freer([&] {
+        while (!stop.load()) {
+            release_failures += (vlx_free_internal() != 0) + (vlxf_free_internal() != 0);
+            ++releases;
+            std::this_thread::yield();
+        }
+    });
+    std::this_thread::sleep_for(std::chrono::duration<double>(seconds));
+    stop = true;
+    for (auto& t : threads) t.join();
+    freer.join();
+    EXPECT_TRUE(wrong.empty()) << wrong.size() << " results differ, first: " << wrong.front() << ", last: " << wrong.back();
+    EXPECT_EQ(release_failures.load(), 0);
+    EXPECT_GT(releases.load(), 0);
+    std::printf("[ figures  ] %d workers for %.1f s (%.1f thread-seconds): %ld calls, %ld cache releases\n", workers,
+                seconds, seconds * (workers + 1), calls.load(), releases.load());
+}
+
+}  // namespace rel
