@@ -32,6 +32,14 @@ struct Result {
 struct Job {
     std::string name;
     std::function<Result()> run;
+    double tolerance = 0;  // relative to the largest magnitude; 0: bit for bit
+    bool matches(const Result& got, const Result& want) const {
+        if (tolerance == 0 || got.x.size() != want.x.size()) return got == want;
+        double top = 0, diff = 0;
+        for (size_t i = 0; i < got.x.size(); ++i)
+            top = std::max(top, std::fabs(want.x[i])), diff = std::max(diff, std::fabs(got.x[i] - want.x[i]));
+        return got.rc == want.rc && got.points == want.points && diff <= tolerance * top;
+    }
 };
 
 // Runs op on a fresh vector of n deterministic points; check may turn a
@@ -78,8 +86,13 @@ void add_jobs(std::vector<Job>& jobs) {
     jobs.push_back(job<V>("bitrev", 512, true, [](V* v) { return REL_TW(i, bitrev_scale)(v); }));
     jobs.push_back(job<V>("dft", 1000, true, [](V* v) { return REL_TW(i, dft)(v, 0); }));
     jobs.push_back(job<V>("rdft", 999, false, [](V* v) { return REL_TW(i, rdft)(v); }));
-    jobs.push_back(job<V>("dct", 300, false, [](V* v) { return REL_TW(i, dct)(v, 2); }));
     jobs.push_back(job<V>("analytic", 500, false, [](V* v) { return REL_TW(i, analytic)(v); }));
+    // The any-length transform turns its cached filter when only the direction
+    // changes rather than rebuilding it, so its last bits depend on the call
+    // before (and on a release in between): these agree to rounding only.
+    for (size_t i = jobs.size() - 3; i < jobs.size(); ++i)
+        jobs[i].tolerance = vlxtest::is_double<V> ? 1e-13 : 1e-5;
+    jobs.push_back(job<V>("dct", 300, false, [](V* v) { return REL_TW(i, dct)(v, 2); }));
     jobs.push_back(job<V>("noise", 4096, false, [](V* v) { return REL_TW(c, rand)(v, 0); }, count_outside<V>));
     jobs.push_back(job<V>("shuffle", 1000, true, [](V* v) { return REL_TW(i, shuffle)(v); }, sort_it<V>));
 }
@@ -98,8 +111,10 @@ TEST(ReliabilitySoak, CachesReleasedUnderRunningOperations) {
     add_jobs<vlx_t>(jobs);
     add_jobs<vlxf_t>(jobs);
     std::vector<Result> want;
-    for (const Job& j : jobs) want.push_back(j.run());
-    for (size_t i = 0; i < jobs.size(); ++i) ASSERT_GE(want[i].rc, 0) << jobs[i].name;
+    for (const Job& j : jobs) {
+        want.push_back(j.run());
+        ASSERT_GE(want.back().rc, 0) << j.name;
+    }
 
     const double seconds = env_number("VLX_SOAK_SECONDS", 2);
     const int workers = std::max(1, int(env_number("VLX_SOAK_THREADS", 3)));
@@ -111,7 +126,7 @@ TEST(ReliabilitySoak, CachesReleasedUnderRunningOperations) {
     for (int t = 0; t < workers; ++t)
         threads.emplace_back([&, t] {
             for (size_t i = size_t(t); !stop.load(); i = (i + 1) % jobs.size(), ++calls)
-                if (!(jobs[i].run() == want[i])) {
+                if (!jobs[i].matches(jobs[i].run(), want[i])) {
                     std::lock_guard<std::mutex> lock(m);
                     wrong.push_back(jobs[i].name);
                 }
