@@ -563,6 +563,10 @@ VLX_API int32_t vlxfi_hwfilt(vlxf_t* v, int32_t id);
  * hist: T + 2 points (window, mu, T + position reached).  coef under 2 points copies in. */
 VLX_API int32_t vlxd_rsmp(vlx_t* in, vlx_t* out, int32_t method, vlx_t* coef, double ratio, vlx_t* hist);
 VLX_API int32_t vlxfd_rsmp(vlxf_t* in, vlxf_t* out, int32_t method, vlxf_t* coef, float ratio, vlxf_t* hist);
+/* vlxd_rsmp with built-in table design 0 to 4 (vlxc_rsmp) made and destroyed in the call; after
+ * a failed run the table is not released. */
+VLX_API int32_t vlxd_rsmp2(vlx_t* in, vlx_t* out, int32_t method, int32_t design, double ratio, vlx_t* hist);
+VLX_API int32_t vlxfd_rsmp2(vlxf_t* in, vlxf_t* out, int32_t method, int32_t design, float ratio, vlxf_t* hist);
 
 /* ======================================================================== */
 /* Statistics: moments, histogram, sort and median                          */

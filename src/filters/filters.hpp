@@ -110,5 +110,8 @@ int32_t hwfilt(V* in, V* out, int32_t id, V* hist);
 // (vlxd_rsmp); out->points preset to the most outputs wanted.
 template <VlxVector V>
 int32_t rsmp(V* in, V* out, int32_t method, V* coef, real_t<V> ratio, V* hist);
+// vlxd_rsmp with a built-in table (design 0 to 4) made for the call (vlxd_rsmp2).
+template <VlxVector V>
+int32_t rsmp2(V* in, V* out, int32_t method, int32_t design, real_t<V> ratio, V* hist);
 
 }  // namespace vlx

@@ -2,6 +2,7 @@
 // nearest below its position between input samples, or interpolated between
 // that phase and the next, and the window position and fractional time travel
 // in the history from block to block.
+#include "design/design.hpp"
 #include "filters/filters.hpp"
 
 #include <cstdint>
@@ -152,8 +153,27 @@ int32_t rsmp(V* in, V* out, int32_t method, V* coef, real_t<V> ratio, V* hist) {
     return finish_io<V>(out, aliased, saved, status);
 }
 
+template <VlxVector V>
+int32_t rsmp2(V* in, V* out, int32_t method, int32_t design, real_t<V> ratio, V* hist) {
+    static constexpr int32_t table_points[5] = {8194, 13314, 2050, 10242, 13314};
+    if (design < 0 || design > 4) return -1;
+    V coef;
+    init(&coef);
+    coef.points = table_points[design];
+    if (rsmp<V>(&coef, design) != 0) {
+        destroy(&coef);
+        return -1;
+    }
+    // A failed run leaves the table allocated: settled behaviour, the memory
+    // is lost until the process ends.
+    if (rsmp(in, out, method, &coef, ratio, hist) != 0) return -1;
+    return destroy(&coef) == 0 ? 0 : -1;
+}
+
 template int32_t rsmp<vlx_t>(vlx_t*, vlx_t*, int32_t, vlx_t*, double, vlx_t*);
 template int32_t rsmp<vlxf_t>(vlxf_t*, vlxf_t*, int32_t, vlxf_t*, float, vlxf_t*);
+template int32_t rsmp2<vlx_t>(vlx_t*, vlx_t*, int32_t, int32_t, double, vlx_t*);
+template int32_t rsmp2<vlxf_t>(vlxf_t*, vlxf_t*, int32_t, int32_t, float, vlxf_t*);
 
 }  // namespace vlx
 
@@ -163,5 +183,11 @@ VLX_API int32_t vlxd_rsmp(vlx_t* in, vlx_t* out, int32_t method, vlx_t* coef, do
 }
 VLX_API int32_t vlxfd_rsmp(vlxf_t* in, vlxf_t* out, int32_t method, vlxf_t* coef, float ratio, vlxf_t* hist) {
     return vlx::rsmp(in, out, method, coef, ratio, hist);
+}
+VLX_API int32_t vlxd_rsmp2(vlx_t* in, vlx_t* out, int32_t method, int32_t design, double ratio, vlx_t* hist) {
+    return vlx::rsmp2(in, out, method, design, ratio, hist);
+}
+VLX_API int32_t vlxfd_rsmp2(vlxf_t* in, vlxf_t* out, int32_t method, int32_t design, float ratio, vlxf_t* hist) {
+    return vlx::rsmp2(in, out, method, design, ratio, hist);
 }
 }
