@@ -458,6 +458,47 @@ VLX_API int32_t vlxu_zinter(vlx_t* src, vlx_t* dst, double scale);
 VLX_API int32_t vlxfu_zinter(vlxf_t* src, vlxf_t* dst, float scale);
 
 /* ======================================================================== */
+/* Element-wise: phase and time operations                                  */
+/* ======================================================================== */
+/* pi is 3.141592653589793 (float: 3.1415927). */
+
+/* Real only: unwraps a phase in radians, taking out whole turns so that each
+ * sample lies within pi of the previous output (the first within pi of 0). */
+VLX_API int32_t vlxi_unwrap(vlx_t* v);
+VLX_API int32_t vlxfi_unwrap(vlxf_t* v);
+/* Real only: as vlxi_unwrap against the mean of the last window outputs
+ * (fewer at the start); window 1 is vlxi_unwrap, 0 reduces against 0.  -1 if window < 0. */
+VLX_API int32_t vlxi_unwrap_wnd(vlx_t* v, int32_t window);
+VLX_API int32_t vlxfi_unwrap_wnd(vlxf_t* v, int32_t window);
+/* First difference per unit of x: (x[i] - x[i-1]) / delta with x[-1] = 0;
+ * delta 0 multiplies by 1e100 instead (float: 999999986991104).  Complex: part by part. */
+VLX_API int32_t vlxi_differ(vlx_t* v);
+VLX_API int32_t vlxfi_differ(vlxf_t* v);
+/* Running sum times delta: y[i] = y[i-1] + x[i] * delta.  Complex: part by part. */
+VLX_API int32_t vlxi_integ(vlx_t* v);
+VLX_API int32_t vlxfi_integ(vlxf_t* v);
+/* Real only: replaces the samples by the x positions (in units of delta,
+ * linearly interpolated) where they cross level; mode 1 rising, 2 falling, 3 both.  delta becomes 1. */
+VLX_API int32_t vlxi_edge(vlx_t* v, int32_t mode, double level);
+VLX_API int32_t vlxfi_edge(vlxf_t* v, int32_t mode, float level);
+/* Clips every scalar to the range between a and b (either order); *clipped
+ * (if not NULL) is 1 if any changed, else 0.  The second argument is unused; NaN stays. */
+VLX_API int32_t vlxi_limit(vlx_t* v, int32_t unused, double a, double b, int32_t* clipped);
+VLX_API int32_t vlxfi_limit(vlxf_t* v, int32_t unused, float a, float b, int32_t* clipped);
+/* Derivative of the polynomial whose coefficients (lowest power first) are
+ * the samples; one point fewer. */
+VLX_API int32_t vlxi_pdiffer(vlx_t* v);
+VLX_API int32_t vlxfi_pdiffer(vlxf_t* v);
+/* Phase in radians: complex points give atan2(im, re) (0 at the origin) as a
+ * real vector; real samples give pi below 0, else 0. */
+VLX_API int32_t vlxi_phase(vlx_t* v);
+VLX_API int32_t vlxfi_phase(vlxf_t* v);
+/* Polar form: each point becomes the complex pair (magnitude, phase in
+ * radians), a real vector turning complex. */
+VLX_API int32_t vlxi_rtop(vlx_t* v);
+VLX_API int32_t vlxfi_rtop(vlxf_t* v);
+
+/* ======================================================================== */
 /* Filters: staging and decimation                                          */
 /* ======================================================================== */
 /* A filter's history `hist` is an optional vector owned by the caller that
