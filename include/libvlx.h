@@ -614,6 +614,47 @@ VLX_API int32_t vlxs_peak(const vlx_t* src, vlx_t* dst, int32_t flags, int32_t i
 VLX_API int32_t vlxfs_peak(const vlxf_t* src, vlxf_t* dst, int32_t flags, int32_t index);
 
 /* ======================================================================== */
+/* Statistics: regression and interpolation                                 */
+/* ======================================================================== */
+
+/* Straight-line fit of src: a real vector as y against x = index * delta (delta 0 taken as 1;
+ * x restarts at 0 every 2048 points), a complex one as im against re.  dst: slope, intercept. */
+VLX_API int32_t vlxs_lin_regres(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_lin_regres(const vlxf_t* src, vlxf_t* dst);
+/* The same fit as a record of 20 real points (delta 1): y on x (slope, intercept, residual
+ * variance, slope and intercept variances, their covariance and correlation), the same 7 for x on y,
+ * means of x and y, sample variances of x and y, sample covariance, correlation.  Slopes of a
+ * vanishing variance are 1e100 (float: 999999986991104).  dst may be src. */
+VLX_API int32_t vlxs_lin_regres2(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_lin_regres2(const vlxf_t* src, vlxf_t* dst);
+
+/* Methods of vlx_interp (the low three bits; 2, 4, 6 and 7 give every query one value) and its flag. */
+#define VLX_INTERP_STEP       0  /* the tabulated value on the left */
+#define VLX_INTERP_LINEAR     1  /* straight line between neighbours */
+#define VLX_INTERP_QUADRATIC  3  /* parabola through the three nearest points (linear below 3 points) */
+#define VLX_INTERP_SPLINE     5  /* cubic spline from second derivatives */
+#define VLX_INTERP_HOLD_ENDS 16  /* no extrapolation: outside the table take the end value */
+/* End conditions of vlxb_cspline_2d. */
+#define VLX_SPLINE_NOT_A_KNOT         0 /* the node next to the end is no knot */
+#define VLX_SPLINE_FIRST_DERIVATIVE   1 /* the end's first derivative is given */
+#define VLX_SPLINE_SECOND_DERIVATIVE  2 /* the end's second derivative is given */
+#define VLX_SPLINE_NATURAL            3 /* the end's second derivative is 0 */
+
+/* Interpolates the real table y(x) at the queries xi (meant to ascend) into yi, which gets xi's
+ * points and delta; yi may be xi but no other operand.  y2: spline second derivatives, or NULL for
+ * not-a-knot ones made here.  -1 on complex operands, unequal lengths or equal abscissas met. */
+VLX_API int32_t vlx_interp(const vlx_t* x, vlx_t* y, const vlx_t* y2, const vlx_t* xi, vlx_t* yi, int32_t flags);
+VLX_API int32_t vlxf_interp(const vlxf_t* x, vlxf_t* y, const vlxf_t* y2, const vlxf_t* xi, vlxf_t* yi, int32_t flags);
+/* vlx_interp with VLX_INTERP_SPLINE. */
+VLX_API int32_t vlx_cspline(const vlx_t* x, vlx_t* y, const vlx_t* y2, const vlx_t* xi, vlx_t* yi);
+VLX_API int32_t vlxf_cspline(const vlxf_t* x, vlxf_t* y, const vlxf_t* y2, const vlxf_t* xi, vlxf_t* yi);
+/* Cubic spline second derivatives of y(x) into y2 (x rising strictly, 4 points or more), with
+ * VLX_SPLINE_ end conditions end0, endn and their derivatives d0, dn.  y is changed during the
+ * call and put back (not on a bad endn), so no other thread may use it meanwhile. */
+VLX_API int32_t vlxb_cspline_2d(const vlx_t* x, vlx_t* y, vlx_t* y2, double d0, double dn, int32_t end0, int32_t endn);
+VLX_API int32_t vlxfb_cspline_2d(const vlxf_t* x, vlxf_t* y, vlxf_t* y2, float d0, float dn, int32_t end0, int32_t endn);
+
+/* ======================================================================== */
 /* Internal helpers, exported for the library's own layers and for tests.   */
 /* Applications do not normally need them.                                  */
 /* ======================================================================== */
@@ -656,6 +697,13 @@ VLX_API int32_t vlxf_ceil_pts(float x);
 /* As vlx_ceil_pts, rounded down. */
 VLX_API int32_t vlx_floor_pts(double x);
 VLX_API int32_t vlxf_floor_pts(float x);
+
+/* --- regression and interpolation --- */
+
+/* Solves the tridiagonal system of m rows (lower[i] x[i-1] + diag[i] x[i] + upper[i] x[i+1] =
+ * rhs[i]) into out, eliminating from the bottom row up without pivoting; overwrites lower and rhs.  -1 if m < 1. */
+VLX_API int32_t vlxb_tridiagonal_solve(double* lower, double* diag, double* upper, double* rhs, double* out, int32_t m);
+VLX_API int32_t vlxfb_tridiagonal_solve(float* lower, float* diag, float* upper, float* rhs, float* out, int32_t m);
 
 #ifdef __cplusplus
 }
