@@ -1,6 +1,7 @@
 // Interpolation of a tabulated function y(x) at query points xi, and the
 // second derivatives of its cubic spline.  Queries are meant to ascend: the
 // segment index only moves up, so a sweep costs O(n + m).
+#include "design/design.hpp"
 #include "elementwise/elementwise.hpp"
 #include "stats/stats.hpp"
 
@@ -19,23 +20,6 @@ template <>
 struct spline_consts<vlxf_t> {
     static constexpr float sixth = 0.16666667f;
 };
-
-// Fills v with offset + k * delta * slope, the step added sample by sample.
-// TODO(design): call the generator's line template once it is merged.
-template <VlxVector V>
-int32_t fill_line(V* v, real_t<V> slope, real_t<V> offset) {
-    using T = real_t<V>;
-    if (alloc(v) < 0) return -1;
-    const T step = v->delta * slope;
-    const int64_t stride = v->complex ? 2 : 1;
-    T value = offset;
-    for (int64_t k = 0; k < v->points; ++k) {
-        v->data[k * stride] = value;
-        if (stride == 2) v->data[k * stride + 1] = T(0);
-        value += step;
-    }
-    return 0;
-}
 
 template <class T>
 T cube(T v) {
@@ -373,7 +357,7 @@ int32_t interp_core(const V* x, const V* y, const V* y2, const V* xi, V* yi, int
     const T* q = xi->data;
     T* out = yi->data;
     if (n == 1) {
-        if (method != VLX_INTERP_SPLINE) return fill_line(yi, T(0), y->data[0]);
+        if (method != VLX_INTERP_SPLINE) return line(yi, T(0), y->data[0]);
         const T curve = y2->data[0];
         const T base = y->data[0];
         const T x0 = x->data[0];
