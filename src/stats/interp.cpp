@@ -253,11 +253,17 @@ int32_t interp_queries(const V* x, const V* y, const V* y2, const real_t<V>* q, 
     while (k < n - 1 && q[j] >= xs[k]) ++k;
     if (xs[k] - xs[k - 1] == T(0)) return -1;
 
-    // Moves k up past the abscissas at or below t; true if it moved.
+    // Moves k up past the abscissas at or below t.  The checked form refuses
+    // each gap of 0 as k reaches it, also one it only passes over.
     auto advance = [&](T t) {
-        const int64_t before = k;
         while (k < n - 1 && t >= xs[k]) ++k;
-        return k != before;
+    };
+    auto advance_checked = [&](T t) {
+        while (k < n - 1 && t >= xs[k]) {
+            ++k;
+            if (xs[k] - xs[k - 1] == T(0)) return false;
+        }
+        return true;
     };
 
     switch (method) {
@@ -273,7 +279,7 @@ int32_t interp_queries(const V* x, const V* y, const V* y2, const real_t<V>* q, 
         case VLX_INTERP_LINEAR:
             for (; j < m; ++j) {
                 const T t = q[j];
-                if (advance(t) && xs[k] - xs[k - 1] == T(0)) return -1;
+                if (!advance_checked(t)) return -1;
                 if (hold && t >= xs[k]) break;
                 const T r = T(1) / (xs[k] - xs[k - 1]);
                 out[j] = ((xs[k] - t) * ys[k - 1] + (t - xs[k - 1]) * ys[k]) * r;
@@ -315,9 +321,8 @@ int32_t interp_queries(const V* x, const V* y, const V* y2, const real_t<V>* q, 
             const T* m2 = y2->data;
             for (; j < m; ++j) {
                 const T t = q[j];
-                const bool moved = advance(t);
+                if (!advance_checked(t)) return -1;
                 const T h = xs[k] - xs[k - 1];
-                if (moved && h == T(0)) return -1;
                 const T r = T(1) / h;
                 if (hold && t >= xs[k]) break;
                 const T A = xs[k] - t;
