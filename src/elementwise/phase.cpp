@@ -252,8 +252,12 @@ VLX_API int32_t vlxfi_integ(vlxf_t* v) { return vlx::integ(v); }
 VLX_API int32_t vlxi_edge(vlx_t* v, int32_t mode, double level) { return vlx::edge(v, mode, level); }
 VLX_API int32_t vlxfi_edge(vlxf_t* v, int32_t mode, float level) { return vlx::edge(v, mode, level); }
 // The second argument is part of the interface and unused.
-VLX_API int32_t vlxi_limit(vlx_t* v, int32_t, double a, double b, int32_t* clipped) { return vlx::limit(v, a, b, clipped); }
-VLX_API int32_t vlxfi_limit(vlxf_t* v, int32_t, float a, float b, int32_t* clipped) { return vlx::limit(v, a, b, clipped); }
+VLX_API int32_t vlxi_limit(vlx_t* v, int32_t, double a, double b, int32_t* clipped) {
+    return vlx::limit(v, a, b, clipped);
+}
+VLX_API int32_t vlxfi_limit(vlxf_t* v, int32_t, float a, float b, int32_t* clipped) {
+    return vlx::limit(v, a, b, clipped);
+}
 VLX_API int32_t vlxi_pdiffer(vlx_t* v) { return vlx::pdiffer(v); }
 VLX_API int32_t vlxfi_pdiffer(vlxf_t* v) { return vlx::pdiffer(v); }
 VLX_API int32_t vlxi_phase(vlx_t* v) { return vlx::phase(v); }

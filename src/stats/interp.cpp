@@ -421,7 +421,8 @@ VLX_API int32_t vlxfb_cspline_2d(const vlxf_t* x, vlxf_t* y, vlxf_t* y2, float d
                                  int32_t endn) {
     return vlx::cspline_2d(x, y, y2, d0, dn, end0, endn);
 }
-VLX_API int32_t vlxb_tridiagonal_solve(double* lower, double* diag, double* upper, double* rhs, double* out, int32_t m) {
+VLX_API int32_t vlxb_tridiagonal_solve(double* lower, double* diag, double* upper, double* rhs, double* out,
+                                       int32_t m) {
     return vlx::tridiagonal_solve<vlx_t>(lower, diag, upper, rhs, out, m);
 }
 VLX_API int32_t vlxfb_tridiagonal_solve(float* lower, float* diag, float* upper, float* rhs, float* out, int32_t m) {
