@@ -266,6 +266,7 @@ int32_t interp_queries(const V* x, const V* y, const V* y2, const real_t<V>* q, 
         return true;
     };
 
+    T r_seg = T(0);
     switch (method) {
         case VLX_INTERP_STEP:
             // only the first gap is tested
@@ -277,12 +278,16 @@ int32_t interp_queries(const V* x, const V* y, const V* y2, const real_t<V>* q, 
             }
             break;
         case VLX_INTERP_LINEAR:
-            for (; j < m; ++j) {
+            for (int64_t seg = 0; j < m; ++j) {
                 const T t = q[j];
                 if (!advance_checked(t)) return -1;
                 if (hold && t >= xs[k]) break;
-                const T r = T(1) / (xs[k] - xs[k - 1]);
-                out[j] = ((xs[k] - t) * ys[k - 1] + (t - xs[k - 1]) * ys[k]) * r;
+                // the reciprocal of a segment is the same for all its queries
+                if (seg != k) {
+                    seg = k;
+                    r_seg = T(1) / (xs[k] - xs[k - 1]);
+                }
+                out[j] = ((xs[k] - t) * ys[k - 1] + (t - xs[k - 1]) * ys[k]) * r_seg;
             }
             break;
         case VLX_INTERP_QUADRATIC: {
@@ -319,11 +324,16 @@ int32_t interp_queries(const V* x, const V* y, const V* y2, const real_t<V>* q, 
         }
         case VLX_INTERP_SPLINE: {
             const T* m2 = y2->data;
-            for (; j < m; ++j) {
+            T h = T(0);
+            for (int64_t seg = 0; j < m; ++j) {
                 const T t = q[j];
                 if (!advance_checked(t)) return -1;
-                const T h = xs[k] - xs[k - 1];
-                const T r = T(1) / h;
+                if (seg != k) {
+                    seg = k;
+                    h = xs[k] - xs[k - 1];
+                    r_seg = T(1) / h;
+                }
+                const T r = r_seg;
                 if (hold && t >= xs[k]) break;
                 const T A = xs[k] - t;
                 const T B = t - xs[k - 1];
