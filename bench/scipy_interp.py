@@ -1,9 +1,10 @@
 #!/usr/bin/env python3
 """Times scipy's CubicSpline on the table and queries of bench_interp.cpp.
 
-Usage: scipy_interp.py REPS.  Prints one line per repetition:
-"eval SECONDS" (evaluation of the queries on a spline built beforehand) and
-"full SECONDS" (construction with not-a-knot ends plus evaluation).
+Usage: scipy_interp.py REPS.  Prints two lines per repetition, each with the
+wall and the processor seconds: "eval WALL CPU" (evaluation of the queries on
+a spline built beforehand) and "full WALL CPU" (construction with not-a-knot
+ends plus evaluation).
 """
 import sys
 import time
@@ -30,14 +31,14 @@ def main():
     spline = CubicSpline(x, y, bc_type="not-a-knot")
     spline(q)  # warm up
     for _ in range(reps):
-        t0 = time.perf_counter()
+        w0, c0 = time.perf_counter(), time.process_time()
         r = spline(q)
-        t1 = time.perf_counter()
-        print("eval %.9f" % (t1 - t0))
-        t0 = time.perf_counter()
+        w1, c1 = time.perf_counter(), time.process_time()
+        print("eval %.9f %.9f" % (w1 - w0, c1 - c0))
+        w0, c0 = time.perf_counter(), time.process_time()
         r = CubicSpline(x, y, bc_type="not-a-knot")(q)
-        t1 = time.perf_counter()
-        print("full %.9f" % (t1 - t0))
+        w1, c1 = time.perf_counter(), time.process_time()
+        print("full %.9f %.9f" % (w1 - w0, c1 - c0))
     del r
     sys.stdout.flush()
 
