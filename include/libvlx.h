@@ -495,6 +495,47 @@ VLX_API int32_t vlxu_zinter(vlx_t* src, vlx_t* dst, double scale);
 VLX_API int32_t vlxfu_zinter(vlxf_t* src, vlxf_t* dst, float scale);
 
 /* ======================================================================== */
+/* Element-wise: phase and time operations                                  */
+/* ======================================================================== */
+/* pi is 3.141592653589793 (float: 3.1415927). */
+
+/* Real only: unwraps a phase in radians, taking out whole turns so that each
+ * sample lies within pi of the previous output (the first within pi of 0). */
+VLX_API int32_t vlxi_unwrap(vlx_t* v);
+VLX_API int32_t vlxfi_unwrap(vlxf_t* v);
+/* Real only: as vlxi_unwrap against the mean of the last window outputs
+ * (fewer at the start); window 1 is vlxi_unwrap, 0 reduces against 0.  -1 if window < 0. */
+VLX_API int32_t vlxi_unwrap_wnd(vlx_t* v, int32_t window);
+VLX_API int32_t vlxfi_unwrap_wnd(vlxf_t* v, int32_t window);
+/* First difference per unit of x: (x[i] - x[i-1]) / delta with x[-1] = 0;
+ * delta 0 multiplies by 1e100 instead (float: 999999986991104).  Complex: part by part. */
+VLX_API int32_t vlxi_differ(vlx_t* v);
+VLX_API int32_t vlxfi_differ(vlxf_t* v);
+/* Running sum times delta: y[i] = y[i-1] + x[i] * delta.  Complex: part by part. */
+VLX_API int32_t vlxi_integ(vlx_t* v);
+VLX_API int32_t vlxfi_integ(vlxf_t* v);
+/* Real only: replaces the samples by the x positions (in units of delta,
+ * linearly interpolated) where they cross level; mode 1 rising, 2 falling, 3 both.  delta becomes 1. */
+VLX_API int32_t vlxi_edge(vlx_t* v, int32_t mode, double level);
+VLX_API int32_t vlxfi_edge(vlxf_t* v, int32_t mode, float level);
+/* Clips every scalar to the range between a and b (either order); *clipped
+ * (if not NULL) is 1 if any changed, else 0.  The second argument is unused; NaN stays. */
+VLX_API int32_t vlxi_limit(vlx_t* v, int32_t unused, double a, double b, int32_t* clipped);
+VLX_API int32_t vlxfi_limit(vlxf_t* v, int32_t unused, float a, float b, int32_t* clipped);
+/* Derivative of the polynomial whose coefficients (lowest power first) are
+ * the samples; one point fewer. */
+VLX_API int32_t vlxi_pdiffer(vlx_t* v);
+VLX_API int32_t vlxfi_pdiffer(vlxf_t* v);
+/* Phase in radians: complex points give atan2(im, re) (0 at the origin) as a
+ * real vector; real samples give pi below 0, else 0. */
+VLX_API int32_t vlxi_phase(vlx_t* v);
+VLX_API int32_t vlxfi_phase(vlxf_t* v);
+/* Polar form: each point becomes the complex pair (magnitude, phase in
+ * radians), a real vector turning complex. */
+VLX_API int32_t vlxi_rtop(vlx_t* v);
+VLX_API int32_t vlxfi_rtop(vlxf_t* v);
+
+/* ======================================================================== */
 /* Generators and resampling tables                                         */
 /* ======================================================================== */
 /* The generators fill a vector whose points, delta and complex flag the caller
@@ -744,6 +785,47 @@ VLX_API int32_t vlxi_pztoc(vlx_t* v);
 VLX_API int32_t vlxfi_pztoc(vlxf_t* v);
 
 /* ======================================================================== */
+/* Statistics: regression and interpolation                                 */
+/* ======================================================================== */
+
+/* Straight-line fit of src: a real vector as y against x = index * delta (delta 0 taken as 1;
+ * x restarts at 0 every 2048 points), a complex one as im against re.  dst: slope, intercept. */
+VLX_API int32_t vlxs_lin_regres(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_lin_regres(const vlxf_t* src, vlxf_t* dst);
+/* The same fit as a record of 20 real points (delta 1): y on x (slope, intercept, residual
+ * variance, slope and intercept variances, their covariance and correlation), the same 7 for x on y,
+ * means of x and y, sample variances of x and y, sample covariance, correlation.  Slopes of a
+ * vanishing variance are 1e100 (float: 999999986991104).  dst may be src. */
+VLX_API int32_t vlxs_lin_regres2(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_lin_regres2(const vlxf_t* src, vlxf_t* dst);
+
+/* Methods of vlx_interp (the low three bits; 2, 4, 6 and 7 give every query one value) and its flag. */
+#define VLX_INTERP_STEP       0  /* the tabulated value on the left */
+#define VLX_INTERP_LINEAR     1  /* straight line between neighbours */
+#define VLX_INTERP_QUADRATIC  3  /* parabola through the three nearest points (linear below 3 points) */
+#define VLX_INTERP_SPLINE     5  /* cubic spline from second derivatives */
+#define VLX_INTERP_HOLD_ENDS 16  /* no extrapolation: outside the table take the end value */
+/* End conditions of vlxb_cspline_2d. */
+#define VLX_SPLINE_NOT_A_KNOT         0 /* the node next to the end is no knot */
+#define VLX_SPLINE_FIRST_DERIVATIVE   1 /* the end's first derivative is given */
+#define VLX_SPLINE_SECOND_DERIVATIVE  2 /* the end's second derivative is given */
+#define VLX_SPLINE_NATURAL            3 /* the end's second derivative is 0 */
+
+/* Interpolates the real table y(x) at the queries xi (meant to ascend) into yi, which gets xi's
+ * points and delta; yi may be xi but no other operand.  y2: spline second derivatives, or NULL for
+ * not-a-knot ones made here.  -1 on complex operands, unequal lengths or equal abscissas met. */
+VLX_API int32_t vlx_interp(const vlx_t* x, vlx_t* y, const vlx_t* y2, const vlx_t* xi, vlx_t* yi, int32_t flags);
+VLX_API int32_t vlxf_interp(const vlxf_t* x, vlxf_t* y, const vlxf_t* y2, const vlxf_t* xi, vlxf_t* yi, int32_t flags);
+/* vlx_interp with VLX_INTERP_SPLINE. */
+VLX_API int32_t vlx_cspline(const vlx_t* x, vlx_t* y, const vlx_t* y2, const vlx_t* xi, vlx_t* yi);
+VLX_API int32_t vlxf_cspline(const vlxf_t* x, vlxf_t* y, const vlxf_t* y2, const vlxf_t* xi, vlxf_t* yi);
+/* Cubic spline second derivatives of y(x) into y2 (x rising strictly, 4 points or more), with
+ * VLX_SPLINE_ end conditions end0, endn and their derivatives d0, dn.  y is changed during the
+ * call and put back (not on a bad endn), so no other thread may use it meanwhile. */
+VLX_API int32_t vlxb_cspline_2d(const vlx_t* x, vlx_t* y, vlx_t* y2, double d0, double dn, int32_t end0, int32_t endn);
+VLX_API int32_t vlxfb_cspline_2d(const vlxf_t* x, vlxf_t* y, vlxf_t* y2, float d0, float dn, int32_t end0, int32_t endn);
+
+/* ======================================================================== */
 /* Internal helpers, exported for the library's own layers and for tests.   */
 /* Applications do not normally need them.                                  */
 /* ======================================================================== */
@@ -832,6 +914,13 @@ VLX_API int32_t vlxfs_root_iterate(const vlxf_t* poly, vlxf_t* dst, vlxf_root_st
  * relaxed if relaxed is set; 0 at the first success, -1 if all fail. */
 VLX_API int32_t vlxs_root_restarts(const vlx_t* poly, vlx_t* dst, vlx_root_step_t step, double re, double im, int32_t relaxed);
 VLX_API int32_t vlxfs_root_restarts(const vlxf_t* poly, vlxf_t* dst, vlxf_root_step_t step, float re, float im, int32_t relaxed);
+
+/* --- regression and interpolation --- */
+
+/* Solves the tridiagonal system of m rows (lower[i] x[i-1] + diag[i] x[i] + upper[i] x[i+1] =
+ * rhs[i]) into out, eliminating from the bottom row up without pivoting; overwrites lower and rhs.  -1 if m < 1. */
+VLX_API int32_t vlxb_tridiagonal_solve(double* lower, double* diag, double* upper, double* rhs, double* out, int32_t m);
+VLX_API int32_t vlxfb_tridiagonal_solve(float* lower, float* diag, float* upper, float* rhs, float* out, int32_t m);
 
 #ifdef __cplusplus
 }
