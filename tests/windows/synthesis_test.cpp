@@ -192,6 +192,12 @@ TYPED_TEST(Synthesis, UserCoefficients) {
     Vec<TypeParam> hann(std::vector<T>(8, T(2)), false);
     ASSERT_EQ(t_window(hann.get(), 2, VLX_WNORM_PEAK), 0);
     EXPECT_TRUE(same_scalars(v.values(), hann.values()));
+    // the cached path multiplies and rotates an even complex vector in one pass
+    const std::vector<T> x = random_values<T>(2 * 10, 9u);
+    Vec<TypeParam> cv(x, true), ch(x, true);
+    ASSERT_EQ(t_window_cos(cv.get(), coefs.get()), 0);
+    ASSERT_EQ(t_window(ch.get(), 2, VLX_WNORM_PEAK), 0);
+    EXPECT_TRUE(same_scalars(cv.values(), ch.values()));
     Vec<TypeParam> empty, cplx({1, 0}, true);
     EXPECT_EQ(t_window_cos(empty.get(), cplx.get()), -1);
     EXPECT_EQ(t_cos_sum(v.get(), coefs.get(), VLX_WFLAG_SYMMETRIC, T(0)), -1);
