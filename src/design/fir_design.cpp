@@ -233,11 +233,11 @@ int32_t fill(V* v, int32_t type, real_t<V> arg1, real_t<V> arg2) {
     switch (type) {
     case 0: return band_pass(v, arg1, arg2);
     case 1:
-        if (n % 2 == 0) return -1;
+        if (n % 2 == 0 || n < 1) return -1;
         band_pass(v, arg1, arg2);
         return complement(v);
     case 2:
-        if (n % 2 == 0) return -1;
+        if (n % 2 == 0 || n < 1) return -1;
         low_pass(v, T(2) * arg1);
         return complement(v);
     case 3: return low_pass(v, T(2) * arg1);
