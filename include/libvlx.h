@@ -306,7 +306,7 @@ VLX_API int32_t vlxfi_hilbert(vlxf_t* v);
 /* --- catalogue --- */
 
 /* Window id of a name (short or VLX_WINDOW_ style), case-insensitive, whole
- * string only.  0 when found; -1 otherwise, with *id set to 0 if id is not NULL. */
+ * string only.  0 when found; -1 with *id = 0 if none matches; -1 for NULL. */
 VLX_API int32_t vlx_window_from_str(const char* name, int32_t* id);
 VLX_API int32_t vlxf_window_from_str(const char* name, int32_t* id);
 /* Canonical name of id into dst of len bytes (at least 1), cut to len - 1
