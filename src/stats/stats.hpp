@@ -70,6 +70,21 @@ int32_t root_iterate(const V* p, V* dst, complex_step_fn<V> step, real_t<V> re, 
 template <VlxVector V>
 int32_t root_restarts(const V* p, V* dst, complex_step_fn<V> step, real_t<V> re, real_t<V> im, int32_t relaxed);
 
+// ---- regression and interpolation ----
+
+// Straight-line fit: slope and intercept (vlxs_lin_regres), or the record of
+// twenty numbers (vlxs_lin_regres2).
+template <VlxVector V> int32_t lin_regres(const V* src, V* dst);
+template <VlxVector V> int32_t lin_regres2(const V* src, V* dst);
+// Table y(x) at the queries xi into yi by the method and flags of vlx_interp;
+// y2 holds spline second derivatives or is null.
+template <VlxVector V> int32_t interp(const V* x, V* y, const V* y2, const V* xi, V* yi, int32_t flags);
+// Spline second derivatives with the end conditions end0, endn (vlxb_cspline_2d).
+template <VlxVector V> int32_t cspline_2d(const V* x, V* y, V* y2, real_t<V> d0, real_t<V> dn, int32_t end0, int32_t endn);
+// Tridiagonal system of m rows, eliminated from the bottom up (vlxb_tridiagonal_solve).
+template <VlxVector V>
+int32_t tridiagonal_solve(real_t<V>* lower, real_t<V>* diag, real_t<V>* upper, real_t<V>* rhs, real_t<V>* out, int32_t m);
+
 namespace stats {
 
 // Every sum over samples runs in blocks of this many samples (points).
