@@ -172,17 +172,23 @@ int32_t deci_kernel(V* in, V* out, V* filter, int32_t odd, int32_t anti, int32_t
     const HalfFilter<T> f = half_filter(filter->data, filter->points, odd, anti);
     const int64_t N = f.N;
     int64_t skip = 0;
-    if (hist != nullptr && hist->points >= N) skip = read_skip<V>(hist->data[(N - 1) * (hist->complex ? 2 : 1)]);
+    if (hist != nullptr && hist->points >= N && hist->data != nullptr)
+        skip = read_skip<V>(hist->data[(N - 1) * (hist->complex ? 2 : 1)]);
     const int64_t n = in->points < 0 ? 0 : in->points;
     const DeciPlan plan = deci_plan(skip, n, factor);
+    V* const caller_out = out;
+    const int32_t old_points = out->points;
     if (out != in) out->points = static_cast<int32_t>(plan.count);
 
     int32_t aliased = 0;
     V tmp{};
     V* saved = nullptr;
     if (stage_io<V>(in, &out, filter, &hist, static_cast<int32_t>(N), VLX_STAGE_ALIAS | VLX_STAGE_KEEP_POINTS,
-                    &aliased, &tmp, &saved) != 0)
+                    &aliased, &tmp, &saved) != 0) {
+        // A failed history leaves out as it was; a failed allocation has left it empty.
+        caller_out->points = caller_out->data != nullptr ? old_points : 0;
         return -1;
+    }
     out->delta = static_cast<T>(factor) * in->delta;
     const int64_t w = in->complex ? 2 : 1;
     // written before the kernel, which reads only points 0 .. N-2

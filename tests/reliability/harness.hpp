@@ -47,7 +47,15 @@ void watch(const std::string& what, unsigned seconds);
 void unwatch();
 
 // ---- argument context ------------------------------------------------------------
-enum class Role { in, io, grow, out, hist, fixed };  // fixed: never spoiled nor aliased
+// coef: a read-only operand (taps, tables) that no destination may share;
+// fixed: never spoiled nor aliased.
+enum class Role { in, io, grow, out, hist, fixed, coef };
+// Whether arguments of these roles may be one vector.
+inline bool may_alias(Role a, Role b) {
+    auto writes = [](Role r) { return r == Role::io || r == Role::grow || r == Role::out; };
+    if (a == Role::hist || b == Role::hist || a == Role::fixed || b == Role::fixed) return false;
+    return !((a == Role::coef && writes(b)) || (b == Role::coef && writes(a)));
+}
 // How the selected vector argument is spoiled.
 enum class VKind {
     normal,
@@ -117,9 +125,10 @@ struct Ctx {
     }
     V* hist() { return make(Role::hist, 0, false); }
     V* fixed(int32_t points, bool cplx = false) { return make(Role::fixed, points, cplx); }
+    V* coef(int32_t points, bool cplx = false) { return make(Role::coef, points, cplx); }
     // A vector with given samples, an ordinary source.
-    V* vals(std::initializer_list<double> x, bool cplx = false) {
-        V* v = make(Role::in, int32_t(x.size() / (cplx ? 2 : 1)), cplx);
+    V* vals(std::initializer_list<double> x, bool cplx = false, Role role = Role::in) {
+        V* v = make(role, int32_t(x.size() / (cplx ? 2 : 1)), cplx);
         if (v->alloc > 0 && v->points == int32_t(x.size() / (cplx ? 2 : 1)) && mode.kind != VKind::nonfinite) {
             int i = 0;
             for (double d : x) v->data[i++] = T(d);
@@ -161,10 +170,10 @@ private:
         Pause p;
         const int i = nvec++;
         roles.push_back(role);
-        if (role != Role::hist && role != Role::fixed) {
-            if (mode.all_same && i > 0 && roles[0] != Role::hist) return args[i] = args[0];
-            if (i == mode.alias_at) return args[i] = args[mode.alias_of];
-        }
+        if (i == mode.alias_at) return args[i] = args[mode.alias_of];
+        if (mode.all_same && role != Role::coef && role != Role::hist && role != Role::fixed)
+            for (int j = 0; j < i; ++j)
+                if (may_alias(roles[size_t(j)], role) && roles[size_t(j)] != Role::coef) return args[i] = args[j];
         V* v = &pool[used++];
         vlxtest::t_init(v);
         v->delta = T(0.5);

@@ -37,6 +37,36 @@ int staged(Ctx<V>& c, S stage, U unstage, int32_t flags) {
     return unstage(out, aliased, saved);
 }
 
+// Abscissas 0, 0.5, 1, ... : a table that rises strictly.
+template <class V>
+V* ramp(Ctx<V>& c, int32_t n) {
+    V* v = c.coef(n);
+    if (c.mode.kind == VKind::normal || v->points != n || v->alloc < n) return v;
+    for (int32_t i = 0; i < n; ++i) v->data[i] = vlxtest::real_of<V>(0.5 * i);
+    return v;
+}
+
+// A resampling table of design 0 with 8 phases.
+template <class V>
+V* rsmp_table(Ctx<V>& c) {
+    V* v = c.coef(66);
+    Pause p;
+    if (v->alloc >= 66 && v->points == 66) REL_TW(c, rsmp)(v, 0);
+    return v;
+}
+
+// An output vector asking for up to n points.
+template <class V>
+V* wanting(Ctx<V>& c, int32_t n) {
+    V* v = c.out();
+    if (v->points == 0 && v->data == nullptr) {
+        Pause p;
+        v->points = n;
+        vlxtest::t_alloc(v);
+    }
+    return v;
+}
+
 #define POLY c.vals({-6, 11, -6, 1})
 #define BINARY(name) REL_ROW(b, name, return fn(c.in(32, true), c.in(32), c.out());)
 #define INPLACE(name, cplx) REL_ROW(i, name, return fn(c.io(32, cplx));)
@@ -120,8 +150,8 @@ const std::vector<Row> table = {
     REL_ROW(c, rand, return fn(c.bare(32, true), c.n(0));),
     REL_ROW(i, shuffle, return fn(c.io(32, true));),
     REL_ROW(c, rsmp, return fn(c.bare(66), c.n(0));),
-    REL_ROW(c, rsmp_cos, return fn(c.bare(66), c.vals({8, 0.5, 0.5}));),
-    REL_ROW(c, rsmp_pcos, return fn(c.bare(66), c.vals({8, 0.5, 0.25, 0.25}));),
+    REL_ROW(c, rsmp_cos, return fn(c.bare(66), c.vals({8, 0.5, 0.5}, false, Role::coef));),
+    REL_ROW(c, rsmp_pcos, return fn(c.bare(66), c.vals({8, 0.5, 0.25, 0.25}, false, Role::coef));),
     // ---- staging and decimation
     REL_ROW(d, deci, return fn(c.in(64), c.out(), c.n(3), c.hist());),
     REL_ROW(, stage_io, return staged(c, fn, REL_TW(, unstage_io), VLX_STAGE_ALIAS);),
@@ -156,6 +186,57 @@ const std::vector<Row> table = {
     REL_ROW(s, laguerre_step, T dz[2]; return fn(POLY, c.s(0.5), c.s(0.5), dz);),
     REL_ROW(s, root_iterate, return fn(c.vals({1, 0, 1}), c.fixed(1, true), REL_TW(s, laguerre_step), c.s(0.1), c.s(0.9), c.n(0));),
     REL_ROW(s, root_restarts, return fn(c.vals({1, 0, 1}), c.fixed(1, true), REL_TW(s, newton_step), c.s(0.1), c.s(0.9), c.n(1));),
+    // ---- FIR design and windows
+    REL_ROW(c, fir, return fn(c.bare(31), c.n(4), c.s(0.2), c.s(0));),
+    REL_ROW(c, fir, return fn(c.bare(30), c.n(8), c.s(0.3), c.s(0));),
+    REL_ROW(c, fir2, return fn(c.out(), c.n(100));),
+    REL_ROW(, window_from_str, int32_t id = 0; return fn(c.n(1) ? "hann" : "VLX_WINDOW_KAISER", &id);),
+    REL_ROW(, window_to_str, char b[16]; return fn(c.n(VLX_WINDOW_HANN), b, 16);),
+    REL_ROW(i, window2, return fn(c.io(64, true), c.n(VLX_WINDOW_HANN), c.n(VLX_WFLAG_WIDTH), c.s(40));),
+    REL_ROW(i, window, return fn(c.io(64), c.n(VLX_WINDOW_HANN + 3), c.n(0));),
+    REL_ROW(i, window_cos, return fn(c.io(64), c.vals({0.5, 0.5}, false, Role::coef));),
+    REL_ROWF(kSettledLeak, i, window_kaiser, return fn(c.io(64, true), c.s(8), c.n(0));),
+    REL_ROWF(kSettledLeak, i, window_gauss, return fn(c.io(64), c.s(0.2), c.n(VLX_WFLAG_SYMMETRIC));),
+    REL_ROWF(kSettledLeak, i, window_sinc, return fn(c.io(64), c.s(3), c.s(2), c.n(0));),
+    REL_ROWF(kSettledLeak, i, window_tukey, return fn(c.io(64), c.s(0.5), c.n(0));),
+    REL_ROW(i, window_fir, return fn(c.io(64), c.n(101), c.s(0.1));),
+    REL_ROW(, window_synth, return fn(c.io(64), c.n(VLX_WINDOW_HANN + 5), c.n(VLX_WFLAG_WIDTH), c.s(50));),
+    REL_ROW(, window_cos_sum, return fn(c.io(64), c.vals({0.5, 0.5}, false, Role::coef), c.n(0), c.s(0));),
+    REL_ROW(, window2_scale, T o; return fn(&o, c.n(VLX_WINDOW_HANN), c.n(VLX_WFLAG_WIDTH | 1), c.n(64), c.s(40));),
+    REL_ROW(, window_scale, T o; return fn(&o, c.n(VLX_WINDOW_HANN), c.n(2), c.n(64));),
+    REL_ROW(, window2_enbw, T o; return fn(&o, c.n(VLX_WINDOW_HANN), c.n(64), c.s(40));),
+    REL_ROW(, window_enbw, T o; return fn(&o, c.n(VLX_WINDOW_HANN + 7), c.n(64));),
+    REL_ROW(, window_metric, T o; return fn(&o, c.n(1), c.n(VLX_WINDOW_HANN), c.n(64), c.s(40));),
+    REL_ROW(, sinc_pow, return fn(c.s(1.3), c.s(2)) >= 0 ? 0 : -1;),
+    // ---- phase and time
+    INPLACE(unwrap, false), INPLACE(differ, true), INPLACE(integ, true), INPLACE(pdiffer, false),
+    INPLACE(phase, true),
+    REL_ROW(i, unwrap_wnd, return fn(c.io(64), c.n(4));),
+    REL_ROW(i, edge, return fn(c.io(64), c.n(3), c.s(0));),
+    REL_ROW(i, limit, int32_t clipped = 0; return fn(c.io(64, true), 0, c.s(-0.5), c.s(0.5), &clipped);),
+    REL_ROW(i, rtop, return fn(c.grow(64));),
+    // ---- filters and rate changers
+    REL_ROW(d, fir, return fn(c.in(64), c.out(), c.coef(8, true), c.hist());),
+    REL_ROW(d, fir, return fn(c.in(256), c.out(), c.coef(60), c.hist());),
+    REL_ROW(d, fir, return fn(c.in(256, true), c.out(), c.coef(40), c.hist());),
+    REL_ROW(d, sfir, return fn(c.in(64), c.out(), c.coef(6), c.n(1), c.n(0), c.hist());),
+    REL_ROW(d, sfir, return fn(c.in(256, true), c.out(), c.coef(40), c.n(0), c.n(1), c.hist());),
+    REL_ROW(d, sfir_deci, return fn(c.in(256), c.out(), c.coef(6), c.n(1), c.n(0), c.n(3), c.hist());),
+    REL_ROW(d, hwfilt, return fn(c.in(64, true), c.out(), c.n(0), c.hist());),
+    REL_ROW(i, hwfilt, return fn(c.io(64), c.n(0));),
+    REL_ROW(d, rsmp, return fn(c.in(64), wanting(c, 40), c.n(1), rsmp_table(c), c.s(1.5), c.hist());),
+    REL_ROW(d, rsmp, return fn(c.in(64, true), wanting(c, 100), c.n(1), rsmp_table(c), c.s(0.75), c.hist());),
+    REL_ROWF(kSettledLeak, d, rsmp2, return fn(c.in(64), wanting(c, 40), c.n(1), c.n(2), c.s(1.5), c.hist());),
+    // ---- regression and interpolation
+    REL_ROW(s, lin_regres, return fn(c.in(64), c.out());),
+    REL_ROW(s, lin_regres2, return fn(c.in(64, true), c.out());),
+    REL_ROW(, interp, return fn(ramp(c, 16), c.coef(16), nullptr, c.in(10), c.out(), c.n(VLX_INTERP_SPLINE));),
+    REL_ROW(, interp, return fn(ramp(c, 16), c.coef(16), nullptr, c.in(10), c.out(), c.n(VLX_INTERP_QUADRATIC | VLX_INTERP_HOLD_ENDS));),
+    REL_ROW(, cspline, return fn(ramp(c, 16), c.coef(16), c.coef(16), c.in(10), c.out());),
+    REL_ROW(b, cspline_2d, return fn(ramp(c, 16), c.coef(16), c.out(), c.s(0.5), c.s(-0.5), c.n(1), c.n(2));),
+    REL_ROWF(kNoHostile, b, tridiagonal_solve, T l[8], d[8], u[8], r[8], x[8];
+             for (int i = 0; i < 8; ++i) l[i] = T(0.5), d[i] = T(3), u[i] = T(-0.5), r[i] = T(i);
+             return fn(l, d, u, r, x, 8);),
 };
 
 }  // namespace

@@ -19,7 +19,7 @@ const char* kind_name(VKind k) {
 }
 
 const char* role_name(Role r) {
-    static const char* const names[] = {"in", "io", "grow", "out", "hist", "fixed"};
+    static const char* const names[] = {"in", "io", "grow", "out", "hist", "fixed", "coef"};
     return names[int(r)];
 }
 
@@ -226,15 +226,12 @@ TYPED_TEST(Reliability, HostileArguments) {
                 for (double x : scalars) modes.push_back(Mode{}), modes.back().scalar = i, modes.back().scalar_value = x;
             for (int i = 0; i < c.nint; ++i)
                 for (int64_t x : integers) modes.push_back(Mode{}), modes.back().integer = i, modes.back().int_value = x;
-            int aliasable = 0;
-            for (int j = 0; j < c.nvec; ++j) {
-                if (c.roles[size_t(j)] == Role::hist || c.roles[size_t(j)] == Role::fixed) continue;
-                ++aliasable;
+            int pairs = 0;
+            for (int j = 0; j < c.nvec; ++j)
                 for (int i = 0; i < j; ++i)
-                    if (c.roles[size_t(i)] != Role::hist && c.roles[size_t(i)] != Role::fixed)
-                        modes.push_back(Mode{}), modes.back().alias_of = i, modes.back().alias_at = j;
-            }
-            if (aliasable > 2) modes.push_back(Mode{}), modes.back().all_same = true;
+                    if (may_alias(c.roles[size_t(i)], c.roles[size_t(j)]))
+                        modes.push_back(Mode{}), modes.back().alias_of = i, modes.back().alias_at = j, ++pairs;
+            if (pairs > 1) modes.push_back(Mode{}), modes.back().all_same = true;
             check_released(c, label<V>(r, "normal"), r.flags & kSettledLeak);
         }
         for (const Mode& m : modes) {
