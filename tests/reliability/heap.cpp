@@ -11,7 +11,10 @@
 #include <unistd.h>
 
 extern "C" {
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#if defined(__SANITIZE_THREAD__)
+// The thread sanitizer runs only the soak: the standard heap is left alone.
+#define REL_REAL(f) f
+#elif defined(__SANITIZE_ADDRESS__)
 void* __interceptor_malloc(size_t);
 void* __interceptor_calloc(size_t, size_t);
 void* __interceptor_realloc(void*, size_t);
@@ -94,8 +97,12 @@ int32_t hook_realloc(V* v, int32_t, int32_t) {
         v->data = nullptr;
         return 0;
     }
+    // A failed enlargement keeps the old block, which the library drops: it
+    // stays tracked so that release_hook_blocks() frees it.
+    const auto old_bits = reinterpret_cast<uintptr_t>(old);
+    track(nullptr, old);
     void* p = REL_REAL(realloc)(old, b);
-    if (p != nullptr) track(p, old);
+    track(p != nullptr ? p : reinterpret_cast<void*>(old_bits), nullptr);
     v->data = static_cast<decltype(v->data)>(p);
     return 0;
 }
@@ -152,6 +159,7 @@ void unwatch() { alarm(0); }
 
 // The interposed standard heap.  free needs no wrapper: every block comes from
 // the real allocator.
+#if !defined(__SANITIZE_THREAD__)
 extern "C" {
 void* malloc(size_t n) { return rel::should_fail(n) ? nullptr : REL_REAL(malloc)(n); }
 void* calloc(size_t n, size_t m) {
@@ -159,3 +167,4 @@ void* calloc(size_t n, size_t m) {
 }
 void* realloc(void* p, size_t n) { return n != 0 && rel::should_fail(n) ? nullptr : REL_REAL(realloc)(p, n); }
 }
+#endif
