@@ -91,7 +91,9 @@ int32_t destroy(V* v) {
 template <VlxVector V>
 int32_t alloc(V* v) {
     const int64_t required = scalar_count(v);
-    if (required <= v->alloc) return 0;
+    // Nothing needed is nothing to allocate, also when alloc is negative: a
+    // block of no scalars would be one the vector does not own, and leak.
+    if (required <= v->alloc || required <= 0) return 0;
     if (!representable(required)) {
         if (Hooks<V>::alloc == nullptr && v->alloc > 0) std::free(v->data);
         return fail_empty(v);
@@ -110,7 +112,7 @@ int32_t alloc(V* v) {
 template <VlxVector V>
 int32_t realloc(V* v, int32_t old_points, int32_t old_complex) {
     const int64_t required = scalar_count(v);
-    if (required <= v->alloc) return 0;
+    if (required <= v->alloc || required <= 0) return 0;
     // Lent storage is never resized or freed: its samples are copied into a
     // block of the vector's own once that exists.
     real_t<V>* lent = nullptr;

@@ -32,13 +32,14 @@ bool kind_fits(VKind k, Role r) {
 }
 
 std::string Mode::describe() const {
-    char b[160] = "normal";
-    if (vec >= 0) std::snprintf(b, sizeof b, "vector %d (%s) %s", vec, role, kind_name(kind));
-    if (scalar >= 0) std::snprintf(b, sizeof b, "scalar %d = %g", scalar, scalar_value);
-    if (integer >= 0) std::snprintf(b, sizeof b, "integer %d = %lld", integer, static_cast<long long>(int_value));
-    if (alias_at >= 0) std::snprintf(b, sizeof b, "vector %d is vector %d", alias_at, alias_of);
-    if (all_same) std::snprintf(b, sizeof b, "all vectors the same");
-    return b;
+    char b[96];
+    std::string d;
+    if (vec >= 0) std::snprintf(b, sizeof b, "vector %d (%s) %s; ", vec, role, kind_name(kind)), d += b;
+    if (scalar >= 0) std::snprintf(b, sizeof b, "scalar %d = %g; ", scalar, scalar_value), d += b;
+    if (integer >= 0) std::snprintf(b, sizeof b, "integer %d = %lld; ", integer, static_cast<long long>(int_value)), d += b;
+    if (alias_at >= 0) std::snprintf(b, sizeof b, "vector %d is vector %d; ", alias_at, alias_of), d += b;
+    if (all_same) d += "all vectors the same; ";
+    return d.empty() ? "normal" : d;
 }
 
 namespace {
@@ -232,17 +233,30 @@ TYPED_TEST(Reliability, HostileArguments) {
                     if (may_alias(c.roles[size_t(i)], c.roles[size_t(j)]))
                         modes.push_back(Mode{}), modes.back().alias_of = i, modes.back().alias_at = j, ++pairs;
             if (pairs > 1) modes.push_back(Mode{}), modes.back().all_same = true;
+            // A vector and a number spoiled at once.
+            const size_t single = modes.size();
+            for (size_t i = 0; i < single; ++i)
+                for (size_t j = 0; j < single; ++j)
+                    if (modes[i].vec >= 0 && (modes[j].scalar >= 0 || modes[j].integer >= 0)) {
+                        Mode m = modes[j];
+                        m.vec = modes[i].vec, m.kind = modes[i].kind, m.role = modes[i].role;
+                        modes.push_back(m);
+                    }
             check_released(c, label<V>(r, "normal"), r.flags & kSettledLeak);
         }
         for (const Mode& m : modes) {
-            const std::string what = label<V>(r, m.describe());
-            Ctx<V> c(m);
-            const int rc = run(r, c, 0, what);
-            check_vectors(c, what);
-            // A failed call may drop a block it could not grow, as a failed
-            // resize does; a successful one leaves nothing behind.
-            check_released(c, what, rc < 0 || (r.flags & kSettledLeak));
-            ++cases;
+            // The long run fails every allocation of every case in turn too.
+            long n = 0;
+            for (long k = 0; k <= n; ++k) {
+                const std::string what = label<V>(r, m.describe() + (k ? " allocation " + std::to_string(k) : ""));
+                Ctx<V> c(m);
+                const int rc = run(r, c, k, what, k == 0 && long_run() ? &n : nullptr);
+                check_vectors(c, what);
+                // A failed call may drop a block it could not grow, as a failed
+                // resize does; a successful one leaves nothing behind.
+                check_released(c, what, rc < 0 || (r.flags & kSettledLeak));
+                ++cases;
+            }
         }
         check_heap_leaks(label<V>(r, "hostile arguments"));
     }
