@@ -69,10 +69,11 @@ enum class VKind {
     huge,         // points 2^31-1, nothing owned (grow, out, hist only)
     huge_pairs,   // points 2^30, nothing owned: 2^31 scalars once complex (grow, out, hist only)
     lent_tiny,    // one-scalar lent block, points 1 (out, hist only)
+    big,          // 46341 points, whose square overflows 32 bits (not on quadratic rows)
 };
 constexpr VKind kVecKinds[] = {VKind::neg_points, VKind::no_points, VKind::one_point, VKind::odd_complex,
                                VKind::nonfinite,  VKind::lent,      VKind::neg_alloc, VKind::huge,
-                               VKind::huge_pairs, VKind::lent_tiny};
+                               VKind::huge_pairs, VKind::lent_tiny, VKind::big};
 const char* kind_name(VKind k);
 bool kind_fits(VKind k, Role r);
 
@@ -184,6 +185,7 @@ private:
         switch (k) {
             case VKind::no_points: points = 0; break;
             case VKind::one_point: points = 1; break;
+            case VKind::big: points = 46341; break;
             case VKind::odd_complex: v->complex = 2; break;
             case VKind::huge: v->points = INT32_MAX; return args[i] = v;
             case VKind::huge_pairs: v->points = int32_t(1) << 30; return args[i] = v;
@@ -222,6 +224,7 @@ enum : unsigned {
     kSettledLeak = 1,  // a failed run may leave hook blocks behind, as the library settles
     kMayRecover = 2,   // a failed allocation need not fail the call (a fallback exists)
     kNoHostile = 4,    // not in the hostile sweep (the row's arguments are pointers it cannot spoil)
+    kQuadratic = 8,    // work grows with the square of a length or worse: no 46341-point vectors
 };
 const std::vector<Row>& rows();
 

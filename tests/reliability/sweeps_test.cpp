@@ -13,8 +13,8 @@
 namespace rel {
 
 const char* kind_name(VKind k) {
-    static const char* const names[] = {"normal",    "neg_points", "no_points", "one_point",  "odd_complex", "nonfinite",
-                                        "lent",      "neg_alloc",  "huge",      "huge_pairs", "lent_tiny"};
+    static const char* const names[] = {"normal", "neg_points", "no_points",  "one_point", "odd_complex", "nonfinite",
+                                        "lent",   "neg_alloc",  "huge",       "huge_pairs", "lent_tiny", "big"};
     return names[int(k)];
 }
 
@@ -221,7 +221,8 @@ TYPED_TEST(Reliability, HostileArguments) {
             run(r, c, 0, label<V>(r, "normal"));
             for (int i = 0; i < c.nvec; ++i)
                 for (VKind k : kVecKinds)
-                    if (kind_fits(k, c.roles[size_t(i)])) modes.push_back(Mode{}), modes.back().vec = i, modes.back().kind = k,
+                    if (kind_fits(k, c.roles[size_t(i)]) && !(k == VKind::big && (r.flags & kQuadratic)))
+                        modes.push_back(Mode{}), modes.back().vec = i, modes.back().kind = k,
                         modes.back().role = role_name(c.roles[size_t(i)]);
             for (int i = 0; i < c.nscalar; ++i)
                 for (double x : scalars) modes.push_back(Mode{}), modes.back().scalar = i, modes.back().scalar_value = x;
