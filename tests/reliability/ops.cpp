@@ -223,6 +223,13 @@ const std::vector<Row> table = {
     REL_ROW(d, sfir, return fn(c.in(256, true), c.out(), c.coef(40), c.n(0), c.n(1), c.hist());),
     REL_ROW(d, sfir_deci, return fn(c.in(256), c.out(), c.coef(6), c.n(1), c.n(0), c.n(3), c.hist());),
     REL_ROW(d, hwfilt, return fn(c.in(64, true), c.out(), c.n(0), c.hist());),
+    // without a history (the first block of a stream, nothing kept)
+    REL_ROW(d, deci, return fn(c.in(64, true), c.out(), c.n(2), nullptr);),
+    REL_ROW(d, fir, return fn(c.in(256), c.out(), c.coef(60), nullptr);),
+    REL_ROW(d, sfir, return fn(c.in(64, true), c.out(), c.coef(6), c.n(0), c.n(1), nullptr);),
+    REL_ROW(d, sfir_deci, return fn(c.in(256, true), c.out(), c.coef(40), c.n(1), c.n(0), c.n(4), nullptr);),
+    REL_ROW(d, hwfilt, return fn(c.in(64), c.out(), c.n(0), nullptr);),
+    REL_ROW(d, rsmp, return fn(c.in(64), wanting(c, 30), c.n(0), rsmp_table(c), c.s(2.5), nullptr);),
     REL_ROW(i, hwfilt, return fn(c.io(64), c.n(0));),
     REL_ROW(d, rsmp, return fn(c.in(64), wanting(c, 40), c.n(1), rsmp_table(c), c.s(1.5), c.hist());),
     REL_ROW(d, rsmp, return fn(c.in(64, true), wanting(c, 100), c.n(1), rsmp_table(c), c.s(0.75), c.hist());),
