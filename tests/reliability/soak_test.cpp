@@ -167,6 +167,7 @@ TEST(ReliabilitySoak, CachesReleasedUnderRunningOperations) {
     stop = true;
     for (auto& t : threads) t.join();
     freer.join();
+    vlx_free_internal(), vlxf_free_internal();
     EXPECT_TRUE(wrong.empty()) << wrong.size() << " results differ, first: " << wrong.front() << ", last: " << wrong.back();
     EXPECT_EQ(release_failures.load(), 0);
     EXPECT_GT(releases.load(), 0);

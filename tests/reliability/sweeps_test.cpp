@@ -109,7 +109,10 @@ void check_vectors(Ctx<V>& c, const std::string& what) {
 template <class V>
 void check_released(Ctx<V>& c, const std::string& what, bool leak_allowed) {
     c.clear();
+    // Both families: the hook blocks of either count, and a block freed here
+    // must belong to no cache.
     EXPECT_EQ(free_internal<V>(), 0) << what;
+    vlx_free_internal(), vlxf_free_internal();
     const long live = live_hook_blocks();
     if (!leak_allowed) {
         EXPECT_EQ(live, 0) << what << ": vector blocks left behind";
