@@ -12,16 +12,9 @@ TYPED_TEST_SUITE(Reader, Families);
 
 namespace {
 
-struct TextCase {
-    std::string input;
-    int32_t status, points, is_complex;
-    double delta;
-    std::vector<double> values;
-    std::string rest;  // what the next call finds
-};
-
-const double inf = INFINITY;
-const std::string pad(size_t n) { return std::string(n, ' '); }
+// Input; status, points, complex, delta and scalars read; what the next call finds.
+struct TextCase { std::string input; int32_t status, points, is_complex; double delta; std::vector<double> values;
+                  std::string rest; };
 
 const std::vector<TextCase> text_cases = {
     {"", 0, 0, 0, 1, {}, ""},
@@ -39,51 +32,34 @@ const std::vector<TextCase> text_cases = {
     {"1#x\n2 -", 1, 2, 0, 1, {1, 2}, ""},  // a sign alone at the end is no token
     {"abc", -1, 0, 0, 1, {}, "abc"},
     {"#VLX complex = 1\n1 x", -1, 1, 0, 1, {1}, "x"},
-    {"nan -inf INFINITY -0 1e-500 1e", 1, 6, 0, 1, {NAN, -inf, inf, -0.0, 0, 1}, ""},
+    {"nan -inf INFINITY -0 1e-500 1e", 1, 6, 0, 1, {NAN, -INFINITY, INFINITY, -0.0, 0, 1}, ""},
     // the last line without newline loses its last character: 1 point declared
     {"7\n#VLX points = 12", 1, 1, 0, 1, {7}, ""},
     // 255 characters fit the line buffer, the last of them is cut; the rest of
     // a longer line is dropped
-    {"#VLX delta =" + pad(238) + "0.255\n1\n#" + pad(300) + "2\n3", 1, 2, 0, 0.25, {1, 3}, ""},
+    {"#VLX delta =" + std::string(238, ' ') + "0.255\n1\n#" + std::string(300, ' ') + "2\n3", 1, 2, 0, 0.25, {1, 3}, ""},
 };
 
-// A binary file: form 1 or 2 (width fixed) or 3 (width in the type word).
+// A binary file: form 1 or 2 (width fixed) or 3 (width in the type word),
+// delta 0.125, in the machine's order or the other.
 std::string binary_file(int form, bool swap, uint32_t width, int32_t points, int32_t is_complex,
                         const std::vector<double>& scalars) {
     std::string out;
-    auto put = [&](const void* p, size_t n) {
-        std::string bytes(static_cast<const char*>(p), n);
-        if (swap) bytes.assign(bytes.rbegin(), bytes.rend());
-        out += bytes;
+    auto put = [&](auto x) {
+        const std::string b(reinterpret_cast<const char*>(&x), sizeof x);
+        out += swap ? std::string(b.rbegin(), b.rend()) : b;
     };
-    auto put_scalar = [&](double x) {
-        const float f = static_cast<float>(x);
-        width == 8 ? put(&x, 8) : put(&f, 4);
-    };
-    const uint32_t magic = 0xEB0000BEu | (uint32_t(form) << 16) | (uint32_t(form) << 12);
-    const uint32_t type = 0x400u | width;
-    put(&magic, 4);
-    if (form == 3) put(&type, 4);
-    put(&points, 4);
-    put(&is_complex, 4);
-    put_scalar(0.125);
-    for (double x : scalars) put_scalar(x);
+    auto scalar = [&](double x) { width == 8 ? put(x) : put(static_cast<float>(x)); };
+    put(0xEB0000BEu | uint32_t(form) << 16 | uint32_t(form) << 12);
+    if (form == 3) put(0x400u | width);
+    put(points), put(is_complex), scalar(0.125);
+    for (double x : scalars) scalar(x);
     return out;
-}
-
-template <class V>
-int32_t read_from(V* v, const std::string& bytes, std::string* rest = nullptr) {
-    FILE* f = stream_of(bytes);
-    const int32_t r = t_fread(v, f);
-    const std::string left = drain(f);
-    if (rest != nullptr) *rest = left;
-    return r;
 }
 
 }  // namespace
 
 TYPED_TEST(Reader, TextTokensKeysAndLines) {
-    using T = real_of<TypeParam>;
     for (const TextCase& c : text_cases) {
         SCOPED_TRACE(c.input.substr(0, 60));
         Vec<TypeParam> v;
@@ -91,35 +67,31 @@ TYPED_TEST(Reader, TextTokensKeysAndLines) {
         EXPECT_EQ(read_from(&v, c.input, &rest), c.status);
         EXPECT_TRUE(has_shape(v.get(), c.points, c.is_complex, c.delta));
         EXPECT_EQ(rest, c.rest);
-        std::vector<T> want(c.values.begin(), c.values.end());
-        EXPECT_TRUE(same_scalars(std::vector<T>(v->data, v->data + want.size()), want));
+        const std::vector<real_of<TypeParam>> want(c.values.begin(), c.values.end());
+        EXPECT_TRUE(same_scalars(std::vector(v->data, v->data + want.size()), want));
     }
 }
 
 TYPED_TEST(Reader, BinaryFormsInBothOrdersAndWidths) {
     using T = real_of<TypeParam>;
     const std::vector<double> x = {1.5, -2.25, 3, -0.0};
-    for (int form = 1; form <= 3; ++form)
-        for (uint32_t width : {4u, 8u})
-            for (bool swap : {false, true}) {
-                if ((form == 1 && width != 8) || (form == 2 && width != 4)) continue;
-                SCOPED_TRACE(::testing::Message() << "form " << form << " width " << width << " swap " << swap);
-                Vec<TypeParam> v;
-                std::string rest;
-                EXPECT_EQ(read_from(&v, binary_file(form, swap, width, 2, 7, x) + "\xBE", &rest), 1);
-                EXPECT_TRUE(has_shape(v.get(), 2, 7, 0.125));  // complex kept as written
-                EXPECT_TRUE(same_scalars(v.values(), std::vector<T>(x.begin(), x.end())));
-                EXPECT_EQ(rest, "\xBE");
-            }
+    for (const auto& [form, width] : {std::pair{1, 8u}, {2, 4u}, {3, 4u}, {3, 8u}})
+        for (bool swap : {false, true}) {
+            SCOPED_TRACE(::testing::Message() << "form " << form << " width " << width << " swap " << swap);
+            Vec<TypeParam> v;
+            std::string rest;
+            EXPECT_EQ(read_from(&v, binary_file(form, swap, width, 2, 7, x) + "\xBE", &rest), 1);
+            EXPECT_TRUE(has_shape(v.get(), 2, 7, 0.125));  // complex kept as written
+            EXPECT_TRUE(same_scalars(v.values(), std::vector<T>(x.begin(), x.end())));
+            EXPECT_EQ(rest, "\xBE");
+        }
 }
 
 TYPED_TEST(Reader, BrokenAndHostileBinaryHeaders) {
     Vec<TypeParam> v;
     EXPECT_EQ(read_from(&v, binary_file(3, false, 8, -5, 0, {})), 1);  // no scalars, points kept
     EXPECT_TRUE(has_shape(v.get(), -5, 0, 0.125));
-    std::string bad = binary_file(3, true, 8, 1, 0, {1});
-    bad[7] = 6;  // width 6
-    EXPECT_EQ(read_from(&v, bad), -1);
+    EXPECT_EQ(read_from(&v, binary_file(3, true, 6, 1, 0, {})), -1);  // width 6
     EXPECT_EQ(v->points, 1);
     EXPECT_EQ(read_from(&v, binary_file(3, false, 8, 1, 0, {}).substr(0, 10)), -1);  // short header
     EXPECT_EQ(read_from(&v, "\xEB\x01\x10\xBF"), -1);                                  // no magic
@@ -127,8 +99,7 @@ TYPED_TEST(Reader, BrokenAndHostileBinaryHeaders) {
     EXPECT_TRUE(has_shape(v.get(), 1000, 0, 0.125));
     // Counts the vector cannot hold fail in the allocation, not in arithmetic.
     EXPECT_EQ(read_from(&v, binary_file(3, false, 4, INT_MAX, 1, {1})), -1);
-    EXPECT_EQ(v->alloc, 0);
-    EXPECT_EQ(v->points, 0);
+    EXPECT_TRUE(v->alloc == 0 && v->points == 0);
     FailingAlloc<TypeParam> no_memory;
     EXPECT_EQ(read_from(&v, binary_file(1, true, 8, INT_MAX, 0, {1})), -1);
     EXPECT_TRUE(v->alloc == 0 && v->points == 0 && v->data == nullptr);
@@ -144,9 +115,7 @@ TYPED_TEST(Reader, TextAcrossBlocks) {
     Vec<TypeParam> v;
     std::string rest;
     EXPECT_EQ(read_from(&v, text, &rest), 1);
-    EXPECT_EQ(v->points, 2048);
-    EXPECT_EQ(v->alloc, 2048);
-    EXPECT_EQ(v[2047], 2047);
+    EXPECT_TRUE(v->points == 2048 && v->alloc == 2048 && v[2047] == 2047);
     EXPECT_EQ(rest, "\n2048\n2049\n");
 }
 
@@ -157,5 +126,4 @@ TEST(ReaderStreams, DashIsStandardStreamAndStaysOpen) {
     EXPECT_EQ(vlxf_fclose(stdin), 0);
     EXPECT_EQ(vlxff_fclose(stdout), 0);
     EXPECT_NE(std::fputs("", stdout), EOF);  // still open
-    EXPECT_EQ(vlxf_fopen("/nonexistent/dir/x", "r"), nullptr);
 }
