@@ -608,8 +608,8 @@ VLX_API int32_t vlxff_fwrite(const vlxf_t* v, FILE* stream);
 /* Writes v in the text form (16 significant digits; vlxff_: 7).  Returns 0. */
 VLX_API int32_t vlxf_fwrite_ascii(const vlx_t* v, FILE* stream);
 VLX_API int32_t vlxff_fwrite_ascii(const vlxf_t* v, FILE* stream);
-/* Writes v in the form VLX_FORMAT_* with the flags.  Returns 0; -1 for an
- * unknown form or a short binary write; a failing peak search of the trace. */
+/* Writes v in the form VLX_FORMAT_* with the flags.  Returns 0; -1 for a form
+ * above 4 or a short binary write; the trace header passes on a peak failure. */
 VLX_API int32_t vlxf_fwrite2(const vlx_t* v, FILE* stream, int32_t format);
 VLX_API int32_t vlxff_fwrite2(const vlxf_t* v, FILE* stream, int32_t format);
 
