@@ -4,6 +4,7 @@
 
 #include <clocale>
 #include <fstream>
+#include <thread>
 
 using namespace vlxtest;
 
@@ -152,7 +153,8 @@ TYPED_TEST(Writers, GnuplotDrawsTheScript) {
 }
 
 // Numbers are written and read in the C locale whatever the thread's or the
-// process's locale, and the caller's locale is left as it was.
+// process's locale, with threads at work at once, and the caller's locale is
+// left as it was.
 TYPED_TEST(Writers, TextIsTheSameUnderADecimalComma) {
     locale_t german = newlocale(LC_ALL_MASK, "de_DE.UTF-8", static_cast<locale_t>(nullptr));
     if (german == static_cast<locale_t>(nullptr)) GTEST_SKIP() << "de_DE.UTF-8 is not available";
@@ -160,9 +162,7 @@ TYPED_TEST(Writers, TextIsTheSameUnderADecimalComma) {
     v->delta = real_of<TypeParam>(0.125);
     std::vector<std::string> in_c;
     for (int32_t fmt = 1; fmt <= 4; ++fmt) in_c.push_back(written(v.get(), fmt));
-    for (bool process_wide : {false, true}) {
-        locale_t before = uselocale(process_wide ? LC_GLOBAL_LOCALE : german);
-        if (process_wide) std::setlocale(LC_ALL, "de_DE.UTF-8");
+    auto check = [&] {
         ASSERT_STREQ(localeconv()->decimal_point, ",");
         for (int32_t fmt = 1; fmt <= 4; ++fmt) EXPECT_EQ(written(v.get(), fmt), in_c[fmt - 1]) << fmt;
         Vec<TypeParam> back;
@@ -170,8 +170,12 @@ TYPED_TEST(Writers, TextIsTheSameUnderADecimalComma) {
         EXPECT_TRUE(has_shape(back.get(), 32, 1, 0.125));
         expect_same(back.values(), v.values(), true);
         EXPECT_STREQ(localeconv()->decimal_point, ",");
-        if (process_wide) std::setlocale(LC_ALL, "C");
-        uselocale(before);
-    }
+    };
+    auto in_thread = [&] { uselocale(german), check(), uselocale(LC_GLOBAL_LOCALE); };
+    std::thread first(in_thread), second(in_thread);
+    first.join(), second.join();
+    std::setlocale(LC_ALL, "de_DE.UTF-8");
+    check();
+    std::setlocale(LC_ALL, "C");
     freelocale(german);
 }
