@@ -12,9 +12,8 @@ TYPED_TEST_SUITE(Reader, Families);
 
 namespace {
 
-// Input; status, points, complex, delta and scalars read; what the next call finds.
 struct TextCase { std::string input; int32_t status, points, is_complex; double delta; std::vector<double> values;
-                  std::string rest; };
+                  std::string rest; /* what the next call finds */ };
 
 const std::vector<TextCase> text_cases = {
     {"", 0, 0, 0, 1, {}, ""},

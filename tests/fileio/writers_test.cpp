@@ -56,8 +56,7 @@ void round_trip(int32_t format) {
         EXPECT_TRUE(has_shape(r.get(), int32_t(x.size()) / (is_complex ? 2 : 1), is_complex, 0.25));
         expect_same(r.values(), x, text);
     }
-    Vec<R> end;
-    EXPECT_EQ(t_fread(end.get(), f), 0);
+    EXPECT_EQ(t_fread(Vec<R>().get(), f), 0);
     std::fclose(f);
 }
 
