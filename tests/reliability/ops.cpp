@@ -3,6 +3,8 @@
 // both families.  The context decides which argument is spoiled or aliased.
 #include "harness.hpp"
 
+#include <cstdio>
+
 namespace rel {
 namespace {
 
@@ -66,6 +68,37 @@ V* wanting(Ctx<V>& c, int32_t n) {
     }
     return v;
 }
+
+// A stream to write to, its buffer made before the window opens.
+struct Sink {
+    std::FILE* f;
+    Sink() {
+        Pause p;
+        f = std::fopen("/dev/null", "w");
+        std::fputc(' ', f);
+    }
+    ~Sink() {
+        Pause p;
+        std::fclose(f);
+    }
+};
+
+// A stream holding v in the form given, at its start.
+template <class V>
+struct Source {
+    std::FILE* f;
+    Source(V* v, int32_t form) {
+        Pause p;
+        f = std::tmpfile();
+        REL_TW(f, fwrite2)(v, f, form);
+        std::rewind(f);
+        std::ungetc(std::fgetc(f), f);
+    }
+    ~Source() {
+        Pause p;
+        std::fclose(f);
+    }
+};
 
 #define POLY c.vals({-6, 11, -6, 1})
 #define BINARY(name) REL_ROW(b, name, return fn(c.in(32, true), c.in(32), c.out());)
@@ -244,6 +277,15 @@ const std::vector<Row> table = {
     REL_ROWF(kNoHostile, b, tridiagonal_solve, T l[8], d[8], u[8], r[8], x[8];
              for (int i = 0; i < 8; ++i) l[i] = T(0.5), d[i] = T(3), u[i] = T(-0.5), r[i] = T(i);
              return fn(l, d, u, r, x, 8);),
+    // ---- sample files
+    REL_ROW(f, fopen, std::FILE* f = fn("/dev/null", "r"); return f != nullptr ? REL_TW(f, fclose)(f) : -1;),
+    REL_ROW(f, fwrite, Sink o; return fn(c.in(64, true), o.f);),
+    REL_ROW(f, fwrite_ascii, Sink o; return fn(c.in(64), o.f);),
+    REL_ROW(f, fwrite2, Sink o; return fn(c.in(64, true), o.f, c.n(VLX_FORMAT_SUMMARY));),
+    REL_ROW(f, fwrite2, Sink o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_GNUPLOT));),
+    REL_ROWF(kSettledLeak, f, fwrite2, Sink o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_TRACE));),
+    REL_ROW(f, fread, Source<V> i(c.in(64, true), VLX_FORMAT_BINARY); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROW(f, fread, Source<V> i(c.in(64), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
 };
 
 }  // namespace

@@ -7,7 +7,10 @@
 #include <atomic>
 #include <chrono>
 #include <cstdio>
+#include <cstdio>
 #include <functional>
+#include <memory>
+#include <string>
 #include <mutex>
 #include <thread>
 
@@ -93,8 +96,44 @@ int filtered(V* v, int32_t taps, bool symmetric) {
     return r;
 }
 
+// Reads a file image from memory: a binary one of complex samples, or a
+// text one of real samples, written once by the family's writer.
+template <class V>
+Job file_job(bool text) {
+    auto image = std::make_shared<std::string>();
+    {
+        V v;
+        vlxtest::t_init(&v);
+        v.points = 700, v.complex = !text, v.delta = vlxtest::real_of<V>(0.25);
+        vlxtest::t_alloc(&v);
+        const auto x = vlxtest::random_values<vlxtest::real_of<V>>(size_t(v.complex ? 1400 : 700), 7);
+        for (size_t i = 0; i < x.size(); ++i) v.data[i] = x[i];
+        std::FILE* f = std::tmpfile();
+        REL_TW(f, fwrite2)(&v, f, text ? VLX_FORMAT_ASCII : VLX_FORMAT_BINARY);
+        image->resize(size_t(std::ftell(f)));
+        std::rewind(f);
+        if (std::fread(image->data(), 1, image->size(), f) != image->size()) image->clear();
+        std::fclose(f);
+        vlxtest::t_destroy(&v);
+    }
+    return {std::string(text ? "text read" : "binary read") + (vlxtest::is_double<V> ? "" : " (float)"), [image] {
+                V v;
+                vlxtest::t_init(&v);
+                std::FILE* f = fmemopen(image->data(), image->size(), "r");
+                Result r;
+                r.rc = REL_TW(f, fread)(&v, f) == 1 ? 0 : -1;
+                std::fclose(f);
+                r.points = v.points, r.is_complex = v.complex, r.delta = double(v.delta);
+                for (int64_t i = 0; i < (v.complex ? 2 * int64_t(v.points) : v.points); ++i) r.x.push_back(double(v.data[i]));
+                vlxtest::t_destroy(&v);
+                return r;
+            }};
+}
+
 template <class V>
 void add_jobs(std::vector<Job>& jobs) {
+    jobs.push_back(file_job<V>(false));
+    jobs.push_back(file_job<V>(true));
     jobs.push_back(job<V>("window", 1000, true, [](V* v) { return REL_TW(i, window)(v, VLX_WINDOW_HANN, 0); }));
     jobs.push_back(job<V>("window width", 512, false,
                           [](V* v) { return REL_TW(i, window2)(v, VLX_WINDOW_HANN + 4, VLX_WFLAG_WIDTH, 300); }));
