@@ -130,12 +130,13 @@ struct Ctx {
     // A vector with given samples, an ordinary source.
     V* vals(std::initializer_list<double> x, bool cplx = false, Role role = Role::in) {
         V* v = make(role, int32_t(x.size() / (cplx ? 2 : 1)), cplx);
-        if (v->alloc > 0 && v->points == int32_t(x.size() / (cplx ? 2 : 1)) && mode.kind != VKind::nonfinite) {
-            int i = 0;
+        int i = 0;
+        if (intact(v) && v->alloc >= int32_t(x.size()))  // an alias may be shorter
             for (double d : x) v->data[i++] = T(d);
-        }
         return v;
     }
+    // Not the spoiled argument (so its samples may be set).
+    bool intact(const V* v) const { return mode.vec < 0 || args[size_t(mode.vec)] != v || mode.kind == VKind::normal; }
     vlxf_t* fout() {
         Pause p;
         vlxf_t* f = &fpool[fused++];
@@ -224,7 +225,8 @@ enum : unsigned {
     kSettledLeak = 1,  // a failed run may leave hook blocks behind, as the library settles
     kMayRecover = 2,   // a failed allocation need not fail the call (a fallback exists)
     kNoHostile = 4,    // not in the hostile sweep (the row's arguments are pointers it cannot spoil)
-    kQuadratic = 8,    // work grows with the square of a length or worse: no 46341-point vectors
+    kQuadratic = 8,
+    kFails = 16,       // the normal call fails by design    // work grows with the square of a length or worse: no 46341-point vectors
 };
 const std::vector<Row>& rows();
 

@@ -182,6 +182,9 @@ TYPED_TEST(Reliability, EveryAllocationFailure) {
                 if (!cold) call(r, c), c.clear();  // fill the caches first
                 if (cold) free_internal<V>();
                 rc0 = run(r, c, 0, label<V>(r, "counting"), &n);
+                if (!(r.flags & kFails)) {
+                    EXPECT_GE(rc0, 0) << label<V>(r, "normal call");
+                }
                 check_released(c, label<V>(r, "counting"), leak_ok);
             }
             ++rows_swept, points_total += n;
