@@ -616,6 +616,13 @@ VLX_API int32_t vlxf_ceil_pts(float x);
 VLX_API int32_t vlx_floor_pts(double x);
 VLX_API int32_t vlxf_floor_pts(float x);
 
+/* --- transforms --- */
+
+/* Caps the vector lanes of the power-of-two transforms at lanes (0 scalar,
+ * 1 AVX, 2 AVX-512F; negative only asks); every level gives the same bits.
+ * Returns the level in effect, limited by the processor. */
+VLX_API int32_t vlx_transform_lanes(int32_t lanes);
+
 #ifdef __cplusplus
 }
 #endif

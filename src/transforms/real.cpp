@@ -12,46 +12,12 @@
 namespace vlx {
 namespace {
 
-#ifdef VLX_FFT_AVX
-// The general elements k of a block, W at a time, for as long as W of them
-// remain; returns the first k left over.  Lane i holds element k + i: the
-// mirrored points p + h - k - i and p + 2h - k - i are read and written in
-// reverse.  Each lane does the scalar arithmetic of real_block.
-template <class S>
-__attribute__((target("avx"))) int64_t real_elements_simd(typename S::scalar* e, int64_t h,
-                                                          const typename S::scalar* tw, int64_t stride) {
-    using T = typename S::scalar;
-    constexpr int64_t w = S::width;
-    const T* o1 = e + 4 * h;
-    const T* o3 = e + 6 * h;
-    const size_t step = 6 * size_t(stride);
-    int64_t k = 1;
-    for (; k + w - 1 < h / 2; k += w) {
-        const int64_t j = 2 * k;
-        typename S::reg c1, ab1, c3, ab3;
-        S::template triples<0>(tw + size_t(k) * step, step, c1, ab1);
-        S::template triples<3>(tw + size_t(k) * step, step, c3, ab3);
-        const auto w1 = fft_simd::rotate_simd<S, false>(S::load(o1 + j), c1, ab1);
-        const auto w3 = fft_simd::rotate_simd<S, false>(S::load(o3 + j), c3, ab3);
-        const auto sum = S::add(w1, w3);
-        const auto dsw = S::swap(S::sub(w3, w1));  // (D.im, D.re)
-        const auto e1 = S::load(e + j);
-        T* at2 = e + 2 * (h - k - w + 1);
-        const auto e2 = S::reverse(S::load(at2));
-        S::store(e + j, S::add(e1, sum));
-        S::store(e + 2 * (2 * h - k - w + 1), S::reverse(S::re_im(S::sub(e1, sum), S::sub(sum, e1))));
-        S::store(at2, S::reverse(S::add(e2, dsw)));
-        S::store(e + 2 * (h + k), S::re_im(S::sub(e2, dsw), S::sub(dsw, e2)));
-    }
-    return k;
-}
-#endif
-
 // One block of n = 4h points at point p: from the half spectra of its even
 // part (p .. p+h), and of its two quarter parts (p+2h .. p+2h+h/2 and
 // p+3h .. p+3h+h/2) to its own half spectrum (p .. p+2h).
 template <VlxVector V>
-void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t stride, bool vector) {
+void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t stride, const real_t<V>* st,
+                int32_t level) {
     using T = real_t<V>;
     T* e = x + 2 * p;
     T* o1 = e + 4 * h;
@@ -65,9 +31,12 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
 
     int64_t k = 1;
 #ifdef VLX_FFT_AVX
-    if (vector) k = real_elements_simd<fft_simd::Avx<T>>(e, h, tw, stride);
+    using namespace fft_simd;
+    if (level == 2) k = lanes512::real_elements_lanes<Avx512<T>>(e, h, st, k);
+    if (level >= 1) k = lanes256::real_elements_lanes<Avx<T>>(e, h, st, k);
 #else
-    (void)vector;
+    (void)st;
+    (void)level;
 #endif
     for (; k < h / 2; ++k) {
         const T* pair = tw + 6 * k * stride;
@@ -110,6 +79,31 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
     }
 }
 
+// Depth first: the half and the two quarters of a block of len points, then
+// the block.  Blocks touch disjoint points and each runs after the blocks it
+// reads, so this is the arithmetic of the stage-by-stage walk (two-point
+// butterflies on real parts, then the stages by levels), with small blocks
+// kept in cache.
+template <VlxVector V>
+void real_tree(real_t<V>* x, int64_t p, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
+               int32_t level) {
+    using T = real_t<V>;
+    if (len <= 2) {
+        if (len == 2) {
+            const T a = x[2 * p], b = x[2 * p + 2];
+            x[2 * p] = a + b;
+            x[2 * p + 2] = a - b;
+        }
+        return;
+    }
+    real_tree<V>(x, p, len / 2, n, tw, lanes, level);
+    real_tree<V>(x, p + len / 2, len / 4, n, tw, lanes, level);
+    real_tree<V>(x, p + 3 * len / 4, len / 4, n, tw, lanes, level);
+    const int64_t h = len / 4;
+    const T* st = h >= 2 && lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
+    real_block<V>(x, p, h, tw, n / len, st, h >= 2 ? level : 0);
+}
+
 }  // namespace
 
 template <VlxVector V>
@@ -118,34 +112,13 @@ int32_t fft_real_forward(V* v) {
     // Reordered and scaled while still real: half the samples to move.
     if (bitrev_scale(v) < 0 || rtoc(v) < 0) return -1;
     const int64_t n = v->points;
-    const int32_t m = log2_of(v->points);
     TableReader reader;
     const T* tw = nullptr;
-    const int32_t status = fft_table<V>(v->points, &tw);
+    const T* lanes = nullptr;
+    const int32_t status = fft_table<V>(v->points, &tw, &lanes);
     reader.release_lock();
     if (status < 0) return status;
-    T* x = v->data;
-#ifdef VLX_FFT_AVX
-    const bool vector = fft_simd::have_avx();
-#else
-    const bool vector = false;
-#endif
-
-    for (int64_t pos = 0, spacing = 4, c = (n + 2) / 4; c > 0; pos = 4 * pos + 6, spacing *= 4, c = (c + 2) / 4) {
-        for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) {
-            const T a = x[2 * p], b = x[2 * p + 2];
-            x[2 * p] = a + b;
-            x[2 * p + 2] = a - b;
-        }
-    }
-    for (int32_t s = 0; s <= m - 2; ++s) {
-        const int64_t h = int64_t(1) << s;
-        const int64_t stride = n / (4 * h);
-        for (int64_t pos = 0, spacing = 8, c = (stride + 1) / 2; c > 0;
-             pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
-            for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) real_block<V>(x, p * h, h, tw, stride, vector);
-        }
-    }
+    real_tree<V>(v->data, 0, n, n, tw, lanes, lanes != nullptr ? fft_simd::lanes() : 0);
     v->points = static_cast<int32_t>(n / 2 + 1);
     return 0;
 }
