@@ -2,7 +2,6 @@
 #include "core/frame.hpp"
 #include "transforms/transforms.hpp"
 
-#include <algorithm>
 #include <cstdlib>
 
 namespace vlx {
@@ -123,59 +122,72 @@ const uint32_t* fixed_list(int32_t m) {
     return find_or_build<V>(bitrev_state<V>.fixed, m, (size_t(1) << (m / 2 + 1)) + 2, build_fixed);
 }
 
-// From this many bytes of samples on, the list order misses the caches at
-// almost every exchange (see swap_pairs).
-constexpr size_t tiled_bytes = size_t(1) << 20;
-
-template <class T, bool Scaled>
-inline void exchange(T* x, size_t width, uint32_t i, uint32_t j, T f) {
-    T* p = x + width * i;
-    T* q = x + width * j;
-    for (size_t c = 0; c < width; ++c) {
+// Point i of W scalars exchanged with point j, each sample times f if Scaled.
+template <class T, size_t W, bool Scaled>
+inline void exchange(T* p, T* q, T f) {
+    for (size_t c = 0; c < W; ++c) {
         const T t = Scaled ? p[c] * f : p[c];
         p[c] = Scaled ? q[c] * f : q[c];
         q[c] = t;
     }
 }
 
-// Exchanges the points of every pair of the list, each sample times f if
-// Scaled.  The pair of high halves (a, b), a < b, exchanges column r(b) of
-// row a with column r(a) of row b; rows are a power of two apart, so the list
-// order would meet each cache line once per point, in conflicting sets.  The
-// walk goes instead by tiles: a whose r(a) fill one cache line, b likewise,
-// so a tile uses its lines in full.  Each pair is still read from the list
-// and visited exactly once (the tile of (b, a) skips it).
-template <class T, bool Scaled>
-void swap_pairs(T* x, const uint32_t* list, int32_t m, size_t width, T f) {
-    if ((width * sizeof(T)) << m < tiled_bytes) {
-        // small enough to stay in cache: the list in its own order
-        for (const uint32_t* p = list; *p != 0; p += 2) exchange<T, Scaled>(x, width, p[0], p[1], f);
-        return;
-    }
-    const int32_t h = m / 2;
-    const size_t r = size_t(1) << h;
-    const size_t words_per_b = m % 2 == 0 ? 2 : 4;
-    constexpr size_t max_tile = 16;
-    const size_t tile = std::min(r, std::min(max_tile, std::max<size_t>(1, 64 / (width * sizeof(T)))));
-    size_t as[max_tile], bs[max_tile];
-    for (size_t i = 0; i < r; i += tile) {
-        for (size_t t = 0; t < tile; ++t) as[t] = reverse_bits(uint32_t(i + t), h);
-        for (size_t j = 0; j < r; j += tile) {
-            for (size_t t = 0; t < tile; ++t) bs[t] = reverse_bits(uint32_t(j + t), h);
-            for (size_t ta = 0; ta < tile; ++ta) {
-                const size_t a = as[ta];
-                // the run of a: pairs (a, a+1), (a, a+2), ...
-                const uint32_t* run = list + words_per_b * (a * r - a * (a + 1) / 2);
-                for (size_t tb = 0; tb < tile; ++tb) {
-                    const size_t b = bs[tb];
-                    if (b <= a) continue;
-                    const uint32_t* e = run + words_per_b * (b - a - 1);
-                    exchange<T, Scaled>(x, width, e[0], e[1], f);
-                    if (words_per_b == 4) exchange<T, Scaled>(x, width, e[2], e[3], f);
+template <class T, size_t W, bool Scaled>
+inline void scale_point(T* p, T f) {
+    if (Scaled)
+        for (size_t c = 0; c < W; ++c) p[c] = p[c] * f;
+}
+
+// Small lengths: the pairs in list order, then the fixed points.
+template <class T, size_t W, bool Scaled>
+void by_lists(T* x, const uint32_t* swaps, const uint32_t* fixed, T f) {
+    for (const uint32_t* p = swaps; *p != 0; p += 2) exchange<T, W, Scaled>(x + W * p[0], x + W * p[1], f);
+    if (Scaled)
+        for (const uint32_t* p = fixed; *p != fixed_end; ++p) scale_point<T, W, Scaled>(x + W * *p, f);
+}
+
+// From 2^6 points on, the same exchanges by tiles.  With an index of m bits
+// read as (a, mid, b), a and b of 3 bits, the points of one mid form a tile of
+// 8 rows of 8 consecutive points, and the reversal carries tile mid onto tile
+// r(mid) with (a, b) going to (r(b), r(a)).  So a pair of tiles is exchanged
+// while its 16 rows stay in cache, instead of meeting each cache line once per
+// point; a tile that is its own image exchanges within itself and scales its
+// fixed points (b = r(a)).  Every point still moves once and is scaled once.
+template <class T, size_t W, bool Scaled>
+void by_tiles(T* x, int32_t m, T f) {
+    static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
+    const int32_t mid_bits = m - 6;
+    const size_t rows = size_t(1) << (m - 3);  // points from one row to the next
+    for (size_t mid = 0; mid < (size_t(1) << mid_bits); ++mid) {
+        const size_t image = reverse_bits(uint32_t(mid), mid_bits);
+        if (image < mid) continue;
+        T* tile = x + W * (mid << 3);
+        T* other = x + W * (image << 3);
+        for (size_t a = 0; a < 8; ++a) {
+            T* row = tile + W * a * rows;
+            T* column = other + W * r3[a];
+            if (image != mid) {
+                for (size_t b = 0; b < 8; ++b) exchange<T, W, Scaled>(row + W * b, column + W * r3[b] * rows, f);
+            } else {
+                for (size_t b = 0; b < 8; ++b) {
+                    T* p = row + W * b;
+                    T* q = column + W * r3[b] * rows;
+                    if (p < q)
+                        exchange<T, W, Scaled>(p, q, f);
+                    else if (p == q)
+                        scale_point<T, W, Scaled>(p, f);
                 }
             }
         }
     }
+}
+
+template <class T, size_t W, bool Scaled>
+void reorder(T* x, int32_t m, const uint32_t* swaps, const uint32_t* fixed, T f) {
+    if (m >= 6)
+        by_tiles<T, W, Scaled>(x, m, f);
+    else
+        by_lists<T, W, Scaled>(x, swaps, fixed, f);
 }
 
 }  // namespace
@@ -190,9 +202,9 @@ int32_t bitrev(V* v) {
     reader.release_lock();
     if (swaps == nullptr) return -1;
     if (v->complex)
-        swap_pairs<T, false>(v->data, swaps, m, 2, T(1));
+        reorder<T, 2, false>(v->data, m, swaps, nullptr, T(1));
     else
-        swap_pairs<T, false>(v->data, swaps, m, 1, T(1));
+        reorder<T, 1, false>(v->data, m, swaps, nullptr, T(1));
     return 0;
 }
 
@@ -209,18 +221,10 @@ int32_t bitrev_scale(V* v) {
     const uint32_t* fixed = swaps != nullptr ? fixed_list<V>(m) : nullptr;
     reader.release_lock();
     if (fixed == nullptr) return -1;
-    T* x = v->data;
-    if (v->complex) {
-        swap_pairs<T, true>(x, swaps, m, 2, f);
-        for (const uint32_t* p = fixed; *p != fixed_end; ++p) {
-            T* a = x + 2 * size_t(*p);
-            a[0] = a[0] * f;
-            a[1] = a[1] * f;
-        }
-    } else {
-        swap_pairs<T, true>(x, swaps, m, 1, f);
-        for (const uint32_t* p = fixed; *p != fixed_end; ++p) x[*p] = x[*p] * f;
-    }
+    if (v->complex)
+        reorder<T, 2, true>(v->data, m, swaps, fixed, f);
+    else
+        reorder<T, 1, true>(v->data, m, swaps, fixed, f);
     return 0;
 }
 
