@@ -12,6 +12,33 @@
 namespace vlx {
 namespace {
 
+// The elements of a block that need no table: the first, and for h >= 2 the
+// pi/4 element, which uses only the real parts of the quarter parts' Nyquist
+// bins.  They touch points of their own, so they run apart from the others.
+template <VlxVector V>
+inline void real_edges(real_t<V>* e, int64_t h) {
+    using T = real_t<V>;
+    T* o1 = e + 4 * h;
+    T* o3 = e + 6 * h;
+    const T x0 = e[0], x2 = o1[0], x3 = o3[0];
+    const T t = x3 + x2;
+    e[0] = x0 + t;
+    o1[0] = x0 - t;
+    e[2 * h + 1] = x3 - x2;
+    if (h >= 2) {
+        const int64_t j = h;  // scalar index of point h/2
+        const T r = fft_sqrt_half<V>;
+        const T u = -r * o3[j];
+        const T v = r * o1[j];
+        const T er = e[j], ei = e[j + 1];
+        e[j] = er + (u + v);
+        e[j + 1] = (u - v) + ei;
+        T* mirror = e + 2 * h + j;
+        mirror[0] = er - (u + v);
+        mirror[1] = (u - v) - ei;
+    }
+}
+
 // One block of n = 4h points at point p: from the half spectra of its even
 // part (p .. p+h), and of its two quarter parts (p+2h .. p+2h+h/2 and
 // p+3h .. p+3h+h/2) to its own half spectrum (p .. p+2h).
@@ -22,13 +49,7 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
     T* e = x + 2 * p;
     T* o1 = e + 4 * h;
     T* o3 = e + 6 * h;
-
-    const T x0 = e[0], x2 = o1[0], x3 = o3[0];
-    const T t = x3 + x2;
-    e[0] = x0 + t;
-    o1[0] = x0 - t;
-    e[2 * h + 1] = x3 - x2;
-
+    real_edges<V>(e, h);
     int64_t k = 1;
 #ifdef VLX_FFT_AVX
     using namespace fft_simd;
@@ -63,20 +84,6 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
         mirror2[0] = e2r - di;
         mirror2[1] = dr - e2i;
     }
-
-    if (h >= 2) {
-        // the pi/4 point: only the real parts of the quarter parts' Nyquist bins
-        const int64_t j = h;  // scalar index of point h/2
-        const T r = fft_sqrt_half<V>;
-        const T u = -r * o3[j];
-        const T v = r * o1[j];
-        const T er = e[j], ei = e[j + 1];
-        e[j] = er + (u + v);
-        e[j + 1] = (u - v) + ei;
-        T* mirror = e + 2 * h + j;
-        mirror[0] = er - (u + v);
-        mirror[1] = (u - v) - ei;
-    }
 }
 
 // Depth first: the half and the two quarters of a block of len points, then
@@ -88,20 +95,32 @@ template <VlxVector V>
 void real_tree(real_t<V>* x, int64_t p, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                int32_t level) {
     using T = real_t<V>;
-    if (len <= 2) {
-        if (len == 2) {
-            const T a = x[2 * p], b = x[2 * p + 2];
-            x[2 * p] = a + b;
-            x[2 * p + 2] = a - b;
+    // the two-point butterfly on the real parts of points q and q + 1
+    const auto two = [x](int64_t q) {
+        const T a = x[2 * q], b = x[2 * q + 2];
+        x[2 * q] = a + b;
+        x[2 * q + 2] = a - b;
+    };
+    if (len <= 8) {
+        // the smallest blocks in line: no calls for the leaves
+        if (len >= 4) {
+            two(p);
+            real_edges<V>(x + 2 * p, 1);
         }
+        if (len == 8) {
+            two(p + 4);
+            two(p + 6);
+            real_edges<V>(x + 2 * p, 2);
+        }
+        if (len == 2) two(p);
         return;
     }
     real_tree<V>(x, p, len / 2, n, tw, lanes, level);
     real_tree<V>(x, p + len / 2, len / 4, n, tw, lanes, level);
     real_tree<V>(x, p + 3 * len / 4, len / 4, n, tw, lanes, level);
     const int64_t h = len / 4;
-    const T* st = h >= 2 && lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
-    real_block<V>(x, p, h, tw, n / len, st, h >= 2 ? level : 0);
+    real_block<V>(x, p, h, tw, n / len, lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr,
+                  lanes != nullptr ? level : 0);
 }
 
 }  // namespace
