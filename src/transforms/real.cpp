@@ -86,35 +86,43 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
     }
 }
 
-// Depth first: the half and the two quarters of a block of len points, then
-// the block.  Blocks touch disjoint points and each runs after the blocks it
-// reads, so this is the arithmetic of the stage-by-stage walk (two-point
-// butterflies on real parts, then the stages by levels), with small blocks
-// kept in cache.
+// A block of len points with everything below it, stage by stage as the
+// levels walk them within the block (its tree is that of a transform of len
+// points).  Each stage's stores are then long done when the next stage loads
+// them as vectors.
+template <VlxVector V>
+void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
+                 int32_t level) {
+    using T = real_t<V>;
+    for (int64_t pos = 0, spacing = 4, c = (len + 2) / 4; c > 0; pos = 4 * pos + 6, spacing *= 4, c = (c + 2) / 4) {
+        for (int64_t i = 0, p = p0 + pos; i < c; ++i, p += spacing) {
+            const T a = x[2 * p], b = x[2 * p + 2];
+            x[2 * p] = a + b;
+            x[2 * p + 2] = a - b;
+        }
+    }
+    for (int64_t h = 1; 4 * h <= len; h *= 2) {
+        const T* st = h >= 2 && lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
+        for (int64_t pos = 0, spacing = 8, c = (len / (4 * h) + 1) / 2; c > 0;
+             pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
+            for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) {
+                if (h <= 2)
+                    real_edges<V>(x + 2 * (p0 + p * h), h);
+                else
+                    real_block<V>(x, p0 + p * h, h, tw, n / (4 * h), st, st != nullptr ? level : 0);
+            }
+        }
+    }
+}
+
+// Depth first down to blocks that fit the first-level cache: the half and the
+// two quarters of a block of len points, then the block.  Blocks touch
+// disjoint points and each runs after the blocks it reads, so this is the
+// arithmetic of the stage-by-stage walk.
 template <VlxVector V>
 void real_tree(real_t<V>* x, int64_t p, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                int32_t level) {
-    using T = real_t<V>;
-    // the two-point butterfly on the real parts of points q and q + 1
-    const auto two = [x](int64_t q) {
-        const T a = x[2 * q], b = x[2 * q + 2];
-        x[2 * q] = a + b;
-        x[2 * q + 2] = a - b;
-    };
-    if (len <= 8) {
-        // the smallest blocks in line: no calls for the leaves
-        if (len >= 4) {
-            two(p);
-            real_edges<V>(x + 2 * p, 1);
-        }
-        if (len == 8) {
-            two(p + 4);
-            two(p + 6);
-            real_edges<V>(x + 2 * p, 2);
-        }
-        if (len == 2) two(p);
-        return;
-    }
+    if (len <= 512) return real_levels<V>(x, p, len, n, tw, lanes, level);
     real_tree<V>(x, p, len / 2, n, tw, lanes, level);
     real_tree<V>(x, p + len / 2, len / 4, n, tw, lanes, level);
     real_tree<V>(x, p + 3 * len / 4, len / 4, n, tw, lanes, level);
