@@ -1,8 +1,10 @@
 // Bit reversal of a vector from cached index lists, plain and scaled by 1/N.
 #include "core/frame.hpp"
+#include "transforms/fft_simd.hpp"
 #include "transforms/transforms.hpp"
 
 #include <cstdlib>
+#include <cstring>
 
 namespace vlx {
 namespace {
@@ -158,6 +160,8 @@ void by_tiles(T* x, int32_t m, T f) {
     static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
     const int32_t mid_bits = m - 6;
     const size_t rows = size_t(1) << (m - 3);  // points from one row to the next
+    size_t down[8];                            // scalars to row r(b)
+    for (size_t b = 0; b < 8; ++b) down[b] = W * r3[b] * rows;
     for (size_t mid = 0; mid < (size_t(1) << mid_bits); ++mid) {
         const size_t image = reverse_bits(uint32_t(mid), mid_bits);
         if (image < mid) continue;
@@ -167,11 +171,11 @@ void by_tiles(T* x, int32_t m, T f) {
             T* row = tile + W * a * rows;
             T* column = other + W * r3[a];
             if (image != mid) {
-                for (size_t b = 0; b < 8; ++b) exchange<T, W, Scaled>(row + W * b, column + W * r3[b] * rows, f);
+                for (size_t b = 0; b < 8; ++b) exchange<T, W, Scaled>(row + W * b, column + down[b], f);
             } else {
                 for (size_t b = 0; b < 8; ++b) {
                     T* p = row + W * b;
-                    T* q = column + W * r3[b] * rows;
+                    T* q = column + down[b];
                     if (p < q)
                         exchange<T, W, Scaled>(p, q, f);
                     else if (p == q)
@@ -182,8 +186,146 @@ void by_tiles(T* x, int32_t m, T f) {
     }
 }
 
+#ifdef VLX_FFT_AVX
+// The tile exchange on AVX-512F lanes, for points of 64 bits (complex floats,
+// real doubles) and 128 bits (complex doubles).  The image of a tile holds
+// at (R, C) the point (r(C), r(R)) of the tile: with the rows loaded in the
+// order r(C), it is their transpose with the columns stored in the order
+// r(R).  Moves only; each point is multiplied by f once, as in the scalar walk.
+#define VLX_TILE512 __attribute__((target("avx512f")))
+
+VLX_TILE512 inline __m512d pick(__m512d a, __m512i index, __m512d b) { return _mm512_permutex2var_pd(a, index, b); }
+
+VLX_TILE512 inline __m512i index8(long long i0, long long i1, long long i2, long long i3, long long i4, long long i5,
+                                   long long i6, long long i7) {
+    return _mm512_set_epi64(i7, i6, i5, i4, i3, i2, i1, i0);
+}
+
+template <class T>
+VLX_TILE512 inline __m512d scaled(__m512d v, T f) {
+    if constexpr (std::is_same_v<T, float>)
+        return _mm512_castps_pd(_mm512_mul_ps(_mm512_castpd_ps(v), _mm512_set1_ps(f)));
+    else
+        return _mm512_mul_pd(v, _mm512_set1_pd(f));
+}
+
+// 8 x 8 points of 64 bits, one row a register: src rows `from` apart (bytes),
+// the image written to dst with rows `to` apart.
+template <class T, bool Scaled>
+VLX_TILE512 void tile_image64(const char* src, size_t from, char* dst, size_t to, T f) {
+    static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
+    __m512d r[8], t[8], u[8];
+    for (size_t c = 0; c < 8; ++c) r[c] = _mm512_loadu_pd(src + r3[c] * from);
+    const __m512i lo = index8(0, 8, 2, 10, 4, 12, 6, 14), hi = index8(1, 9, 3, 11, 5, 13, 7, 15);
+    const __m512i lo2 = index8(0, 1, 8, 9, 4, 5, 12, 13), hi2 = index8(2, 3, 10, 11, 6, 7, 14, 15);
+    const __m512i lo4 = index8(0, 1, 2, 3, 8, 9, 10, 11), hi4 = index8(4, 5, 6, 7, 12, 13, 14, 15);
+    for (size_t i = 0; i < 8; i += 2) {
+        t[i] = pick(r[i], lo, r[i + 1]);
+        t[i + 1] = pick(r[i], hi, r[i + 1]);
+    }
+    for (size_t i = 0; i < 8; i += 4) {
+        u[i] = pick(t[i], lo2, t[i + 2]);          // columns 0 and 4 of these four rows
+        u[i + 1] = pick(t[i], hi2, t[i + 2]);      // 2 and 6
+        u[i + 2] = pick(t[i + 1], lo2, t[i + 3]);  // 1 and 5
+        u[i + 3] = pick(t[i + 1], hi2, t[i + 3]);  // 3 and 7
+    }
+    __m512d column[8];
+    column[0] = pick(u[0], lo4, u[4]);
+    column[4] = pick(u[0], hi4, u[4]);
+    column[2] = pick(u[1], lo4, u[5]);
+    column[6] = pick(u[1], hi4, u[5]);
+    column[1] = pick(u[2], lo4, u[6]);
+    column[5] = pick(u[2], hi4, u[6]);
+    column[3] = pick(u[3], lo4, u[7]);
+    column[7] = pick(u[3], hi4, u[7]);
+    for (size_t row = 0; row < 8; ++row) {
+        const __m512d v = column[r3[row]];
+        _mm512_storeu_pd(dst + row * to, Scaled ? scaled(v, f) : v);
+    }
+}
+
+// 8 x 8 points of 128 bits, a row in two registers: as tile_image64, by
+// blocks of 4 x 4 points.
+template <bool Scaled>
+VLX_TILE512 void tile_image128(const char* src, size_t from, char* dst, size_t to, double f) {
+    static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
+    __m512d r[8][2];
+    for (size_t c = 0; c < 8; ++c) {
+        r[c][0] = _mm512_loadu_pd(src + r3[c] * from);
+        r[c][1] = _mm512_loadu_pd(src + r3[c] * from + 64);
+    }
+    const __m512i lo = index8(0, 1, 8, 9, 2, 3, 10, 11), hi = index8(4, 5, 12, 13, 6, 7, 14, 15);
+    const __m512i lo4 = index8(0, 1, 2, 3, 8, 9, 10, 11), hi4 = index8(4, 5, 6, 7, 12, 13, 14, 15);
+    // column[j][g]: points j of rows 4g .. 4g+3
+    __m512d column[8][2];
+    for (size_t g = 0; g < 2; ++g) {
+        for (size_t half = 0; half < 2; ++half) {
+            const __m512d* a0 = r[4 * g];
+            const __m512d t0 = pick(a0[half], lo, r[4 * g + 1][half]);
+            const __m512d t1 = pick(a0[half], hi, r[4 * g + 1][half]);
+            const __m512d t2 = pick(r[4 * g + 2][half], lo, r[4 * g + 3][half]);
+            const __m512d t3 = pick(r[4 * g + 2][half], hi, r[4 * g + 3][half]);
+            column[4 * half + 0][g] = pick(t0, lo4, t2);
+            column[4 * half + 1][g] = pick(t0, hi4, t2);
+            column[4 * half + 2][g] = pick(t1, lo4, t3);
+            column[4 * half + 3][g] = pick(t1, hi4, t3);
+        }
+    }
+    for (size_t row = 0; row < 8; ++row) {
+        for (size_t g = 0; g < 2; ++g) {
+            const __m512d v = column[r3[row]][g];
+            _mm512_storeu_pd(dst + row * to + 64 * g, Scaled ? scaled(v, f) : v);
+        }
+    }
+}
+
+template <class T, size_t W>
+constexpr bool tile_lanes = W * sizeof(T) == 8 || W * sizeof(T) == 16;
+
+template <class T, size_t W, bool Scaled>
+VLX_TILE512 void tile_image(const T* src, size_t from, T* dst, size_t to, T f) {
+    const auto* s = reinterpret_cast<const char*>(src);
+    auto* d = reinterpret_cast<char*>(dst);
+    if constexpr (W * sizeof(T) == 16)
+        tile_image128<Scaled>(s, from, d, to, double(f));
+    else
+        tile_image64<T, Scaled>(s, from, d, to, f);
+}
+
+// by_tiles on lanes: one tile of a pair is copied aside first, since each
+// must be read in full before the other's image lands on it.
+template <class T, size_t W, bool Scaled>
+VLX_TILE512 void by_tiles_lanes(T* x, int32_t m, T f) {
+    const int32_t mid_bits = m - 6;
+    const size_t row = (W * sizeof(T)) << (m - 3);  // bytes from one row to the next
+    const size_t tile_row = 8 * W * sizeof(T);
+    alignas(64) T buffer[64 * W];
+    for (size_t mid = 0; mid < (size_t(1) << mid_bits); ++mid) {
+        const size_t image = reverse_bits(uint32_t(mid), mid_bits);
+        if (image < mid) continue;
+        T* tile = x + W * (mid << 3);
+        T* other = x + W * (image << 3);
+        if (image == mid) {
+            tile_image<T, W, Scaled>(tile, row, tile, row, f);
+            continue;
+        }
+        auto* to = reinterpret_cast<char*>(buffer);
+        const auto* from = reinterpret_cast<const char*>(tile);
+        for (size_t i = 0; i < 8; ++i) std::memcpy(to + i * tile_row, from + i * row, tile_row);
+        tile_image<T, W, Scaled>(other, row, tile, row, f);
+        tile_image<T, W, Scaled>(buffer, tile_row, other, row, f);
+    }
+}
+#undef VLX_TILE512
+#endif
+
 template <class T, size_t W, bool Scaled>
 void reorder(T* x, int32_t m, const uint32_t* swaps, const uint32_t* fixed, T f) {
+#ifdef VLX_FFT_AVX
+    if constexpr (tile_lanes<T, W>) {
+        if (m >= 6 && fft_simd::lanes() == 2) return by_tiles_lanes<T, W, Scaled>(x, m, f);
+    }
+#endif
     if (m >= 6)
         by_tiles<T, W, Scaled>(x, m, f);
     else
