@@ -86,31 +86,70 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
     }
 }
 
-// A block of len points with everything below it, stage by stage as the
-// levels walk them within the block (its tree is that of a transform of len
-// points).  Each stage's stores are then long done when the next stage loads
-// them as vectors.
+// The subtrees of 8 points or fewer of a block, whole: the two-point
+// butterflies on real parts and the blocks of h = 1 and 2 (table-free), in
+// the order the stages give them, with the values in registers.
+template <VlxVector V>
+void real_leaves(real_t<V>* x, int64_t p, int64_t len) {
+    using T = real_t<V>;
+    T* e = x + 2 * p;
+    if (len == 8) {
+        const T r0 = e[0], r1 = e[2], r2 = e[4], r3 = e[6];
+        const T r4 = e[8], r5 = e[10], r6 = e[12], r7 = e[14];
+        const T a0 = r0 + r1, a1 = r0 - r1;  // two-point butterflies at 0, 4, 6
+        const T b0 = r4 + r5, b1 = r4 - r5;
+        const T c0 = r6 + r7, c1 = r6 - r7;
+        const T t = r3 + r2;                 // block of h = 1
+        const T x0 = a0 + t, i1 = r3 - r2;
+        e[4] = a0 - t;
+        const T t2 = c0 + b0;                // block of h = 2
+        e[0] = x0 + t2;
+        e[8] = x0 - t2;
+        e[5] = c0 - b0;
+        const T r = fft_sqrt_half<V>;
+        const T u = -r * c1;
+        const T v = r * b1;
+        e[2] = a1 + (u + v);
+        e[3] = (u - v) + i1;
+        e[6] = a1 - (u + v);
+        e[7] = (u - v) - i1;
+        e[10] = b1;
+        e[12] = c0;
+        e[14] = c1;
+    } else if (len == 4) {
+        const T r0 = e[0], r1 = e[2], r2 = e[4], r3 = e[6];
+        const T a0 = r0 + r1;
+        const T t = r3 + r2;
+        e[0] = a0 + t;
+        e[2] = r0 - r1;
+        e[3] = r3 - r2;
+        e[4] = a0 - t;
+    } else if (len == 2) {
+        const T a = e[0], b = e[2];
+        e[0] = a + b;
+        e[2] = a - b;
+    } else if (len > 8) {
+        real_leaves<V>(x, p, len / 2);
+        real_leaves<V>(x, p + len / 2, len / 4);
+        real_leaves<V>(x, p + 3 * len / 4, len / 4);
+    }
+}
+
+// A block of len points with everything below it: the leaves, then the
+// stages from h = 4 up as the levels walk them within the block (its tree is
+// that of a transform of len points).  Each stage's stores are then long done
+// when the next stage loads them as vectors.
 template <VlxVector V>
 void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                  int32_t level) {
     using T = real_t<V>;
-    for (int64_t pos = 0, spacing = 4, c = (len + 2) / 4; c > 0; pos = 4 * pos + 6, spacing *= 4, c = (c + 2) / 4) {
-        for (int64_t i = 0, p = p0 + pos; i < c; ++i, p += spacing) {
-            const T a = x[2 * p], b = x[2 * p + 2];
-            x[2 * p] = a + b;
-            x[2 * p + 2] = a - b;
-        }
-    }
-    for (int64_t h = 1; 4 * h <= len; h *= 2) {
-        const T* st = h >= 2 && lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
+    real_leaves<V>(x, p0, len);
+    for (int64_t h = 4; 4 * h <= len; h *= 2) {
+        const T* st = lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
         for (int64_t pos = 0, spacing = 8, c = (len / (4 * h) + 1) / 2; c > 0;
              pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
-            for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) {
-                if (h <= 2)
-                    real_edges<V>(x + 2 * (p0 + p * h), h);
-                else
-                    real_block<V>(x, p0 + p * h, h, tw, n / (4 * h), st, st != nullptr ? level : 0);
-            }
+            for (int64_t i = 0, p = pos; i < c; ++i, p += spacing)
+                real_block<V>(x, p0 + p * h, h, tw, n / (4 * h), st, st != nullptr ? level : 0);
         }
     }
 }
