@@ -88,50 +88,63 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
 
 // The subtrees of 8 points or fewer of a block, whole: the two-point
 // butterflies on real parts and the blocks of h = 1 and 2 (table-free), in
-// the order the stages give them, with the values in registers.
+// the order the stages give them, with the values in registers.  The real
+// samples still stand unspread (sample i at scalar i): a leaf reads its own
+// and writes its points in complex form with the zero imaginary parts that
+// the spread to complex would give them.  Leaves run from the last to the
+// first, so a leaf only overwrites samples whose leaves are done.
 template <VlxVector V>
 void real_leaves(real_t<V>* x, int64_t p, int64_t len) {
     using T = real_t<V>;
+    const T* in = x + p;
     T* e = x + 2 * p;
     if (len == 8) {
-        const T r0 = e[0], r1 = e[2], r2 = e[4], r3 = e[6];
-        const T r4 = e[8], r5 = e[10], r6 = e[12], r7 = e[14];
+        const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
+        const T r4 = in[4], r5 = in[5], r6 = in[6], r7 = in[7];
         const T a0 = r0 + r1, a1 = r0 - r1;  // two-point butterflies at 0, 4, 6
         const T b0 = r4 + r5, b1 = r4 - r5;
         const T c0 = r6 + r7, c1 = r6 - r7;
-        const T t = r3 + r2;                 // block of h = 1
+        const T t = r3 + r2;  // block of h = 1
         const T x0 = a0 + t, i1 = r3 - r2;
-        e[4] = a0 - t;
-        const T t2 = c0 + b0;                // block of h = 2
-        e[0] = x0 + t2;
-        e[8] = x0 - t2;
-        e[5] = c0 - b0;
+        const T t2 = c0 + b0;  // block of h = 2
         const T r = fft_sqrt_half<V>;
         const T u = -r * c1;
         const T v = r * b1;
+        e[0] = x0 + t2;
+        e[1] = 0;
         e[2] = a1 + (u + v);
         e[3] = (u - v) + i1;
+        e[4] = a0 - t;
+        e[5] = c0 - b0;
         e[6] = a1 - (u + v);
         e[7] = (u - v) - i1;
+        e[8] = x0 - t2;
         e[10] = b1;
         e[12] = c0;
         e[14] = c1;
+        e[9] = e[11] = e[13] = e[15] = 0;
     } else if (len == 4) {
-        const T r0 = e[0], r1 = e[2], r2 = e[4], r3 = e[6];
+        const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
         const T a0 = r0 + r1;
         const T t = r3 + r2;
         e[0] = a0 + t;
         e[2] = r0 - r1;
         e[3] = r3 - r2;
         e[4] = a0 - t;
+        e[6] = r3;
+        e[1] = e[5] = e[7] = 0;
     } else if (len == 2) {
-        const T a = e[0], b = e[2];
+        const T a = in[0], b = in[1];
         e[0] = a + b;
         e[2] = a - b;
-    } else if (len > 8) {
-        real_leaves<V>(x, p, len / 2);
-        real_leaves<V>(x, p + len / 2, len / 4);
+        e[1] = e[3] = 0;
+    } else if (len == 1) {
+        e[0] = in[0];
+        e[1] = 0;
+    } else {
         real_leaves<V>(x, p + 3 * len / 4, len / 4);
+        real_leaves<V>(x, p + len / 2, len / 4);
+        real_leaves<V>(x, p, len / 2);
     }
 }
 
@@ -162,12 +175,22 @@ template <VlxVector V>
 void real_tree(real_t<V>* x, int64_t p, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                int32_t level) {
     if (len <= 512) return real_levels<V>(x, p, len, n, tw, lanes, level);
-    real_tree<V>(x, p, len / 2, n, tw, lanes, level);
-    real_tree<V>(x, p + len / 2, len / 4, n, tw, lanes, level);
+    // last to first, for the leaves (see real_leaves)
     real_tree<V>(x, p + 3 * len / 4, len / 4, n, tw, lanes, level);
+    real_tree<V>(x, p + len / 2, len / 4, n, tw, lanes, level);
+    real_tree<V>(x, p, len / 2, n, tw, lanes, level);
     const int64_t h = len / 4;
     real_block<V>(x, p, h, tw, n / len, lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr,
                   lanes != nullptr ? level : 0);
+}
+
+// Real samples to complex points with zero imaginary parts, from the last.
+template <class T>
+void spread(T* x, int64_t n) {
+    for (int64_t i = n - 1; i >= 0; --i) {
+        x[2 * i] = x[i];
+        x[2 * i + 1] = T(0);
+    }
 }
 
 }  // namespace
@@ -175,15 +198,21 @@ void real_tree(real_t<V>* x, int64_t p, int64_t len, int64_t n, const real_t<V>*
 template <VlxVector V>
 int32_t fft_real_forward(V* v) {
     using T = real_t<V>;
-    // Reordered and scaled while still real: half the samples to move.
-    if (bitrev_scale(v) < 0 || rtoc(v) < 0) return -1;
+    // Reordered and scaled while still real: half the samples to move.  Then
+    // complex, as vlxi_rtoc makes it: the spread itself rides on the leaves.
+    if (bitrev_scale(v) < 0) return -1;
+    v->complex = 1;
+    if (realloc(v, v->points, 0) < 0) return -1;
     const int64_t n = v->points;
     TableReader reader;
     const T* tw = nullptr;
     const T* lanes = nullptr;
     const int32_t status = fft_table<V>(v->points, &tw, &lanes);
     reader.release_lock();
-    if (status < 0) return status;
+    if (status < 0) {
+        spread(v->data, n);
+        return status;
+    }
     real_tree<V>(v->data, 0, n, n, tw, lanes, lanes != nullptr ? fft_simd::lanes() : 0);
     v->points = static_cast<int32_t>(n / 2 + 1);
     return 0;
