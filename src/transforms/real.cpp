@@ -53,8 +53,9 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
     int64_t k = 1;
 #ifdef VLX_FFT_AVX
     using namespace fft_simd;
-    if (level == 2) k = lanes512::real_elements_lanes<Avx512<T>>(e, h, st, k);
-    if (level >= 1) k = lanes256::real_elements_lanes<Avx<T>>(e, h, st, k);
+    // (no call where a kernel would find less than one vector of elements)
+    if (level == 2 && h / 2 > int64_t(Avx512<T>::width)) k = lanes512::real_elements_lanes<Avx512<T>>(e, h, st, k);
+    if (level >= 1 && h / 2 - k >= int64_t(Avx<T>::width)) k = lanes256::real_elements_lanes<Avx<T>>(e, h, st, k);
 #else
     (void)st;
     (void)level;
