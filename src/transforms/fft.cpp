@@ -214,76 +214,19 @@ void split_radix(T* x, size_t len, const T* tw, size_t n) {
 }
 
 #ifdef VLX_FFT_AVX
-// Leaves of 4 and 8 complex doubles on AVX-512F: the blocks of quarter length
-// 2 and 1 and the closing two-point butterflies of the leaf, with the points
-// in registers.  Each lane does the scalar operation of its point (sums as
-// a0 + a2, differences as a0 - a2, the same rotation), so the bits are those
-// of l_block and two_point.
-#define VLX_LEAF512 __attribute__((target("avx512f")))
-
-VLX_LEAF512 inline __m512d leaf_pick(__m512d a, long long i0, long long i1, long long i2, long long i3) {
-    // points i0 .. i3 of a
-    return _mm512_permutex2var_pd(
-        a, _mm512_set_epi64(2 * i3 + 1, 2 * i3, 2 * i2 + 1, 2 * i2, 2 * i1 + 1, 2 * i1, 2 * i0 + 1, 2 * i0), a);
-}
-
-// z1 = u - jw and z3 = u + jw forward (the other way round inverse) from
-// u and w broadcast: mask picks the parts that take the difference.
-VLX_LEAF512 inline __m512d leaf_z(__m512d u, __m512d w, __mmask8 minus_parts) {
-    const __m512d ws = _mm512_shuffle_pd(w, w, 0x55);
-    return _mm512_mask_blend_pd(minus_parts, _mm512_add_pd(u, ws), _mm512_sub_pd(u, ws));
-}
-
-// The two-point butterflies (p0, p1) and (p2, p3) of a vector of 4 points.
-VLX_LEAF512 inline __m512d leaf_pairs(__m512d v) {
-    const __m512d vs = leaf_pick(v, 1, 0, 3, 2);
-    return _mm512_mask_blend_pd(0xCC, _mm512_add_pd(v, vs), _mm512_sub_pd(vs, v));
-}
-
-// A block of 4 points (quarter length 1, no rotation), then the two-point
-// butterfly of its first two points.
-template <bool Inverse>
-VLX_LEAF512 inline __m512d leaf4(__m512d a) {
-    const __m512d other = leaf_pick(a, 2, 3, 0, 1);
-    const __m512d sum = _mm512_add_pd(a, other);  // p0 + p2, p1 + p3 in points 0, 1
-    const __m512d dif = _mm512_sub_pd(a, other);  // u, w in points 0, 1
-    const __m512d z = leaf_z(leaf_pick(dif, 0, 0, 0, 0), leaf_pick(dif, 1, 1, 1, 1), Inverse ? 0x90 : 0x60);
-    const __m512d ss = leaf_pick(sum, 1, 0, 1, 0);
-    const __m512d first = _mm512_mask_blend_pd(0x0C, _mm512_add_pd(sum, ss), _mm512_sub_pd(ss, sum));
-    return _mm512_mask_blend_pd(0xF0, first, z);
-}
-
-template <bool Inverse>
-VLX_LEAF512 void leaf4_512(double* x) {
-    _mm512_storeu_pd(x, leaf4<Inverse>(_mm512_loadu_pd(x)));
-}
-
-// c and ab: the rotation triples of the block of quarter length 2, for
-// (z1 at k = 0, 1, z3 at k = 0, 1); k = 0 stays unrotated.
-template <bool Inverse>
-VLX_LEAF512 void leaf8_512(double* x, const double* st) {
-    const __m512d a = _mm512_loadu_pd(x), b = _mm512_loadu_pd(x + 8);
-    const __m512d sum = _mm512_add_pd(a, b);
-    const __m512d dif = _mm512_sub_pd(a, b);  // u at points 0, 1; w at 2, 3
-    const __m512d z = leaf_z(leaf_pick(dif, 0, 1, 0, 1), leaf_pick(dif, 2, 3, 2, 3), Inverse ? 0xA5 : 0x5A);
-    const __m512d first = _mm512_loadu_pd(st), second = _mm512_loadu_pd(st + 8);
-    const __m512d c = _mm512_permutex2var_pd(first, _mm512_set_epi64(11, 10, 9, 8, 3, 2, 1, 0), second);
-    const __m512d ab = _mm512_permutex2var_pd(first, _mm512_set_epi64(15, 14, 13, 12, 7, 6, 5, 4), second);
-    const __m512d rotated = fft_simd::lanes512::rotate_lanes<fft_simd::Avx512<double>, Inverse>(z, c, ab);
-    _mm512_storeu_pd(x, leaf4<Inverse>(sum));
-    _mm512_storeu_pd(x + 8, leaf_pairs(_mm512_mask_blend_pd(0xCC, z, rotated)));
-}
-#undef VLX_LEAF512
-
 // The same walk on vector lanes: each block of quarter length 2 or more goes
 // to the widest kernel that fits it, with the stage's unit-stride lane table.
 template <class T, bool Inverse, bool Wide>
 void split_radix_lanes(T* x, size_t len, const T* tw, const T* lanes, size_t n) {
     using namespace fft_simd;
     if (len <= 8) {
-        if constexpr (Wide && std::is_same_v<T, double>) {
-            if (len == 8) return leaf8_512<Inverse>(x, lanes + lane_offset(n, 2));
-            if (len == 4) return leaf4_512<Inverse>(x);
+        // four points a register: doubles on AVX-512F, floats on AVX
+        if constexpr (std::is_same_v<T, float>) {
+            if (len == 8) return lanes256::leaf8_lanes<Quad<float>, Inverse>(x, lanes + lane_offset(n, 2));
+            if (len == 4) return lanes256::leaf4_lanes<Quad<float>, Inverse>(x);
+        } else if constexpr (Wide) {
+            if (len == 8) return lanes512::leaf8_lanes<Quad<double>, Inverse>(x, lanes + lane_offset(n, 2));
+            if (len == 4) return lanes512::leaf4_lanes<Quad<double>, Inverse>(x);
         }
         if (len == 8) {
             const T* st = lanes + lane_offset(n, 2);

@@ -143,6 +143,57 @@ struct Avx512<float> {
     }
 };
 
+// Four complex points in one register, for the leaves of the transform:
+// doubles in 512 bits, floats in 256.  Named point permutations.
+template <class T>
+struct Quad;
+
+template <>
+struct Quad<double> : Avx512<double> {
+    VLX_AVX512 static reg points(reg a, long long i0, long long i1, long long i2, long long i3) {
+        return _mm512_permutex2var_pd(
+            a, _mm512_set_epi64(2 * i3 + 1, 2 * i3, 2 * i2 + 1, 2 * i2, 2 * i1 + 1, 2 * i1, 2 * i0 + 1, 2 * i0), a);
+    }
+    VLX_AVX512 static reg halves_swapped(reg a) { return points(a, 2, 3, 0, 1); }
+    VLX_AVX512 static reg neighbours_swapped(reg a) { return points(a, 1, 0, 3, 2); }
+    VLX_AVX512 static reg point0(reg a) { return points(a, 0, 0, 0, 0); }
+    VLX_AVX512 static reg point1(reg a) { return points(a, 1, 1, 1, 1); }
+    VLX_AVX512 static reg low_twice(reg a) { return points(a, 0, 1, 0, 1); }
+    VLX_AVX512 static reg high_twice(reg a) { return points(a, 2, 3, 2, 3); }
+    VLX_AVX512 static reg low_reversed_twice(reg a) { return points(a, 1, 0, 1, 0); }
+    template <int Mask>
+    VLX_AVX512 static reg blend(reg a, reg b) { return _mm512_mask_blend_pd(Mask, a, b); }
+    // scalars 0..3 and 8..11 of t, and 4..7 and 12..15
+    VLX_AVX512 static void split_table(const double* t, reg& first, reg& second) {
+        const reg lo = _mm512_loadu_pd(t), hi = _mm512_loadu_pd(t + 8);
+        first = _mm512_permutex2var_pd(lo, _mm512_set_epi64(11, 10, 9, 8, 3, 2, 1, 0), hi);
+        second = _mm512_permutex2var_pd(lo, _mm512_set_epi64(15, 14, 13, 12, 7, 6, 5, 4), hi);
+    }
+};
+
+template <>
+struct Quad<float> : Avx<float> {
+    VLX_AVX static reg halves_swapped(reg a) { return _mm256_permute2f128_ps(a, a, 0x01); }
+    VLX_AVX static reg neighbours_swapped(reg a) { return _mm256_permute_ps(a, 0x4E); }
+    VLX_AVX static reg point0(reg a) {
+        const reg p = _mm256_permute_ps(a, 0x44);
+        return _mm256_permute2f128_ps(p, p, 0x00);
+    }
+    VLX_AVX static reg point1(reg a) {
+        const reg p = _mm256_permute_ps(a, 0xEE);
+        return _mm256_permute2f128_ps(p, p, 0x00);
+    }
+    VLX_AVX static reg low_twice(reg a) { return _mm256_permute2f128_ps(a, a, 0x00); }
+    VLX_AVX static reg high_twice(reg a) { return _mm256_permute2f128_ps(a, a, 0x11); }
+    VLX_AVX static reg low_reversed_twice(reg a) { return low_twice(neighbours_swapped(a)); }
+    template <int Mask>
+    VLX_AVX static reg blend(reg a, reg b) { return _mm256_blend_ps(a, b, Mask); }
+    VLX_AVX static void split_table(const float* t, reg& first, reg& second) {
+        first = _mm256_set_m128(_mm_loadu_ps(t + 8), _mm_loadu_ps(t));
+        second = _mm256_set_m128(_mm_loadu_ps(t + 12), _mm_loadu_ps(t + 4));
+    }
+};
+
 #undef VLX_AVX
 #undef VLX_AVX512
 
