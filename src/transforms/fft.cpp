@@ -219,15 +219,18 @@ void split_radix(T* x, size_t len, const T* tw, size_t n) {
 template <class T, bool Inverse, bool Wide>
 void split_radix_lanes(T* x, size_t len, const T* tw, const T* lanes, size_t n) {
     using namespace fft_simd;
+    // subtrees of up to 32 points with four points a register: doubles on
+    // AVX-512F, floats on AVX
+    if (len <= 32 && len >= 4 && (Wide || std::is_same_v<T, float>) && n >= 32) {
+        const T* st2 = lanes + lane_offset(n, 2);
+        const T* st4 = lanes + lane_offset(n, 4);
+        const T* st8 = lanes + lane_offset(n, 8);
+        if constexpr (std::is_same_v<T, float>)
+            return lanes256::leaf_lanes<Quad<float>, Inverse>(x, len, st2, st4, st8);
+        else if constexpr (Wide)
+            return lanes512::leaf_lanes<Quad<double>, Inverse>(x, len, st2, st4, st8);
+    }
     if (len <= 8) {
-        // four points a register: doubles on AVX-512F, floats on AVX
-        if constexpr (std::is_same_v<T, float>) {
-            if (len == 8) return lanes256::leaf8_lanes<Quad<float>, Inverse>(x, lanes + lane_offset(n, 2));
-            if (len == 4) return lanes256::leaf4_lanes<Quad<float>, Inverse>(x);
-        } else if constexpr (Wide) {
-            if (len == 8) return lanes512::leaf8_lanes<Quad<double>, Inverse>(x, lanes + lane_offset(n, 2));
-            if (len == 4) return lanes512::leaf4_lanes<Quad<double>, Inverse>(x);
-        }
         if (len == 8) {
             const T* st = lanes + lane_offset(n, 2);
             if constexpr (std::is_same_v<T, float>)
