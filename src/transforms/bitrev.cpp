@@ -214,30 +214,9 @@ VLX_TILE512 inline __m512d scaled(__m512d v, T f) {
 template <class T, bool Scaled>
 VLX_TILE512 void tile_image64(const char* src, size_t from, char* dst, size_t to, T f) {
     static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
-    __m512d r[8], t[8], u[8];
+    __m512d r[8], column[8];
     for (size_t c = 0; c < 8; ++c) r[c] = _mm512_loadu_pd(src + r3[c] * from);
-    const __m512i lo = index8(0, 8, 2, 10, 4, 12, 6, 14), hi = index8(1, 9, 3, 11, 5, 13, 7, 15);
-    const __m512i lo2 = index8(0, 1, 8, 9, 4, 5, 12, 13), hi2 = index8(2, 3, 10, 11, 6, 7, 14, 15);
-    const __m512i lo4 = index8(0, 1, 2, 3, 8, 9, 10, 11), hi4 = index8(4, 5, 6, 7, 12, 13, 14, 15);
-    for (size_t i = 0; i < 8; i += 2) {
-        t[i] = pick(r[i], lo, r[i + 1]);
-        t[i + 1] = pick(r[i], hi, r[i + 1]);
-    }
-    for (size_t i = 0; i < 8; i += 4) {
-        u[i] = pick(t[i], lo2, t[i + 2]);          // columns 0 and 4 of these four rows
-        u[i + 1] = pick(t[i], hi2, t[i + 2]);      // 2 and 6
-        u[i + 2] = pick(t[i + 1], lo2, t[i + 3]);  // 1 and 5
-        u[i + 3] = pick(t[i + 1], hi2, t[i + 3]);  // 3 and 7
-    }
-    __m512d column[8];
-    column[0] = pick(u[0], lo4, u[4]);
-    column[4] = pick(u[0], hi4, u[4]);
-    column[2] = pick(u[1], lo4, u[5]);
-    column[6] = pick(u[1], hi4, u[5]);
-    column[1] = pick(u[2], lo4, u[6]);
-    column[5] = pick(u[2], hi4, u[6]);
-    column[3] = pick(u[3], lo4, u[7]);
-    column[7] = pick(u[3], hi4, u[7]);
+    fft_simd::transpose8(r, column);
     for (size_t row = 0; row < 8; ++row) {
         const __m512d v = column[r3[row]];
         _mm512_storeu_pd(dst + row * to, Scaled ? scaled(v, f) : v);

@@ -194,6 +194,37 @@ struct Quad<float> : Avx<float> {
     }
 };
 
+VLX_AVX512 inline __m512i index(long long i0, long long i1, long long i2, long long i3, long long i4, long long i5,
+                                long long i6, long long i7) {
+    return _mm512_set_epi64(i7, i6, i5, i4, i3, i2, i1, i0);
+}
+
+// 8 x 8 transpose of 64-bit elements: rows r[0..7] in, columns out.
+VLX_AVX512 inline void transpose8(const __m512d* r, __m512d* column) {
+    const __m512i lo = index(0, 8, 2, 10, 4, 12, 6, 14), hi = index(1, 9, 3, 11, 5, 13, 7, 15);
+    const __m512i lo2 = index(0, 1, 8, 9, 4, 5, 12, 13), hi2 = index(2, 3, 10, 11, 6, 7, 14, 15);
+    const __m512i lo4 = index(0, 1, 2, 3, 8, 9, 10, 11), hi4 = index(4, 5, 6, 7, 12, 13, 14, 15);
+    __m512d t[8], u[8];
+    for (int i = 0; i < 8; i += 2) {
+        t[i] = _mm512_permutex2var_pd(r[i], lo, r[i + 1]);
+        t[i + 1] = _mm512_permutex2var_pd(r[i], hi, r[i + 1]);
+    }
+    for (int i = 0; i < 8; i += 4) {
+        u[i] = _mm512_permutex2var_pd(t[i], lo2, t[i + 2]);          // columns 0 and 4 of these four rows
+        u[i + 1] = _mm512_permutex2var_pd(t[i], hi2, t[i + 2]);      // 2 and 6
+        u[i + 2] = _mm512_permutex2var_pd(t[i + 1], lo2, t[i + 3]);  // 1 and 5
+        u[i + 3] = _mm512_permutex2var_pd(t[i + 1], hi2, t[i + 3]);  // 3 and 7
+    }
+    column[0] = _mm512_permutex2var_pd(u[0], lo4, u[4]);
+    column[4] = _mm512_permutex2var_pd(u[0], hi4, u[4]);
+    column[2] = _mm512_permutex2var_pd(u[1], lo4, u[5]);
+    column[6] = _mm512_permutex2var_pd(u[1], hi4, u[5]);
+    column[1] = _mm512_permutex2var_pd(u[2], lo4, u[6]);
+    column[5] = _mm512_permutex2var_pd(u[2], hi4, u[6]);
+    column[3] = _mm512_permutex2var_pd(u[3], lo4, u[7]);
+    column[7] = _mm512_permutex2var_pd(u[3], hi4, u[7]);
+}
+
 #undef VLX_AVX
 #undef VLX_AVX512
 
