@@ -95,7 +95,7 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
 // the spread to complex would give them.  Leaves run from the last to the
 // first, so a leaf only overwrites samples whose leaves are done.
 template <VlxVector V>
-void real_leaves(real_t<V>* x, int64_t p, int64_t len) {
+inline void real_leaf(real_t<V>* x, int64_t p, int64_t len) {
     using T = real_t<V>;
     const T* in = x + p;
     T* e = x + 2 * p;
@@ -142,10 +142,45 @@ void real_leaves(real_t<V>* x, int64_t p, int64_t len) {
     } else if (len == 1) {
         e[0] = in[0];
         e[1] = 0;
-    } else {
-        real_leaves<V>(x, p + 3 * len / 4, len / 4);
-        real_leaves<V>(x, p + len / 2, len / 4);
-        real_leaves<V>(x, p, len / 2);
+    }
+}
+
+// Where the leaves of a block of 2^j points lie (j = 2 .. 9), last to first:
+// the offset, plus leaf8 for a leaf of 8 points (else 4).  Worked out once,
+// at compile time, so that the leaves need no recursion.
+constexpr uint16_t leaf8 = 0x8000;
+struct LeafPlan {
+    uint16_t at[96];  // 85 for 512 points
+    int32_t count;
+};
+
+constexpr void plan_leaves(LeafPlan& plan, int32_t p, int32_t len) {
+    if (len <= 8) {
+        plan.at[plan.count++] = uint16_t(p | (len == 8 ? leaf8 : 0));
+        return;
+    }
+    plan_leaves(plan, p + 3 * len / 4, len / 4);
+    plan_leaves(plan, p + len / 2, len / 4);
+    plan_leaves(plan, p, len / 2);
+}
+
+constexpr LeafPlan make_plan(int32_t len) {
+    LeafPlan plan{};
+    plan_leaves(plan, 0, len);
+    return plan;
+}
+
+inline constexpr LeafPlan leaf_plans[8] = {make_plan(4),  make_plan(8),  make_plan(16),  make_plan(32),
+                                           make_plan(64), make_plan(128), make_plan(256), make_plan(512)};
+
+inline const LeafPlan& leaf_plan(int64_t len) { return leaf_plans[log2_of(int32_t(len)) - 2]; }
+
+template <VlxVector V>
+void real_leaves(real_t<V>* x, int64_t p0, int64_t len) {
+    const LeafPlan& plan = leaf_plan(len);
+    for (int32_t i = 0; i < plan.count; ++i) {
+        const uint16_t a = plan.at[i];
+        real_leaf<V>(x, p0 + (a & 0x7FFF), (a & leaf8) != 0 ? 8 : 4);
     }
 }
 
