@@ -39,6 +39,36 @@ inline void real_edges(real_t<V>* e, int64_t h) {
     }
 }
 
+// The general element k of a block (0 < k < h/2) with the table pair of k.
+template <VlxVector V>
+inline void real_element(real_t<V>* e, int64_t h, int64_t k, const real_t<V>* pair) {
+    using T = real_t<V>;
+    const T* o1 = e + 4 * h;
+    const T* o3 = e + 6 * h;
+    const int64_t j = 2 * k;
+    T re = o1[j], im = o1[j + 1];
+    T m = (re + im) * pair[0];
+    const T w1r = m + pair[2] * im, w1i = m + pair[1] * re;
+    re = o3[j], im = o3[j + 1];
+    m = (re + im) * pair[3];
+    const T w3r = m + pair[5] * im, w3i = m + pair[4] * re;
+    const T sr = w1r + w3r, si = w1i + w3i;
+    const T dr = w3r - w1r, di = w3i - w1i;
+    T* e1 = e + j;
+    T* e2 = e + 2 * (h - k);
+    const T e1r = e1[0], e1i = e1[1], e2r = e2[0], e2i = e2[1];
+    e1[0] = e1r + sr;
+    e1[1] = e1i + si;
+    T* mirror1 = e + 2 * (2 * h - k);
+    mirror1[0] = e1r - sr;
+    mirror1[1] = si - e1i;
+    e2[0] = e2r + di;
+    e2[1] = dr + e2i;
+    T* mirror2 = e + 2 * (h + k);
+    mirror2[0] = e2r - di;
+    mirror2[1] = dr - e2i;
+}
+
 // One block of n = 4h points at point p: from the half spectra of its even
 // part (p .. p+h), and of its two quarter parts (p+2h .. p+2h+h/2 and
 // p+3h .. p+3h+h/2) to its own half spectrum (p .. p+2h).
@@ -47,8 +77,6 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
                 int32_t level) {
     using T = real_t<V>;
     T* e = x + 2 * p;
-    T* o1 = e + 4 * h;
-    T* o3 = e + 6 * h;
     real_edges<V>(e, h);
     int64_t k = 1;
 #ifdef VLX_FFT_AVX
@@ -60,31 +88,7 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
     (void)st;
     (void)level;
 #endif
-    for (; k < h / 2; ++k) {
-        const T* pair = tw + 6 * k * stride;
-        const int64_t j = 2 * k;
-        T re = o1[j], im = o1[j + 1];
-        T m = (re + im) * pair[0];
-        const T w1r = m + pair[2] * im, w1i = m + pair[1] * re;
-        re = o3[j], im = o3[j + 1];
-        m = (re + im) * pair[3];
-        const T w3r = m + pair[5] * im, w3i = m + pair[4] * re;
-        const T sr = w1r + w3r, si = w1i + w3i;
-        const T dr = w3r - w1r, di = w3i - w1i;
-        T* e1 = e + j;
-        T* e2 = e + 2 * (h - k);
-        const T e1r = e1[0], e1i = e1[1], e2r = e2[0], e2i = e2[1];
-        e1[0] = e1r + sr;
-        e1[1] = e1i + si;
-        T* mirror1 = e + 2 * (2 * h - k);
-        mirror1[0] = e1r - sr;
-        mirror1[1] = si - e1i;
-        e2[0] = e2r + di;
-        e2[1] = dr + e2i;
-        T* mirror2 = e + 2 * (h + k);
-        mirror2[0] = e2r - di;
-        mirror2[1] = dr - e2i;
-    }
+    for (; k < h / 2; ++k) real_element<V>(e, h, k, tw + 6 * k * stride);
 }
 
 // The subtrees of 8 points or fewer of a block, whole: the two-point
@@ -146,17 +150,18 @@ inline void real_leaf(real_t<V>* x, int64_t p, int64_t len) {
 }
 
 // Where the leaves of a block of 2^j points lie (j = 2 .. 9), last to first:
-// the offset, plus leaf8 for a leaf of 8 points (else 4).  Worked out once,
-// at compile time, so that the leaves need no recursion.
-constexpr uint16_t leaf8 = 0x8000;
+// the offset, plus leaf8 for a leaf of 8 points, leaf16 for a subtree of 16
+// (its leaves and its block of h = 4), else a leaf of 4.  Worked out once, at
+// compile time, so that the leaves need no recursion.
+constexpr uint16_t leaf8 = 0x8000, leaf16 = 0x4000, leaf_at = 0x3FFF;
 struct LeafPlan {
     uint16_t at[96];  // 85 for 512 points
     int32_t count;
 };
 
 constexpr void plan_leaves(LeafPlan& plan, int32_t p, int32_t len) {
-    if (len <= 8) {
-        plan.at[plan.count++] = uint16_t(p | (len == 8 ? leaf8 : 0));
+    if (len <= 16) {
+        plan.at[plan.count++] = uint16_t(p | (len == 16 ? leaf16 : len == 8 ? leaf8 : 0));
         return;
     }
     plan_leaves(plan, p + 3 * len / 4, len / 4);
@@ -175,25 +180,37 @@ inline constexpr LeafPlan leaf_plans[8] = {make_plan(4),  make_plan(8),  make_pl
 
 inline const LeafPlan& leaf_plan(int64_t len) { return leaf_plans[log2_of(int32_t(len)) - 2]; }
 
+// The leaves of the plan; a subtree of 16 also runs its block of h = 4 (one
+// general element, pair stride of it), with its leaves last to first.
 template <VlxVector V>
-void real_leaves(real_t<V>* x, int64_t p0, int64_t len) {
+void real_leaves(real_t<V>* x, int64_t p0, int64_t len, const real_t<V>* tw, int64_t n) {
     const LeafPlan& plan = leaf_plan(len);
+    const real_t<V>* pair = tw + 6 * (n / 16);
     for (int32_t i = 0; i < plan.count; ++i) {
         const uint16_t a = plan.at[i];
-        real_leaf<V>(x, p0 + (a & 0x7FFF), (a & leaf8) != 0 ? 8 : 4);
+        const int64_t p = p0 + (a & leaf_at);
+        if ((a & leaf16) != 0) {
+            real_leaf<V>(x, p + 12, 4);
+            real_leaf<V>(x, p + 8, 4);
+            real_leaf<V>(x, p, 8);
+            real_edges<V>(x + 2 * p, 4);
+            real_element<V>(x + 2 * p, 4, 1, pair);
+        } else {
+            real_leaf<V>(x, p, (a & leaf8) != 0 ? 8 : 4);
+        }
     }
 }
 
 // A block of len points with everything below it: the leaves, then the
-// stages from h = 4 up as the levels walk them within the block (its tree is
+// stages from h = 8 up as the levels walk them within the block (its tree is
 // that of a transform of len points).  Each stage's stores are then long done
 // when the next stage loads them as vectors.
 template <VlxVector V>
 void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                  int32_t level) {
     using T = real_t<V>;
-    real_leaves<V>(x, p0, len);
-    for (int64_t h = 4; 4 * h <= len; h *= 2) {
+    real_leaves<V>(x, p0, len, tw, n);
+    for (int64_t h = 8; 4 * h <= len; h *= 2) {
         const T* st = lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
         for (int64_t pos = 0, spacing = 8, c = (len / (4 * h) + 1) / 2; c > 0;
              pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
