@@ -220,15 +220,18 @@ template <class T, bool Inverse, bool Wide>
 void split_radix_lanes(T* x, size_t len, const T* tw, const T* lanes, size_t n) {
     using namespace fft_simd;
     // subtrees of up to 32 points with four points a register: doubles on
-    // AVX-512F, floats on AVX
+    // AVX-512F, floats on AVX (their block of quarter length 8 on AVX-512F
+    // where it is there)
     if (len <= 32 && len >= 4 && (Wide || std::is_same_v<T, float>) && n >= 32) {
         const T* st2 = lanes + lane_offset(n, 2);
         const T* st4 = lanes + lane_offset(n, 4);
         const T* st8 = lanes + lane_offset(n, 8);
-        if constexpr (std::is_same_v<T, float>)
-            return lanes256::leaf_lanes<Quad<float>, Inverse>(x, len, st2, st4, st8);
+        if constexpr (std::is_same_v<T, float> && Wide)
+            return lanes512::leaf_lanes<Quad<float>, Avx512<float>, Inverse>(x, len, st2, st4, st8);
+        else if constexpr (std::is_same_v<T, float>)
+            return lanes256::leaf_lanes<Quad<float>, Quad<float>, Inverse>(x, len, st2, st4, st8);
         else if constexpr (Wide)
-            return lanes512::leaf_lanes<Quad<double>, Inverse>(x, len, st2, st4, st8);
+            return lanes512::leaf_lanes<Quad<double>, Quad<double>, Inverse>(x, len, st2, st4, st8);
     }
     if (len <= 8) {
         if (len == 8) {
