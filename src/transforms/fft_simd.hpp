@@ -161,6 +161,16 @@ struct Quad<double> : Avx512<double> {
     VLX_AVX512 static reg low_twice(reg a) { return points(a, 0, 1, 0, 1); }
     VLX_AVX512 static reg high_twice(reg a) { return points(a, 2, 3, 2, 3); }
     VLX_AVX512 static reg low_reversed_twice(reg a) { return points(a, 1, 0, 1, 0); }
+    // (points 0, 1 of a, points 0, 1 of b)
+    VLX_AVX512 static reg lows(reg a, reg b) {
+        return _mm512_permutex2var_pd(a, _mm512_set_epi64(11, 10, 9, 8, 3, 2, 1, 0), b);
+    }
+    // (point 0, point 0, point 2, point 2)
+    VLX_AVX512 static reg evens_twice(reg a) { return points(a, 0, 0, 2, 2); }
+    // (point 1, point 1, point 3 swapped, point 3 swapped)
+    VLX_AVX512 static reg odds_twice_high_swapped(reg a) {
+        return _mm512_permutex2var_pd(a, _mm512_set_epi64(6, 7, 6, 7, 3, 2, 3, 2), a);
+    }
     template <int Mask>
     VLX_AVX512 static reg blend(reg a, reg b) { return _mm512_mask_blend_pd(Mask, a, b); }
     // scalars 0..3 and 8..11 of t, and 4..7 and 12..15
@@ -186,6 +196,11 @@ struct Quad<float> : Avx<float> {
     VLX_AVX static reg low_twice(reg a) { return _mm256_permute2f128_ps(a, a, 0x00); }
     VLX_AVX static reg high_twice(reg a) { return _mm256_permute2f128_ps(a, a, 0x11); }
     VLX_AVX static reg low_reversed_twice(reg a) { return low_twice(neighbours_swapped(a)); }
+    VLX_AVX static reg lows(reg a, reg b) { return _mm256_permute2f128_ps(a, b, 0x20); }
+    VLX_AVX static reg evens_twice(reg a) { return _mm256_permute_ps(a, 0x44); }
+    VLX_AVX static reg odds_twice_high_swapped(reg a) {
+        return _mm256_permutevar_ps(a, _mm256_setr_epi32(2, 3, 2, 3, 3, 2, 3, 2));
+    }
     template <int Mask>
     VLX_AVX static reg blend(reg a, reg b) { return _mm256_blend_ps(a, b, Mask); }
     VLX_AVX static void split_table(const float* t, reg& first, reg& second) {
