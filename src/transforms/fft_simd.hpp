@@ -161,6 +161,10 @@ struct Quad<double> : Avx512<double> {
     VLX_AVX512 static reg low_twice(reg a) { return points(a, 0, 1, 0, 1); }
     VLX_AVX512 static reg high_twice(reg a) { return points(a, 2, 3, 2, 3); }
     VLX_AVX512 static reg low_reversed_twice(reg a) { return points(a, 1, 0, 1, 0); }
+    // points 2, 3 twice, real and imaginary parts swapped
+    VLX_AVX512 static reg high_twice_swapped(reg a) {
+        return _mm512_permutex2var_pd(a, _mm512_set_epi64(6, 7, 4, 5, 6, 7, 4, 5), a);
+    }
     // (points 0, 1 of a, points 0, 1 of b)
     VLX_AVX512 static reg lows(reg a, reg b) {
         return _mm512_permutex2var_pd(a, _mm512_set_epi64(11, 10, 9, 8, 3, 2, 1, 0), b);
@@ -196,6 +200,7 @@ struct Quad<float> : Avx<float> {
     VLX_AVX static reg low_twice(reg a) { return _mm256_permute2f128_ps(a, a, 0x00); }
     VLX_AVX static reg high_twice(reg a) { return _mm256_permute2f128_ps(a, a, 0x11); }
     VLX_AVX static reg low_reversed_twice(reg a) { return low_twice(neighbours_swapped(a)); }
+    VLX_AVX static reg high_twice_swapped(reg a) { return swap(high_twice(a)); }
     VLX_AVX static reg lows(reg a, reg b) { return _mm256_permute2f128_ps(a, b, 0x20); }
     VLX_AVX static reg evens_twice(reg a) { return _mm256_permute_ps(a, 0x44); }
     VLX_AVX static reg odds_twice_high_swapped(reg a) {
