@@ -223,7 +223,7 @@ struct Row {
 };
 enum : unsigned {
     kSettledLeak = 1,  // a failed run may leave hook blocks behind, as the library settles
-    kMayRecover = 2,   // a failed allocation need not fail the call (a fallback exists)
+    kRandom = 2,       // results differ from call to call (noise): compared by status only
     kNoHostile = 4,    // not in the hostile sweep (the row's arguments are pointers it cannot spoil)
     kQuadratic = 8,
     kFails = 16,       // the normal call fails by design    // work grows with the square of a length or worse: no 46341-point vectors
@@ -257,5 +257,10 @@ auto twin(D d, F f) {
                },                                                                                      \
                flags}
 #define REL_ROW(prefix, name, ...) REL_ROWF(0u, prefix, name, __VA_ARGS__)
+// A function shared by both families: fn is the same in both bodies.
+#define REL_ROW_SHARED(name, ...)                                                                          \
+    ::rel::Row{#name,                                                                                     \
+               [](::rel::Ctx<vlx_t>& c) -> int { [[maybe_unused]] auto fn = name; __VA_ARGS__ },           \
+               [](::rel::Ctx<vlxf_t>& c) -> int { [[maybe_unused]] auto fn = name; __VA_ARGS__ }, 0u}
 
 }  // namespace rel

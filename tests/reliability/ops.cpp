@@ -120,7 +120,9 @@ const std::vector<Row> table = {
             const int r = fn(c.u(VLX_DFT_KEEP)); REL_TW(, dft_set_flags)(old); return r;),
     REL_ROW(, kmp_set_blocktime, return fn(c.n(0));),
     REL_ROW(, omp_set_num_threads, return fn(c.n(1));),
-    // ---- transforms
+    // ---- transforms (the lane cap is put back after the call)
+    REL_ROW_SHARED(vlx_transform_lanes, const int32_t old = fn(-1); const int32_t r = fn(c.n(0)); fn(old);
+                   return r >= 0 ? 0 : -1;),
     REL_ROW(i, fft, return fn(c.grow(64), c.n(0));),
     REL_ROW(i, fft, return fn(c.io(64, true), c.n(1));),
     REL_ROW(i, bitrev, return fn(c.io(64, true));),
@@ -175,9 +177,9 @@ const std::vector<Row> table = {
     REL_ROW(c, line, return fn(c.bare(32), c.s(0.5), c.s(1));),
     REL_ROW(c, cos, return fn(c.bare(32), c.s(0.1), c.s(0.2));),
     REL_ROW(c, cexp, return fn(c.bare(32, true), c.s(0.1), c.s(0.2));),
-    REL_ROW(c, rand, return fn(c.bare(32), c.n(1));),
-    REL_ROW(c, rand, return fn(c.bare(32, true), c.n(0));),
-    REL_ROW(i, shuffle, return fn(c.io(32, true));),
+    REL_ROWF(kRandom, c, rand, return fn(c.bare(32), c.n(1));),
+    REL_ROWF(kRandom, c, rand, return fn(c.bare(32, true), c.n(0));),
+    REL_ROWF(kRandom, i, shuffle, return fn(c.io(32, true));),
     REL_ROW(c, rsmp, return fn(c.bare(66), c.n(0));),
     REL_ROW(c, rsmp_cos, return fn(c.bare(66), c.vals({8, 0.5, 0.5}, false, Role::coef));),
     REL_ROW(c, rsmp_pcos, return fn(c.bare(66), c.vals({8, 0.5, 0.25, 0.25}, false, Role::coef));),

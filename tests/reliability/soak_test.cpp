@@ -73,11 +73,12 @@ void sort_it(V* v) {
     REL_TW(i, sort)(v);
 }
 
-// Uniform noise lies in [-1, 1): replaced by the count of samples outside.
+// Uniform noise lies in [-1, 1] (a float draw may round up to 1): replaced
+// by the count of samples outside.
 template <class V>
 void count_outside(V* v) {
     int32_t bad = 0;
-    for (int32_t i = 0; i < v->points; ++i) bad += !(v->data[i] >= -1 && v->data[i] < 1);
+    for (int32_t i = 0; i < v->points; ++i) bad += !(v->data[i] >= -1 && v->data[i] <= 1);
     v->points = 1, v->data[0] = decltype(v->data[0] + 0)(bad);
 }
 
