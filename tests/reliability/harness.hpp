@@ -226,7 +226,8 @@ enum : unsigned {
     kRandom = 2,       // results differ from call to call (noise): compared by status only
     kNoHostile = 4,    // not in the hostile sweep (the row's arguments are pointers it cannot spoil)
     kQuadratic = 8,
-    kFails = 16,       // the normal call fails by design    // work grows with the square of a length or worse: no 46341-point vectors
+    kFails = 16,       // the normal call fails by design
+    kCountKept = 32,   // a failed growth leaves the count read so far with no storage (text reader)    // work grows with the square of a length or worse: no 46341-point vectors
 };
 const std::vector<Row>& rows();
 

@@ -283,7 +283,7 @@ const std::vector<Row> table = {
     REL_ROW(f, fwrite2, Sink o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_GNUPLOT));),
     REL_ROWF(kSettledLeak, f, fwrite2, Sink o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_TRACE));),
     REL_ROW(f, fread, Source<V> i(c.in(64, true), VLX_FORMAT_BINARY); return fn(c.out(), i.f) == 1 ? 0 : -1;),
-    REL_ROW(f, fread, Source<V> i(c.in(64), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROWF(kCountKept, f, fread, Source<V> i(c.in(64), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
 };
 
 }  // namespace
