@@ -458,6 +458,62 @@ VLX_API int32_t vlxu_zinter(vlx_t* src, vlx_t* dst, double scale);
 VLX_API int32_t vlxfu_zinter(vlxf_t* src, vlxf_t* dst, float scale);
 
 /* ======================================================================== */
+/* Generators and resampling tables                                         */
+/* ======================================================================== */
+/* The generators fill a vector whose points, delta and complex flag the caller
+ * has set; sample k stands at x = k*delta, so frequencies are in cycles per
+ * unit of x.  points and delta are left as they are. */
+
+/* v[k] = offset + k*delta*slope, by adding delta*slope sample after sample;
+ * a complex v gets zero imaginary parts.  0, or -1 if storage fails. */
+VLX_API int32_t vlxc_line(vlx_t* v, double slope, double offset);
+VLX_API int32_t vlxfc_line(vlxf_t* v, float slope, float offset);
+/* v[k] = cos(2*pi*freq*k*delta + phase), phase in radians, by a rotation
+ * restarted exactly every 256 samples; a complex v gets zero imaginary parts. */
+VLX_API int32_t vlxc_cos(vlx_t* v, double freq, double phase);
+VLX_API int32_t vlxfc_cos(vlxf_t* v, float freq, float phase);
+/* v[k] = exp(j*(2*pi*freq*k*delta + phase)) in a complex v; a real v gets
+ * the cosine (vlxc_cos).  0, or -1 if storage fails. */
+VLX_API int32_t vlxc_cexp(vlx_t* v, double freq, double phase);
+VLX_API int32_t vlxfc_cexp(vlxf_t* v, float freq, float phase);
+
+/* Fills v (points and complex preset) with noise of a kind: 0 uniform in
+ * [-1, 1) (complex: in the unit disc), 1 Gaussian of variance 1 (complex:
+ * each part), 2 exponential of mean 1, 3 Laplace (2 and 3 real only).  Draws
+ * on the C library's rand(), seeded once per family from the machine; each
+ * rand() value counts by its low 15 bits (rand() & 0x7FFF), so a uniform
+ * draw takes 4 calls (60 bits; float: 2 calls, 30 bits).  Holds lock 1 for
+ * the whole fill.  -1 for another kind, kinds 2 and 3 on a complex v (after
+ * sizing it), or if storage fails. */
+VLX_API int32_t vlxc_rand(vlx_t* v, int32_t kind);
+VLX_API int32_t vlxfc_rand(vlxf_t* v, int32_t kind);
+/* Random permutation of the samples in place (complex pairs stay together),
+ * by a Fisher-Yates walk on 31-bit draws of the same generator.  Returns 0. */
+VLX_API int32_t vlxi_shuffle(vlx_t* v);
+VLX_API int32_t vlxfi_shuffle(vlxf_t* v);
+
+/* A resampling table is a real vector of n = T*P + 2 points (n even): T, the
+ * taps per phase, in data[0], then T*P + 1 samples of one low-pass kernel
+ * over P phases, symmetric about data[1 + (n-2)/2], where it peaks.  The
+ * caller presets n (and so P); a design is a real vector of T and shape
+ * coefficients.  n or K below 2: v zero with data[0] = T where both exist. */
+
+/* Expands built-in design 0 to 4 (T = 8, 13, 8, 10, 13) into v.  0; -1 for
+ * another design, an odd n or if storage fails. */
+VLX_API int32_t vlxc_rsmp(vlx_t* v, int32_t design);
+VLX_API int32_t vlxfc_rsmp(vlxf_t* v, int32_t design);
+/* Expands design d = (T, a0, a1, ...) as the cosine sum a0 + a1*cos(theta) +
+ * a2*cos(2*theta) + ..., theta from 0 at the middle to pi at the ends.  -1
+ * for an odd n, a complex d or if storage fails.  A complex v gets the
+ * table as real parts. */
+VLX_API int32_t vlxc_rsmp_cos(vlx_t* v, const vlx_t* d);
+VLX_API int32_t vlxfc_rsmp_cos(vlxf_t* v, const vlxf_t* d);
+/* As vlxc_rsmp_cos, with the shape a polynomial a0 + a1*c + a2*c^2 + ... in
+ * c = cos(theta). */
+VLX_API int32_t vlxc_rsmp_pcos(vlx_t* v, const vlx_t* d);
+VLX_API int32_t vlxfc_rsmp_pcos(vlxf_t* v, const vlxf_t* d);
+
+/* ======================================================================== */
 /* Filters: staging and decimation                                          */
 /* ======================================================================== */
 /* A filter's history `hist` is an optional vector owned by the caller that
