@@ -5,6 +5,7 @@
 #include "streaming/streaming.hpp"
 
 #include "core/precise_math.hpp"
+#include "design/design.hpp"
 #include "elementwise/elementwise.hpp"
 #include "filters/filters.hpp"
 
@@ -105,8 +106,8 @@ int32_t load_set(V* /*v*/, int32_t /*set*/) {
     return -1;
 }
 template <VlxVector V>
-int32_t load_table(V* /*v*/, int32_t /*design*/) {
-    return -1;
+int32_t load_table(V* v, int32_t design) {
+    return rsmp(v, design);
 }
 
 // Brings a history to the stream's sample type and to at least `points`.
