@@ -531,6 +531,44 @@ VLX_API int32_t vlxd_deci(vlx_t* in, vlx_t* out, int32_t factor, vlx_t* hist);
 VLX_API int32_t vlxfd_deci(vlxf_t* in, vlxf_t* out, int32_t factor, vlxf_t* hist);
 
 /* ======================================================================== */
+/* Filters: FIR, symmetric FIR, hwfilt, resampler                           */
+/* ======================================================================== */
+/* Filters keep their delay and give as many points as the input; out may be
+ * in.  hist (may be NULL) carries the last inputs so that blocks fed in turn
+ * continue one stream.  Each returns 0, or -1 on failure. */
+
+/* FIR filter: out[k] = sum of filter[i] * in[k - i] over the filter->points taps, real or complex
+ * source and taps; hist holds the last filter->points - 1 inputs.  Long real filters run a fast
+ * convolution with the filter's spectrum cached.  An empty filter copies in. */
+VLX_API int32_t vlxd_fir(vlx_t* in, vlx_t* out, vlx_t* filter, vlx_t* hist);
+VLX_API int32_t vlxfd_fir(vlxf_t* in, vlxf_t* out, vlxf_t* filter, vlxf_t* hist);
+/* Linear-phase FIR from the first half of its taps: 2m taps, or 2m - 1 with odd non-zero
+ * (filter's last tap the centre); anti non-zero negates the mirrored half.  hist: N - 1 inputs. */
+VLX_API int32_t vlxd_sfir(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd, int32_t anti, vlx_t* hist);
+VLX_API int32_t vlxfd_sfir(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, vlxf_t* hist);
+/* vlxd_sfir then vlxd_deci by factor (below 1 taken as 1); hist holds the N - 1 inputs and, at
+ * point N - 1, the skip count.  out->delta = factor * in->delta. */
+VLX_API int32_t vlxd_sfir_deci(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd, int32_t anti, int32_t factor, vlx_t* hist);
+VLX_API int32_t vlxfd_sfir_deci(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, int32_t factor, vlxf_t* hist);
+/* Fixed low-pass of four power-of-two sections (id 0 only; zeros at 1/3 and 1/2 of the rate,
+ * gain 1 at 0); hist: 12 points of section state.  -1 for another id. */
+VLX_API int32_t vlxd_hwfilt(vlx_t* in, vlx_t* out, int32_t id, vlx_t* hist);
+VLX_API int32_t vlxfd_hwfilt(vlxf_t* in, vlxf_t* out, int32_t id, vlxf_t* hist);
+/* vlxd_hwfilt in place, from silence, with no history kept. */
+VLX_API int32_t vlxi_hwfilt(vlx_t* v, int32_t id);
+VLX_API int32_t vlxfi_hwfilt(vlxf_t* v, int32_t id);
+/* Resamples by ratio (input samples per output, >= 0) with a polyphase table coef (T in
+ * data[0], T * P + 1 entries); method 0 nearest lower phase (real only), 1 interpolated.
+ * out->points preset to the most outputs wanted, set to those made; out->delta = in->delta * ratio;
+ * hist: T + 2 points (window, mu, T + position reached).  coef under 2 points copies in. */
+VLX_API int32_t vlxd_rsmp(vlx_t* in, vlx_t* out, int32_t method, vlx_t* coef, double ratio, vlx_t* hist);
+VLX_API int32_t vlxfd_rsmp(vlxf_t* in, vlxf_t* out, int32_t method, vlxf_t* coef, float ratio, vlxf_t* hist);
+/* vlxd_rsmp with built-in table design 0 to 4 (vlxc_rsmp) made and destroyed in the call; after
+ * a failed run the table is not released. */
+VLX_API int32_t vlxd_rsmp2(vlx_t* in, vlx_t* out, int32_t method, int32_t design, double ratio, vlx_t* hist);
+VLX_API int32_t vlxfd_rsmp2(vlxf_t* in, vlxf_t* out, int32_t method, int32_t design, float ratio, vlxf_t* hist);
+
+/* ======================================================================== */
 /* Streaming and measurement                                                */
 /* ======================================================================== */
 /* The streaming resampler splits a rate ratio (input samples per output

@@ -79,7 +79,7 @@ TYPED_TEST(Random, KindsAndShapesThatFail) {
     v->points = 1;
     ASSERT_EQ(t_rand(&v, 1), 0);  // an odd Gaussian count keeps the first of the pair
     EXPECT_TRUE(std::isfinite(v[0]));
-    EXPECT_EQ(t_rand(&v, 4) | t_rand(&v, -1), -1);
+    EXPECT_EQ(t_rand(&v, 4) & t_rand(&v, -1), -1);
     v->complex = 1, v->points = 3;
     EXPECT_EQ(t_rand(&v, 2) & t_rand(&v, 3), -1);
     EXPECT_EQ(v->points, 3);
