@@ -232,6 +232,146 @@ VLX_API int32_t vlxfi_hilbert(vlxf_t* v);
 
 
 /* ======================================================================== */
+/* Windows                                                                  */
+/* ======================================================================== */
+/* A window is chosen by its id, 0 to 31.  n is the window vector's points;
+ * its centre is index n/2, and the periodic forms take their arguments from n
+ * (a window's period is n).  By default a window is normalised to mean c0
+ * (1.0, a little less for the flat tops 8-13), applied, and rotated so that
+ * its centre lands at index 0. */
+
+#define VLX_WINDOW_UNIFORM                0
+#define VLX_WINDOW_RECTANGULAR            0
+#define VLX_WINDOW_NONE                   0
+#define VLX_WINDOW_P000                   0
+#define VLX_WINDOW_BARTLETT               1
+#define VLX_WINDOW_TRIANGULAR             1
+#define VLX_WINDOW_HANN                   2
+#define VLX_WINDOW_P110                   2
+#define VLX_WINDOW_HAMMING                3
+#define VLX_WINDOW_P100                   3
+#define VLX_WINDOW_BLACKMAN               4
+#define VLX_WINDOW_BLACKMAN_HARRIS3       5
+#define VLX_WINDOW_P200                   5
+#define VLX_WINDOW_BLACKMAN_HARRIS4       6
+#define VLX_WINDOW_P310                   6
+#define VLX_WINDOW_LOWLEAK                6
+#define VLX_WINDOW_GAUSSTOP               7
+#define VLX_WINDOW_P400                   7
+#define VLX_WINDOW_CHEBY5                 7
+#define VLX_WINDOW_FLAT4                  8
+#define VLX_WINDOW_P301                   8
+#define VLX_WINDOW_FLATTOP                9
+#define VLX_WINDOW_FLAT5                  9
+#define VLX_WINDOW_P401                   9
+#define VLX_WINDOW_FLAT6                  10
+#define VLX_WINDOW_P511                   10
+#define VLX_WINDOW_FLAT7                  11
+#define VLX_WINDOW_P611                   11
+#define VLX_WINDOW_P501                   12
+#define VLX_WINDOW_P601                   13
+#define VLX_WINDOW_KAISER70               14
+#define VLX_WINDOW_KAISER80               15
+#define VLX_WINDOW_KAISER90               16
+#define VLX_WINDOW_KAISER100              17
+#define VLX_WINDOW_KAISER110              18
+#define VLX_WINDOW_KAISER120              19
+#define VLX_WINDOW_GAUSS60                20
+#define VLX_WINDOW_GAUSS70                21
+#define VLX_WINDOW_GAUSS80                22
+#define VLX_WINDOW_RIEMANN                23
+#define VLX_WINDOW_SINC_LOBE              23
+#define VLX_WINDOW_TUKEY25                24
+#define VLX_WINDOW_COS_LOBE               25
+#define VLX_WINDOW_RRC                    25
+#define VLX_WINDOW_SQRT_HANN              25
+#define VLX_WINDOW_CHEBY6                 26
+#define VLX_WINDOW_CHEBY7                 27
+#define VLX_WINDOW_CHEBY4                 28
+#define VLX_WINDOW_NUTTALL                28
+#define VLX_WINDOW_BLACKMAN_NUTTALL       28
+#define VLX_WINDOW_ORIG_BLACKMAN_HARRIS4  29
+#define VLX_WINDOW_KAISER89               30
+#define VLX_WINDOW_GAUSS73                31
+
+/* Window flags: one normalisation mode (bits 0-1; 3 is invalid) plus bits. */
+#define VLX_WNORM_MEAN          0  /* mean of the samples is c0 */
+#define VLX_WNORM_RMS           1  /* root mean square of the samples is 1 */
+#define VLX_WNORM_PEAK          2  /* the centre value is 1 */
+#define VLX_WFLAG_SYMMETRIC     4  /* mirror-symmetric form (parametric windows only) */
+#define VLX_WFLAG_WIDTH         8  /* the width argument is in force */
+#define VLX_WFLAG_SWAP_UNIFORM 16  /* rotate after applying id 0 */
+#define VLX_WFLAG_NO_SWAP      32  /* do not rotate after applying any other id */
+
+/* --- catalogue --- */
+
+/* Window id of a name (short or VLX_WINDOW_ style), case-insensitive, whole
+ * string only.  0 when found; -1 otherwise, with *id set to 0 if id is not NULL. */
+VLX_API int32_t vlx_window_from_str(const char* name, int32_t* id);
+VLX_API int32_t vlxf_window_from_str(const char* name, int32_t* id);
+/* Canonical name of id into dst of len bytes (at least 1), cut to len - 1
+ * characters and zero-terminated.  -1 (dst[0] = 0) for an unknown id. */
+VLX_API int32_t vlx_window_to_str(int32_t id, char* dst, int32_t len);
+VLX_API int32_t vlxf_window_to_str(int32_t id, char* dst, int32_t len);
+
+/* --- synthesis and application --- */
+
+/* Multiplies the real or complex v in place by window id with flags; with
+ * VLX_WFLAG_WIDTH a window of width points (real) is centred in v, zeros
+ * around it.  Windows are cached (16 per family) under lock 1.  0 or -1. */
+VLX_API int32_t vlxi_window2(vlx_t* v, int32_t id, int32_t flags, double width);
+VLX_API int32_t vlxfi_window2(vlxf_t* v, int32_t id, int32_t flags, float width);
+/* vlxi_window2 with width 0; -1 if flags has VLX_WFLAG_WIDTH. */
+VLX_API int32_t vlxi_window(vlx_t* v, int32_t id, int32_t flags);
+VLX_API int32_t vlxfi_window(vlxf_t* v, int32_t id, int32_t flags);
+/* Multiplies v by the cosine sum c0 + c1 cos(2 pi i/n) + ... of the real
+ * vector coefs (i counted from the centre), unnormalised, then rotates. */
+VLX_API int32_t vlxi_window_cos(vlx_t* v, vlx_t* coefs);
+VLX_API int32_t vlxfi_window_cos(vlxf_t* v, vlxf_t* coefs);
+
+/* --- parametric windows (no cache; rotated unless VLX_WFLAG_NO_SWAP) --- */
+
+/* Kaiser window of shape beta (limited to 460.5, rms mode 230.3; float 69.1, 34.5). */
+VLX_API int32_t vlxi_window_kaiser(vlx_t* v, double beta, int32_t flags);
+VLX_API int32_t vlxfi_window_kaiser(vlxf_t* v, float beta, int32_t flags);
+/* Gaussian exp(-0.5 (t / (sigma n))^2), t the distance from the centre. */
+VLX_API int32_t vlxi_window_gauss(vlx_t* v, double sigma, int32_t flags);
+VLX_API int32_t vlxfi_window_gauss(vlxf_t* v, float sigma, int32_t flags);
+/* Sinc lobe (sin a / a)^power, a reaching x (radians) at the window's edge;
+ * -1 with VLX_WFLAG_WIDTH. */
+VLX_API int32_t vlxi_window_sinc(vlx_t* v, double x, double power, int32_t flags);
+VLX_API int32_t vlxfi_window_sinc(vlxf_t* v, float x, float power, int32_t flags);
+/* Tukey window: flat middle, cosine taper over the fraction alpha (0 to 1)
+ * of the length; -1 with VLX_WFLAG_WIDTH. */
+VLX_API int32_t vlxi_window_tukey(vlx_t* v, double alpha, int32_t flags);
+VLX_API int32_t vlxfi_window_tukey(vlxf_t* v, float alpha, int32_t flags);
+/* FIR prototype window, peak 1, symmetric, unrotated: id 100 Gaussian of
+ * bandwidth param, 101 Kaiser of transition width param (cycles per sample),
+ * 102 and 103 sinc lobes of bandwidth param; other ids as vlxi_window. */
+VLX_API int32_t vlxi_window_fir(vlx_t* v, int32_t id, double param);
+VLX_API int32_t vlxfi_window_fir(vlxf_t* v, int32_t id, float param);
+
+/* --- metrics (results through out; nothing is cached) --- */
+
+/* Factor from the peak-normalised window to the mode in flags, for points
+ * samples (and width with VLX_WFLAG_WIDTH).  1 for peak mode or points < 1. */
+VLX_API int32_t vlx_window2_scale(double* out, int32_t id, int32_t flags, int32_t points, double width);
+VLX_API int32_t vlxf_window2_scale(float* out, int32_t id, int32_t flags, int32_t points, float width);
+/* vlx_window2_scale with width 0; -1 with VLX_WFLAG_WIDTH. */
+VLX_API int32_t vlx_window_scale(double* out, int32_t id, int32_t flags, int32_t points);
+VLX_API int32_t vlxf_window_scale(float* out, int32_t id, int32_t flags, int32_t points);
+/* Equivalent noise bandwidth in bins of points, of a window of width points. */
+VLX_API int32_t vlx_window2_enbw(double* out, int32_t id, int32_t points, double width);
+VLX_API int32_t vlxf_window2_enbw(float* out, int32_t id, int32_t points, float width);
+/* Equivalent noise bandwidth in bins of a full-length window (Hann: 1.5). */
+VLX_API int32_t vlx_window_enbw(double* out, int32_t id, int32_t points);
+VLX_API int32_t vlxf_window_enbw(float* out, int32_t id, int32_t points);
+/* selector 0: ENBW; 1: 3 dB bandwidth; 2: 6 dB bandwidth, in bins of points
+ * for a window of width points (width <= 0: 1e100, float 1e15). */
+VLX_API int32_t vlx_window_metric(double* out, int32_t selector, int32_t id, int32_t points, double width);
+VLX_API int32_t vlxf_window_metric(float* out, int32_t selector, int32_t id, int32_t points, float width);
+
+/* ======================================================================== */
 /* Element-wise: two-operand operations                                     */
 /* ======================================================================== */
 /* Sources a and b, destination dst, which may be either source.  A real
@@ -875,6 +1015,21 @@ VLX_API int32_t vlxf_ceil_pts(float x);
 /* As vlx_ceil_pts, rounded down. */
 VLX_API int32_t vlx_floor_pts(double x);
 VLX_API int32_t vlxf_floor_pts(float x);
+
+/* --- windows --- */
+
+/* Fills the real w (points set, storage sized) with window id: no
+ * multiplication, no rotation.  0 or -1. */
+VLX_API int32_t vlx_window_synth(vlx_t* w, int32_t id, int32_t flags, double width);
+VLX_API int32_t vlxf_window_synth(vlxf_t* w, int32_t id, int32_t flags, float width);
+/* Fills w with the cosine sum of the real coefs, centred at points/2;
+ * flags VLX_WFLAG_WIDTH with width, VLX_WFLAG_SYMMETRIC gives -1. */
+VLX_API int32_t vlx_window_cos_sum(vlx_t* w, vlx_t* coefs, int32_t flags, double width);
+VLX_API int32_t vlxf_window_cos_sum(vlxf_t* w, vlxf_t* coefs, int32_t flags, float width);
+/* (sin a / a)^p; where sin a / a <= 0: itself for p = 1, 1 for p = 0, its
+ * square for p = 2, else 0. */
+VLX_API double vlx_sinc_pow(double a, double p);
+VLX_API float vlxf_sinc_pow(float a, float p);
 
 #ifdef __cplusplus
 }
