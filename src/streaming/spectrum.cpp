@@ -32,7 +32,7 @@ inline bool centred(int32_t window, int32_t flags) {
 // Window flags formed by the pipeline: mean normalisation, and the uniform
 // window rotated too when the origin is to be in the middle.
 inline int32_t window_flags(int32_t flags) {
-    return has(flags, VLX_SPEC_SUM | VLX_SPEC_CENTRED) ? VLX_WFLAG_SWAP_UNIFORM : 0;
+    return has(flags, VLX_SPEC_SUM | VLX_SPEC_CENTRED) ? wflag_swap_uniform : 0;
 }
 
 // The closing scale of both inverse paths: 1/points for a plain sum, else the
@@ -96,7 +96,7 @@ int32_t fft_forward_path(V* in, V* out, int32_t length, real_t<V> f, int32_t win
     if (subvec(in, out, 0, ceil_pts<V>(rec)) < 0) return -1;
     if (!has(flags, VLX_SPEC_RAW)) {
         if (!has(flags, VLX_SPEC_NO_WINDOW)) {
-            if (window2(out, window, VLX_WFLAG_WIDTH | window_flags(flags), rec) < 0) return -1;
+            if (window2(out, window, wflag_width | window_flags(flags), rec) < 0) return -1;
         } else if (window > 0 || has(flags, VLX_SPEC_SUM | VLX_SPEC_CENTRED)) {
             if (swap_halves2(out) < 0) return -1;
         }
