@@ -256,9 +256,10 @@ int32_t rsmp_state_alloc(rsmp_coef_t<V>* coef, rsmp_state_t<V>* state, int32_t c
     }
     int32_t r = shape_history(&state->pre_hist, complex, np - 1 > 0 ? np - 1 : 0);
     if (r != 0) return r;
-    int32_t taps = 0;
-    if (coef->table.points > 0) taps = static_cast<int32_t>(coef->table.data[0] + T(0.5));
-    r = shape_history(&state->rsmp_hist, complex, taps + 2);
+    // the window, mu and position of the polyphase stage; none without a table
+    int32_t window = 0;
+    if (coef->table.points > 0) window = static_cast<int32_t>(coef->table.data[0] + T(0.5)) + 2;
+    r = shape_history(&state->rsmp_hist, complex, window);
     if (r != 0) return r;
     return shape_history(&state->post_hist, complex, nh);
 }
