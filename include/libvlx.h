@@ -372,6 +372,24 @@ VLX_API int32_t vlx_window_metric(double* out, int32_t selector, int32_t id, int
 VLX_API int32_t vlxf_window_metric(float* out, int32_t selector, int32_t id, int32_t points, float width);
 
 /* ======================================================================== */
+/* Generators and filter design: FIR design                                 */
+/* ======================================================================== */
+
+/* Impulse response of type into v, whose points the caller sets (complex v:
+ * the same taps, imaginary parts 0); frequencies in cycles per sample.
+ * 0 band pass (arg1 centre, arg2 width), 1 band stop (same, odd points),
+ * 2 high pass (arg1 cut, odd points), 3 low pass (arg1 cut), 4 window-shaped
+ * smoother (arg1 shape, 0 default), 5 low pass with delay arg2 samples,
+ * 6 differentiator, 7 Gaussian (arg1 bandwidth), 8 Hilbert transformer
+ * (arg1 band edge), 9 sinhc smoother (arg1 shape), 10 ramp |f|.  4, 5, 7, 9
+ * sum to 1; the others are unwindowed.  0, or -1 (type above 10, no memory). */
+VLX_API int32_t vlxc_fir(vlx_t* v, int32_t type, double arg1, double arg2);
+VLX_API int32_t vlxfc_fir(vlxf_t* v, int32_t type, float arg1, float arg2);
+/* Fixed half-filter set 100 to 104 into v (12, 20, 5, 38 or 61 points). */
+VLX_API int32_t vlxc_fir2(vlx_t* v, int32_t set);
+VLX_API int32_t vlxfc_fir2(vlxf_t* v, int32_t set);
+
+/* ======================================================================== */
 /* Element-wise: two-operand operations                                     */
 /* ======================================================================== */
 /* Sources a and b, destination dst, which may be either source.  A real

@@ -326,9 +326,34 @@ struct WindowCacheState {
 template <VlxVector V>
 WindowCacheState<V> window_cache;
 
-// Search, claim and fill, and the multiplication; runs under lock 1.
+// x times the window w, halves exchanged: x[i] = x[i+h] w[i+h] and x[i+h] =
+// x[i] w[i]; each complex pair is scaled by the real window.
+template <class T>
+void multiply_swapping(T* __restrict x, const T* __restrict w, int64_t h, bool is_complex) {
+    if (!is_complex) {
+        for (int64_t i = 0; i < h; ++i) {
+            const T lo = x[i] * w[i];
+            const T hi = x[i + h] * w[i + h];
+            x[i] = hi;
+            x[i + h] = lo;
+        }
+        return;
+    }
+    for (int64_t i = 0; i < h; ++i) {
+        const T lo_re = x[2 * i] * w[i], lo_im = x[2 * i + 1] * w[i];
+        const T hi_re = x[2 * (i + h)] * w[i + h], hi_im = x[2 * (i + h) + 1] * w[i + h];
+        x[2 * i] = hi_re;
+        x[2 * i + 1] = hi_im;
+        x[2 * (i + h)] = lo_re;
+        x[2 * (i + h) + 1] = lo_im;
+    }
+}
+
+// Search, claim and fill, and the multiplication; runs under lock 1.  On
+// entry *rotate_now says whether the result is to be rotated; it comes back
+// true if the rotation is still to be done.
 template <VlxVector V>
-int32_t window2_locked(V* v, int32_t id, int32_t flags, real_t<V> width) {
+int32_t window2_locked(V* v, int32_t id, int32_t flags, real_t<V> width, bool* rotate_now) {
     WindowCacheState<V>& state = window_cache<V>;
     const int32_t key = flags & wflag_key_mask;
     const bool has_width = (flags & wflag_width) != 0;
@@ -368,6 +393,14 @@ int32_t window2_locked(V* v, int32_t id, int32_t flags, real_t<V> width) {
         if (window_synth(&entry->window, id, flags, width) != 0) return -1;
     }
     entry->window.delta = v->delta;
+    if (*rotate_now && v->points >= 2 && v->points % 2 == 0) {
+        // An even rotation is an exchange of halves, so it rides along with
+        // the multiplication: the same products, moved in one pass.
+        if (prepare_dest(v, &entry->window, v) < 0) return -1;
+        multiply_swapping(v->data, entry->window.data, v->points / 2, v->complex != 0);
+        *rotate_now = false;
+        return 0;
+    }
     return mul(v, &entry->window, v);
 }
 
@@ -501,15 +534,17 @@ int32_t window2(V* v, int32_t id, int32_t flags, real_t<V> width) {
         if (flags & wflag_swap_uniform) return swap_halves2(v) != 0 ? -1 : 0;
         return 0;
     }
+    // The uniform window stays unrotated unless asked, every other window is
+    // rotated unless told not to.
+    bool rotate_now = id == 0 ? (flags & wflag_swap_uniform) != 0 : !(flags & wflag_no_swap);
     int32_t st;
     {
         // Both families' caches and the multiplication: an entry can be
         // overwritten by the next caller as soon as the lock is free.
         LockGuard lock(1);
-        st = window2_locked(v, id, flags, width);
+        st = window2_locked(v, id, flags, width, &rotate_now);
     }
-    if (st < 0) return st;
-    if (id == 0 ? !(flags & wflag_swap_uniform) : (flags & wflag_no_swap) != 0) return st;
+    if (st < 0 || !rotate_now) return st;
     return swap_halves2(v) != 0 ? -1 : 0;
 }
 
