@@ -652,12 +652,14 @@ VLX_API int32_t vlxfi_shuffle(vlxf_t* v);
 
 /* A resampling table is a real vector of n = T*P + 2 points (n even): T, the
  * taps per phase, in data[0], then T*P + 1 samples of one low-pass kernel
- * over P phases, symmetric about data[1 + (n-2)/2], where it peaks.  The
+ * over P phases, symmetric about the middle entry data[1 + (n-2)/2].  The
  * caller presets n (and so P); a design is a real vector of T and shape
- * coefficients.  n or K below 2: v zero with data[0] = T where both exist. */
+ * coefficients.  n below 2 or a design of fewer than 2 scalars: 0, v zero
+ * with data[0] = T where both have a first scalar. */
 
-/* Expands built-in design 0 to 4 (T = 8, 13, 8, 10, 13) into v.  0; -1 for
- * another design, an odd n or if storage fails. */
+/* Expands built-in design 0 to 4 (T = 8, 13, 8, 10, 13) into v, a kernel
+ * that peaks in the middle.  0; -1 for another design, an odd n or if
+ * storage fails. */
 VLX_API int32_t vlxc_rsmp(vlx_t* v, int32_t design);
 VLX_API int32_t vlxfc_rsmp(vlxf_t* v, int32_t design);
 /* Expands design d = (T, a0, a1, ...) as the cosine sum a0 + a1*cos(theta) +
