@@ -16,6 +16,11 @@
 #include <type_traits>
 
 namespace vlx {
+
+// The fixed half filters of the FIR design (vlxc_fir2), defined with it.
+template <VlxVector V>
+int32_t fir_design_set(V* v, int32_t set);
+
 namespace {
 
 // Remainder ratios at or above this use the shorter interpolation filter.
@@ -102,8 +107,8 @@ bool wide_interp(real_t<V> r) {
 
 // The fixed sets and the polyphase table come from the design layer.
 template <VlxVector V>
-int32_t load_set(V* /*v*/, int32_t /*set*/) {
-    return -1;
+int32_t load_set(V* v, int32_t set) {
+    return fir_design_set(v, set);
 }
 template <VlxVector V>
 int32_t load_table(V* v, int32_t design) {
