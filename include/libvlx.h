@@ -809,10 +809,10 @@ VLX_API int32_t vlxfh_rsmp_coef_destroy(vlxfh_rsmp_coef_t* coef);
 /* Zeroes a state object and inits its vectors.  NULL state: 0. */
 VLX_API int32_t vlxh_rsmp_state_init(vlxh_rsmp_state_t* state);
 VLX_API int32_t vlxfh_rsmp_state_init(vlxfh_rsmp_state_t* state);
-/* Sizes the histories for coef and a real (complex 0) or complex stream,
+/* Sizes the histories for coef and a real (is_complex 0) or complex stream,
  * keeping samples already held.  NULL state: 0. */
-VLX_API int32_t vlxh_rsmp_state_alloc(vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state, int32_t complex);
-VLX_API int32_t vlxfh_rsmp_state_alloc(vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state, int32_t complex);
+VLX_API int32_t vlxh_rsmp_state_alloc(vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state, int32_t is_complex);
+VLX_API int32_t vlxfh_rsmp_state_alloc(vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state, int32_t is_complex);
 /* Clears the histories and arms the start-up discards of coef.  NULL state: 0. */
 VLX_API int32_t vlxh_rsmp_state_reset(vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state);
 VLX_API int32_t vlxfh_rsmp_state_reset(vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state);
