@@ -244,9 +244,9 @@ void spectrum_table(int reps) {
     for (int32_t i = 0; i < n; ++i) window[i] = T(1 - std::cos(2 * M_PI * i / n));
     constexpr bool dbl = sizeof(T) == 8;
     T* buf = static_cast<T*>(dbl ? (void*)fftw_alloc_real(n) : (void*)fftwf_alloc_real(n));
-    void* spec = dbl ? (void*)fftw_alloc_complex(n / 2 + 1) : (void*)fftwf_alloc_complex(n / 2 + 1);
-    void* plan = dbl ? (void*)fftw_plan_dft_r2c_1d(n, (double*)buf, (fftw_complex*)spec, FFTW_MEASURE)
-                     : (void*)fftwf_plan_dft_r2c_1d(n, (float*)buf, (fftwf_complex*)spec, FFTW_MEASURE);
+    void* bins = dbl ? (void*)fftw_alloc_complex(n / 2 + 1) : (void*)fftwf_alloc_complex(n / 2 + 1);
+    void* plan = dbl ? (void*)fftw_plan_dft_r2c_1d(n, (double*)buf, (fftw_complex*)bins, FFTW_MEASURE)
+                     : (void*)fftwf_plan_dft_r2c_1d(n, (float*)buf, (fftwf_complex*)bins, FFTW_MEASURE);
 #endif
     const int batch = 20;
     for (int r = 0; r < reps; ++r) {
@@ -269,8 +269,8 @@ void spectrum_table(int reps) {
 #ifdef VLX_HAVE_FFTW
     std::printf("vlxh_fft %.1f us, FFTW r2c + window %.1f us, ratio %.2f\n", median(mine) * 1e6, median(theirs) * 1e6,
                 median(ratio));
-    if constexpr (dbl) fftw_destroy_plan((fftw_plan)plan), fftw_free(buf), fftw_free(spec);
-    else fftwf_destroy_plan((fftwf_plan)plan), fftwf_free(buf), fftwf_free(spec);
+    if constexpr (dbl) fftw_destroy_plan((fftw_plan)plan), fftw_free(buf), fftw_free(bins);
+    else fftwf_destroy_plan((fftwf_plan)plan), fftwf_free(buf), fftwf_free(bins);
 #else
     std::printf("vlxh_fft %.1f us (no FFTW)\n", median(mine) * 1e6);
 #endif

@@ -124,18 +124,18 @@ TYPED_TEST(Measuring, SpectrumInverseRestoresWindowedRecord) {
             const bool cx = run & 1, pow2 = run < 2;
             if ((!pow2 && (c.nfft != 0 || c.fraction != 0)) || (pow2 && c.nfft == 0 && (c.n & (c.n - 1)))) continue;
             const auto x = random_values<T>(size_t(c.n * (cx ? 2 : 1)), c.n + c.window);
-            Vec<V> in(x, cx), spec, back;
+            Vec<V> in(x, cx), spectrum, back;
             // complex records always take the two-sided way back
             const int32_t inv = VLX_SPEC_INVERSE | (cx ? VLX_SPEC_TWO_SIDED_IN : 0) | (c.n % 2 ? VLX_SPEC_ODD : 0);
             if (pow2) {
-                ASSERT_EQ(t_fft(in.get(), spec.get(), c.nfft, c.fraction, c.window, c.flags), 0);
-                ASSERT_EQ(t_fft(spec.get(), back.get(), c.nfft, c.fraction, c.window, c.flags | inv), 0);
+                ASSERT_EQ(t_fft(in.get(), spectrum.get(), c.nfft, c.fraction, c.window, c.flags), 0);
+                ASSERT_EQ(t_fft(spectrum.get(), back.get(), c.nfft, c.fraction, c.window, c.flags | inv), 0);
             } else {
-                ASSERT_EQ(t_dft(in.get(), spec.get(), c.window, c.flags), 0);
-                ASSERT_EQ(t_dft(spec.get(), back.get(), c.window, c.flags | inv), 0);
+                ASSERT_EQ(t_dft(in.get(), spectrum.get(), c.window, c.flags), 0);
+                ASSERT_EQ(t_dft(spectrum.get(), back.get(), c.window, c.flags | inv), 0);
             }
             const int32_t len = c.nfft ? c.nfft : c.n, one_sided = !cx && !(c.flags & (two | VLX_SPEC_RAW));
-            EXPECT_EQ(spec->points, pow2 ? (one_sided ? len / 2 + 1 : len) : (one_sided ? c.n / 2 + 1 : c.n));
+            EXPECT_EQ(spectrum->points, pow2 ? (one_sided ? len / 2 + 1 : len) : (one_sided ? c.n / 2 + 1 : c.n));
             // the record the forward path took, windowed as it did but not rotated
             const bool whole = !pow2 || (c.flags & (VLX_SPEC_SUM | VLX_SPEC_CENTRED | VLX_SPEC_RAW));
             const double f = (c.fraction > 0 && c.fraction <= 1 && !whole) ? c.fraction : 1;

@@ -215,13 +215,13 @@ TYPED_TEST(StreamingResampler, MeasurementRoad) {
     const double cascade = gain(&rs.coef.pre_filter, f, true) * gain(&rs.coef.half_filter, f * rs.coef.ratio / 2, true) *
                            gain(&rs.coef.table, f, false, 1, phases);
 
-    Vec<V> record, spec, acc, peak, gauss;
+    Vec<V> record, spectrum, acc, peak, gauss;
     std::vector<double> spread;  // floor's highest bin over its mean after 1, 4, 32 sweeps
     for (int32_t k = 1; k <= sweeps; ++k) {
         record.assign(std::vector<T>(stream.begin() + (k - 1) * n, stream.begin() + k * n), false);
         record->delta = out->delta;
-        ASSERT_EQ(t_fft(record.get(), spec.get(), n, T(1), VLX_WINDOW_FLATTOP, 0) |
-                      t_avg(spec.get(), acc.get(), nullptr, VLX_AVG_LINEAR | VLX_AVG_POWER, k, 0, T(-1), T(0)), 0);
+        ASSERT_EQ(t_fft(record.get(), spectrum.get(), n, T(1), VLX_WINDOW_FLATTOP, 0) |
+                      t_avg(spectrum.get(), acc.get(), nullptr, VLX_AVG_LINEAR | VLX_AVG_POWER, k, 0, T(-1), T(0)), 0);
         if (k == 1) {  // frequency: the log-ratio peak's constant fits this Gaussian
             ASSERT_EQ(t_window_gauss(record.get(), T(1 / (2 * M_PI * std::sqrt(2 * 0.792233201343665))), 0) |
                           t_fft(record.get(), gauss.get(), n, T(1), 0, VLX_SPEC_NO_WINDOW) |
