@@ -232,6 +232,24 @@ VLX_API int32_t vlxfi_hilbert(vlxf_t* v);
 
 
 /* ======================================================================== */
+/* Generators and filter design: FIR design                                 */
+/* ======================================================================== */
+
+/* Impulse response of type into v, whose points the caller sets (complex v:
+ * the same taps, imaginary parts 0); frequencies in cycles per sample.
+ * 0 band pass (arg1 centre, arg2 width), 1 band stop (same, odd points),
+ * 2 high pass (arg1 cut, odd points), 3 low pass (arg1 cut), 4 window-shaped
+ * smoother (arg1 shape, 0 default), 5 low pass with delay arg2 samples,
+ * 6 differentiator, 7 Gaussian (arg1 bandwidth), 8 Hilbert transformer
+ * (arg1 band edge), 9 sinhc smoother (arg1 shape), 10 ramp |f|.  4, 5, 7, 9
+ * sum to 1; the others are unwindowed.  0, or -1 (type above 10, no memory). */
+VLX_API int32_t vlxc_fir(vlx_t* v, int32_t type, double arg1, double arg2);
+VLX_API int32_t vlxfc_fir(vlxf_t* v, int32_t type, float arg1, float arg2);
+/* Fixed half-filter set 100 to 104 into v (12, 20, 5, 38 or 61 points). */
+VLX_API int32_t vlxc_fir2(vlx_t* v, int32_t set);
+VLX_API int32_t vlxfc_fir2(vlxf_t* v, int32_t set);
+
+/* ======================================================================== */
 /* Windows                                                                  */
 /* ======================================================================== */
 /* A window is chosen by its id, 0 to 31.  n is the window vector's points;
@@ -306,7 +324,7 @@ VLX_API int32_t vlxfi_hilbert(vlxf_t* v);
 /* --- catalogue --- */
 
 /* Window id of a name (short or VLX_WINDOW_ style), case-insensitive, whole
- * string only.  0 when found; -1 otherwise, with *id set to 0 if id is not NULL. */
+ * string only.  0 when found; -1 with *id = 0 if none matches; -1 for NULL. */
 VLX_API int32_t vlx_window_from_str(const char* name, int32_t* id);
 VLX_API int32_t vlxf_window_from_str(const char* name, int32_t* id);
 /* Canonical name of id into dst of len bytes (at least 1), cut to len - 1
@@ -370,24 +388,6 @@ VLX_API int32_t vlxf_window_enbw(float* out, int32_t id, int32_t points);
  * for a window of width points (width <= 0: 1e100, float 1e15). */
 VLX_API int32_t vlx_window_metric(double* out, int32_t selector, int32_t id, int32_t points, double width);
 VLX_API int32_t vlxf_window_metric(float* out, int32_t selector, int32_t id, int32_t points, float width);
-
-/* ======================================================================== */
-/* Generators and filter design: FIR design                                 */
-/* ======================================================================== */
-
-/* Impulse response of type into v, whose points the caller sets (complex v:
- * the same taps, imaginary parts 0); frequencies in cycles per sample.
- * 0 band pass (arg1 centre, arg2 width), 1 band stop (same, odd points),
- * 2 high pass (arg1 cut, odd points), 3 low pass (arg1 cut), 4 window-shaped
- * smoother (arg1 shape, 0 default), 5 low pass with delay arg2 samples,
- * 6 differentiator, 7 Gaussian (arg1 bandwidth), 8 Hilbert transformer
- * (arg1 band edge), 9 sinhc smoother (arg1 shape), 10 ramp |f|.  4, 5, 7, 9
- * sum to 1; the others are unwindowed.  0, or -1 (type above 10, no memory). */
-VLX_API int32_t vlxc_fir(vlx_t* v, int32_t type, double arg1, double arg2);
-VLX_API int32_t vlxfc_fir(vlxf_t* v, int32_t type, float arg1, float arg2);
-/* Fixed half-filter set 100 to 104 into v (12, 20, 5, 38 or 61 points). */
-VLX_API int32_t vlxc_fir2(vlx_t* v, int32_t set);
-VLX_API int32_t vlxfc_fir2(vlxf_t* v, int32_t set);
 
 /* ======================================================================== */
 /* Element-wise: two-operand operations                                     */

@@ -147,8 +147,9 @@ inline T cos_sum_at(const T* c, int32_t count, T theta) {
     return s;
 }
 
-// A window narrower than its vector: the even-width rule on the last sample
-// of the high side, then zeros outside.  high_end is h + m.
+// A window narrower than its vector (m pairs written): an even whole width
+// clears w[h+m], so that it occupies exactly that many positions; zeros
+// outside.
 template <VlxVector V>
 void narrow_ends(V* w, real_t<V> width, int64_t m, int64_t m0) {
     using T = real_t<V>;
@@ -226,7 +227,7 @@ int32_t triangle_form(V* w, int32_t flags) {
     return 0;
 }
 
-// 1 / mean or 1 / rms of w by normalisation mode; -1 if the measure fails.
+// The mean (mode 0) or the rms (any other mode) of w; -1 if it fails.
 template <VlxVector V>
 int32_t measure(V* w, int32_t mode, real_t<V>* value) {
     V r;
