@@ -51,8 +51,8 @@ struct HalfFilter {
 // Output k of one real stream (scalars w apart) of the symmetric kernel; x[j]
 // for negative j is hist[N - 1 + j].  Each of the three ranges has its own
 // order of operations, equal to the plain sum only in exact arithmetic.
-template <class T>
-inline T sym_output(const HalfFilter<T>& f, const T* x, const T* hist, int64_t w, int64_t k) {
+template <int64_t w, class T>
+inline T sym_output(const HalfFilter<T>& f, const T* x, const T* hist, int64_t k) {
     const T* h = f.h;
     const int64_t m = f.m, p = f.p;
     T acc = 0;
@@ -89,6 +89,24 @@ inline T sym_output(const HalfFilter<T>& f, const T* x, const T* hist, int64_t w
     return acc;
 }
 
+// Outputs i = 0 .. count-1 at k = first + i * step, of each of the w
+// streams (w a constant, so that the strides fold into the addressing).
+template <int64_t w, class T>
+void sym_outputs(const HalfFilter<T>& f, const T* x, const T* hist, T* y, int64_t count, int64_t first, int64_t step) {
+    for (int64_t c = 0; c < w; ++c)
+        for (int64_t i = 0; i < count; ++i)
+            y[i * w + c] = sym_output<w>(f, x + c, hist != nullptr ? hist + c : nullptr, first + i * step);
+}
+
+template <class T>
+void sym_outputs(const HalfFilter<T>& f, int64_t w, const T* x, const T* hist, T* y, int64_t count, int64_t first,
+                 int64_t step) {
+    if (w == 2)
+        sym_outputs<2>(f, x, hist, y, count, first, step);
+    else
+        sym_outputs<1>(f, x, hist, y, count, first, step);
+}
+
 template <class T>
 HalfFilter<T> half_filter(const T* h, int64_t m, int32_t odd, int32_t anti) {
     const int64_t N = full_taps(m, odd);
@@ -111,9 +129,7 @@ int32_t sym_kernel(V* in, V* out, V* filter, int32_t odd, int32_t anti, V* hist)
     const T* x = in->data;
     const T* past = hist != nullptr ? hist->data : nullptr;
     T* y = out->data;
-    for (int64_t c = 0; c < w; ++c)
-        for (int64_t k = 0; k < n; ++k)
-            y[k * w + c] = sym_output(f, x + c, past != nullptr ? past + c : nullptr, w, k);
+    sym_outputs(f, w, x, past, y, n, 0, 1);
     if (hist != nullptr) push_history(hist->data, x, n, f.N - 1, w);
     return finish_io<V>(out, aliased, saved, 0);
 }
@@ -175,9 +191,7 @@ int32_t deci_kernel(V* in, V* out, V* filter, int32_t odd, int32_t anti, int32_t
     const T* x = in->data;
     const T* past = hist != nullptr ? hist->data : nullptr;
     T* y = out->data;
-    for (int64_t c = 0; c < w; ++c)
-        for (int64_t i = 0; i < plan.count; ++i)
-            y[i * w + c] = sym_output(f, x + c, past != nullptr ? past + c : nullptr, w, skip + i * factor);
+    sym_outputs(f, w, x, past, y, plan.count, skip, factor);
     if (hist != nullptr) push_history(hist->data, x, n, N - 1, w);
     out->points = static_cast<int32_t>(plan.count);
     return finish_io<V>(out, aliased, saved, 0);
