@@ -839,7 +839,8 @@ VLX_API int32_t vlxfh_rsmp_get_settle_pts(float* result, vlxfh_rsmp_coef_t* coef
 /* Pushes one block of the stream through the cascade.  Preset out->points to
  * the most points wanted; on return it holds the points delivered (delta:
  * in's times the ratio).  work (scratch) and state may be NULL (a temporary,
- * no history kept); in and work may share storage with out. */
+ * no history kept); in and work may share storage with out, work being a
+ * vector of its own. */
 VLX_API int32_t vlxh_rsmp(vlx_t* in, vlx_t* out, vlx_t* work, vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state);
 VLX_API int32_t vlxfh_rsmp(vlxf_t* in, vlxf_t* out, vlxf_t* work, vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state);
 
