@@ -27,18 +27,18 @@ int32_t correlate(V* ref, V* sig, V* out, V* work, int32_t m, int32_t halve) {
     ref_view.points = n;
     if (prepare_dest(sig, &ref_view, out) < 0) return -1;
     const T delta = out->delta;
-    const bool complex_domain = out->complex != 0;
 
-    // The first m template points; out keeps the complex flag that the
-    // signal may have given it, a real template spreading with zero
-    // imaginary parts.
+    // The first m template points, copied through a view: out takes the
+    // template's complex flag, so a real template with a complex signal
+    // meets a complex work in the real transform, which refuses it.
     V head = *ref;
     head.points = m;
-    out->points = 0;
-    if (insert_subvec(&head, out, 0, m, 0) < 0) return -1;
+    if (copy(out, &head) < 0) return -1;
     // The length-ratio scaling L/m, with the transforms' 1/L, divides the
     // sums by m.
     if (zpad2(out, length, VLX_PAD_SCALE_RATIO | VLX_PAD_HEAD) < 0) return -1;
+    // out's complex flag chooses the transforms of both, not work's own
+    const bool complex_domain = out->complex != 0;
     if (forward(out, complex_domain) < 0) return -1;
     if (zpad(work, length) < 0) return -1;
     if (forward(work, complex_domain) < 0) return -1;

@@ -66,8 +66,8 @@ TYPED_TEST(Measuring, ModesOverSweeps) {
         }
 }
 
-// Every lag against the direct sum in long double: all four sample-type
-// pairs, power-of-2 and other lengths, every choice of work.
+// Every lag against the direct sum in long double: the sample-type pairs,
+// power-of-2 and other lengths, every choice of work.
 TYPED_TEST(Measuring, CorrelationMatchesDirectSum) {
     using V = TypeParam;
     using T = real_of<V>;
@@ -82,15 +82,17 @@ TYPED_TEST(Measuring, CorrelationMatchesDirectSum) {
             Vec<V> ref(rv, rc), sig(sv, sc), out, work;
             sig->delta = T(0.5), ref->delta = T(1.5);
             V* w = work_kind == 0 ? nullptr : work_kind == 1 ? work.get() : work_kind == 2 ? ref.get() : out.get();
-            ASSERT_EQ(halve ? t_corr(ref.get(), sig.get(), out.get(), w, c.m, 1) : t_bcorr(ref.get(), sig.get(), out.get(), w, c.m), 0);
-            ASSERT_TRUE(has_shape(out.get(), c.n - c.m + 1, (rc || sc) ? 1 : 0, 1.0));
+            const int32_t r = halve ? t_corr(ref.get(), sig.get(), out.get(), w, c.m, 1) : t_bcorr(ref.get(), sig.get(), out.get(), w, c.m);
             EXPECT_EQ(ref.values(), rv);  // work given as ref is not used
+            // a real template makes out real, and the real transform refuses the complex signal
+            if (!rc && sc) { EXPECT_EQ(r, -1); continue; }
+            ASSERT_TRUE(r == 0 && has_shape(out.get(), c.n - c.m + 1, rc ? 1 : 0, 1.0));
             auto at = [](const std::vector<T>& v, bool cx, int i) { return cx ? C(v[2 * i], v[2 * i + 1]) : C(v[i], 0); };
             for (int k = 0; k <= c.n - c.m; ++k) {
                 C sum = 0;
                 for (int j = 0; j < c.m; ++j) sum += std::conj(at(rv, rc, j)) * at(sv, sc, j + k);
                 sum /= c.m * (halve ? 2.0L : 1.0L);
-                const C got = (rc || sc) ? C(out[2 * k], out[2 * k + 1]) : C(out[k], 0);
+                const C got = rc ? C(out[2 * k], out[2 * k + 1]) : C(out[k], 0);
                 const long double tol = 30 * std::numeric_limits<T>::epsilon() * std::log2(2.0 * c.n);
                 EXPECT_TRUE(near(std::abs(got - sum), 0, tol)) << c.n << "/" << c.m << " run " << run << " lag " << k;
             }

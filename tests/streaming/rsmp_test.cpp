@@ -110,9 +110,8 @@ TYPED_TEST(StreamingResampler, PointCountsAgree) {
             }
         int32_t n = 5;
         EXPECT_TRUE(R::in_pts(nullptr, &s.coef, 10, 0) == 0 && R::in_pts(&n, nullptr, 10, 0) == -1 && n == 5);
+        EXPECT_TRUE(ratio != 1.0 || (s.out_pts(-7, 1, 0) == 0 && s.out_pts(13, 1, 0) == 13));  // a copy
     }
-    Stream<TypeParam> one(1, 0);
-    for (int32_t p : {-7, 0, 13}) EXPECT_EQ(one.out_pts(p, 1, 0), std::max(p, 0));
 }
 
 // Blocks of random sizes, each limited to the most it can give, continue one
