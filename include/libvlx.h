@@ -867,7 +867,8 @@ VLX_API int32_t vlxfh_avg(vlxf_t* in, vlxf_t* acc, vlxf_t* work, int32_t mode, i
 /* out[k] = mean over j < lags_pts of conj(ref[j]) * sig[j + k], for each of
  * the sig->points - lags_pts + 1 lags, by one power-of-2 transform length;
  * halved when halve is non-zero.  work: scratch (NULL: a temporary).
- * 0 < lags_pts <= ref->points, sig->points required, else -1. */
+ * 0 < lags_pts <= ref->points, sig->points required, else -1; a real ref
+ * with a complex sig also gives -1 (the transforms follow ref's type). */
 VLX_API int32_t vlxh_corr(vlx_t* ref, vlx_t* sig, vlx_t* out, vlx_t* work, int32_t lags_pts, int32_t halve);
 VLX_API int32_t vlxfh_corr(vlxf_t* ref, vlxf_t* sig, vlxf_t* out, vlxf_t* work, int32_t lags_pts, int32_t halve);
 /* vlxh_corr with halve 0. */
