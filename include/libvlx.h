@@ -879,7 +879,8 @@ VLX_API int32_t vlxfh_rsmp_coef_init(vlxfh_rsmp_coef_t* coef);
 VLX_API int32_t vlxh_rsmp_coef_alloc(vlxh_rsmp_coef_t* coef, int32_t kind);
 VLX_API int32_t vlxfh_rsmp_coef_alloc(vlxfh_rsmp_coef_t* coef, int32_t kind);
 /* Configures a ratio in input samples per output sample (0 or below: 1);
- * forced non-zero runs the polyphase stage even at 1.  reserved must be 0. */
+ * forced non-zero runs the polyphase stage even at 1.  reserved must be 0.
+ * An infinite ratio is refused with -1, nothing stored. */
 VLX_API int32_t vlxh_rsmp_coef_setup(vlxh_rsmp_coef_t* coef, double ratio, int32_t forced, int32_t reserved);
 VLX_API int32_t vlxfh_rsmp_coef_setup(vlxfh_rsmp_coef_t* coef, float ratio, int32_t forced, int32_t reserved);
 /* Destroys the three vectors and zeroes the other fields.  NULL coef: 0. */

@@ -165,11 +165,12 @@ int32_t rsmp_coef_alloc(rsmp_coef_t<V>* coef, int32_t kind) {
 template <VlxVector V>
 int32_t rsmp_coef_setup(rsmp_coef_t<V>* coef, real_t<V> ratio, int32_t forced, int32_t reserved) {
     using T = real_t<V>;
+    // An infinite ratio would halve for ever: refused before anything is stored.
+    if (ratio > std::numeric_limits<T>::max()) return -1;
     T r = ratio;
     if (r <= T(0)) r = T(1);
     int32_t k = 0;
-    // bounded so that an infinite ratio cannot halve for ever
-    while (r >= T(2) && k < 4096) {
+    while (r >= T(2)) {
         r = r * T(0.5);
         ++k;
     }
