@@ -205,8 +205,9 @@ int32_t rsmp_coef_setup(rsmp_coef_t<V>* coef, real_t<V> ratio, int32_t forced, i
         return 0;
     }
     const int32_t c = ceil_pts<V>(T(35) / r);
-    if (k >= 0) coef->skip_out = c + 19;
-    else coef->skip_out = wide_interp<V>(r) ? c + 37 : c + 60;
+    const int32_t extra = k >= 0 ? 19 : wide_interp<V>(r) ? 37 : 60;
+    // A tiny ratio saturates the count as vlx_ceil_pts does, rather than wrap.
+    coef->skip_out = c > std::numeric_limits<int32_t>::max() - extra ? std::numeric_limits<int32_t>::max() : c + extra;
     return 0;
 }
 
@@ -328,7 +329,9 @@ int32_t rsmp_get_in_pts(int32_t* result, rsmp_coef_t<V>* coef, int32_t out_point
     if (k != 0) {
         if (settled && n >= 1) n += coef->skip_mid;
         if (k >= 1) {
-            n = n * s;
+            // saturated: the result is clamped to 32 bits below anyway
+            const int64_t cap = int64_t(1) << 62;
+            n = n > cap / s ? cap : n * s;
             if (settled) n = n < s - 1 ? 0 : n + 1 - s;
         } else {
             n = (n + 1) / 2;

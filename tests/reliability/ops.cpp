@@ -307,7 +307,7 @@ const std::vector<Row> table = {
     REL_ROWF(kSettledLeak, f, fwrite2, Sink o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_TRACE));),
     REL_ROW(f, fread, Source<V> i(c.in(64, true), VLX_FORMAT_BINARY); return fn(c.out(), i.f) == 1 ? 0 : -1;),
     REL_ROWF(kCountKept, f, fread, Source<V> i(c.in(64), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
-    // ---- streaming and measurement level
+    // ---- streaming and measurement level (scratch vectors are never shared: hist())
     REL_ROW(h, rsmp_coef_alloc, decltype(Stream<V>::coef) k; REL_TW(h, rsmp_coef_init)(&k);
             const int r = fn(&k, c.n(0)); REL_TW(h, rsmp_coef_destroy)(&k); return r;),
     REL_ROW(h, rsmp_coef_setup, Stream<V> st(c, 1); return fn(&st.coef, c.s(0.3), c.n(1), c.n(0));),
@@ -317,12 +317,12 @@ const std::vector<Row> table = {
     REL_ROW(h, rsmp_get_out_pts, Stream<V> st(c, 0.3); int32_t n; return fn(&n, &st.coef, c.n(100), c.n(0), c.n(1));),
     REL_ROW(h, rsmp_get_delay_pts, Stream<V> st(c, 2.5); T d; return fn(&d, &st.coef, c.n(1));),
     REL_ROW(h, rsmp_get_settle_pts, Stream<V> st(c, 2.5); T d; return fn(&d, &st.coef, c.n(1));),
-    REL_ROW(h, rsmp, Stream<V> st(c, 2.5); return fn(c.in(256), wanting(c, 100), c.out(), &st.coef, &st.state);),
-    REL_ROW(h, rsmp, Stream<V> st(c, 0.7, true); return fn(c.in(256, true), wanting(c, 400), c.out(), &st.coef, &st.state);),
-    REL_ROW(h, avg, return fn(c.in(64, true), c.out(), c.out(), c.n(VLX_AVG_LINEAR | VLX_AVG_POWER), c.n(1), c.n(2), c.s(-1), c.s(10));),
-    REL_ROW(h, avg, return fn(c.in(64), c.io(64), c.out(), c.n(VLX_AVG_GEOMETRIC | VLX_AVG_LIMITED | VLX_AVG_LOG), c.n(3), c.n(2), c.s(-1), c.s(2));),
-    REL_ROW(h, corr, return fn(c.in(16, true), c.in(64, true), c.out(), c.out(), c.n(16), c.n(1));),
-    REL_ROW(b, corr, return fn(c.in(20), c.in(50), c.out(), c.out(), c.n(12));),
+    REL_ROW(h, rsmp, Stream<V> st(c, 2.5); return fn(c.in(256), wanting(c, 100), c.hist(), &st.coef, &st.state);),
+    REL_ROW(h, rsmp, Stream<V> st(c, 0.7, true); return fn(c.in(256, true), wanting(c, 400), c.hist(), &st.coef, &st.state);),
+    REL_ROW(h, avg, return fn(c.in(64, true), c.out(), c.hist(), c.n(VLX_AVG_LINEAR | VLX_AVG_POWER), c.n(1), c.n(2), c.s(-1), c.s(10));),
+    REL_ROW(h, avg, return fn(c.in(64), c.io(64), c.hist(), c.n(VLX_AVG_GEOMETRIC | VLX_AVG_LIMITED | VLX_AVG_LOG), c.n(3), c.n(2), c.s(-1), c.s(2));),
+    REL_ROW(h, corr, return fn(c.in(16, true), c.in(64, true), c.out(), c.hist(), c.n(16), c.n(1));),
+    REL_ROW(b, corr, return fn(c.in(20), c.in(50), c.out(), c.hist(), c.n(12));),
     REL_ROW(h, dft, return fn(c.in(100), c.out(), c.n(VLX_WINDOW_HANN), c.n(0));),
     REL_ROW(h, dft, return fn(c.in(51, true), c.out(), c.n(VLX_WINDOW_HANN), c.n(VLX_SPEC_INVERSE | VLX_SPEC_ODD));),
     REL_ROW(h, fft, return fn(c.in(100), c.out(), c.n(128), c.s(0.75), c.n(VLX_WINDOW_HANN + 1), c.n(0));),

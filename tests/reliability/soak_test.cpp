@@ -138,6 +138,14 @@ void add_jobs(std::vector<Job>& jobs) {
     jobs.push_back(job<V>("window", 1000, true, [](V* v) { return REL_TW(i, window)(v, VLX_WINDOW_HANN, 0); }));
     jobs.push_back(job<V>("window width", 512, false,
                           [](V* v) { return REL_TW(i, window2)(v, VLX_WINDOW_HANN + 4, VLX_WFLAG_WIDTH, 300); }));
+    jobs.push_back(job<V>("spectrum", 1000, false, [](V* v) {
+        V out;
+        vlxtest::t_init(&out);
+        const int r = REL_TW(h, fft)(v, &out, 1024, 1, VLX_WINDOW_HANN + 2, 0);
+        vlxtest::t_copy(v, &out);
+        vlxtest::t_destroy(&out);
+        return r;
+    }));
     jobs.push_back(job<V>("fir fast", 2048, false, [](V* v) { return filtered(v, 64, false); }));
     jobs.push_back(job<V>("fir fast complex", 1024, true, [](V* v) { return filtered(v, 64, false); }));
     // The fast path keeps one filter key for its real and complex spectra, so
