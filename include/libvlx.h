@@ -166,6 +166,43 @@ VLX_API int32_t vlx_version(void);
 VLX_API int32_t vlxf_version(void);
 
 /* ======================================================================== */
+/* Optional vendor transform binding                                        */
+/* ======================================================================== */
+/* If the DFT module libmkl_rt.so.2 and the OpenMP runtime libiomp5.so can be
+ * loaded (loader search path) at a family's first transform or binding call,
+ * power-of-two vlxi_fft and vlxi_rfft go to them.  Without them every call
+ * below is inert and returns 0.  Each family has its own state.  Binding
+ * sets MKL_DISABLE_FAST_MM=YES and KMP_BLOCKTIME=0 where they are unset. */
+
+/* Bits of the flags word; other bits are stored and returned unused. */
+#define VLX_DFT_BOUND  0x1000 /* both modules loaded; set by binding, kept by vlx_dft_set_flags */
+#define VLX_DFT_FAST   0x2000 /* power-of-two transforms take the modules (on after binding) */
+#define VLX_DFT_KEEP   0x4000 /* keep descriptors between transforms, not freed after each */
+
+/* Binds if first; stores the flags word unless flags is NULL.  Returns 0. */
+VLX_API int32_t vlx_dft_get_flags(uint32_t* flags);
+VLX_API int32_t vlxf_dft_get_flags(uint32_t* flags);
+/* Binds if first; sets the flags word (VLX_DFT_BOUND kept when bound; without
+ * the modules VLX_DFT_BOUND, VLX_DFT_FAST and VLX_DFT_KEEP are cleared).  Returns 0. */
+VLX_API int32_t vlx_dft_set_flags(uint32_t flags);
+VLX_API int32_t vlxf_dft_set_flags(uint32_t flags);
+/* Stores the runtime's block time in ms (0 if the flags word is 0); NULL ms
+ * returns at once, without binding.  Returns 0. */
+VLX_API int32_t vlx_kmp_get_blocktime(int32_t* ms);
+VLX_API int32_t vlxf_kmp_get_blocktime(int32_t* ms);
+/* Binds if first; sets the runtime's block time in ms if the flags word is not 0.  Returns 0. */
+VLX_API int32_t vlx_kmp_set_blocktime(int32_t ms);
+VLX_API int32_t vlxf_kmp_set_blocktime(int32_t ms);
+/* Stores the runtime's maximum thread count (0 if the flags word is 0); NULL n
+ * returns at once, without binding.  Returns 0. */
+VLX_API int32_t vlx_omp_get_max_threads(int32_t* n);
+VLX_API int32_t vlxf_omp_get_max_threads(int32_t* n);
+/* Binds if first; if the flags word is not 0 sets the runtime's thread count
+ * and frees the family's descriptors.  0, or -1 if a descriptor release failed. */
+VLX_API int32_t vlx_omp_set_num_threads(int32_t n);
+VLX_API int32_t vlxf_omp_set_num_threads(int32_t n);
+
+/* ======================================================================== */
 /* Transforms                                                               */
 /* ======================================================================== */
 /* Forward transforms carry 1/N, inverse ones nothing.  After a transform
@@ -230,6 +267,164 @@ VLX_API int32_t vlxfi_analytic(vlxf_t* v);
 VLX_API int32_t vlxi_hilbert(vlx_t* v);
 VLX_API int32_t vlxfi_hilbert(vlxf_t* v);
 
+
+/* ======================================================================== */
+/* Generators and filter design: FIR design                                 */
+/* ======================================================================== */
+
+/* Impulse response of type into v, whose points the caller sets (complex v:
+ * the same taps, imaginary parts 0); frequencies in cycles per sample.
+ * 0 band pass (arg1 centre, arg2 width), 1 band stop (same, odd points),
+ * 2 high pass (arg1 cut, odd points), 3 low pass (arg1 cut), 4 window-shaped
+ * smoother (arg1 shape, 0 default), 5 low pass with delay arg2 samples,
+ * 6 differentiator, 7 Gaussian (arg1 bandwidth), 8 Hilbert transformer
+ * (arg1 band edge), 9 sinhc smoother (arg1 shape), 10 ramp |f|.  4, 5, 7, 9
+ * sum to 1; the others are unwindowed.  0, or -1 (type above 10, no memory). */
+VLX_API int32_t vlxc_fir(vlx_t* v, int32_t type, double arg1, double arg2);
+VLX_API int32_t vlxfc_fir(vlxf_t* v, int32_t type, float arg1, float arg2);
+/* Fixed half-filter set 100 to 104 into v (12, 20, 5, 38 or 61 points). */
+VLX_API int32_t vlxc_fir2(vlx_t* v, int32_t set);
+VLX_API int32_t vlxfc_fir2(vlxf_t* v, int32_t set);
+
+/* ======================================================================== */
+/* Windows                                                                  */
+/* ======================================================================== */
+/* A window is chosen by its id, 0 to 31.  n is the window vector's points;
+ * its centre is index n/2, and the periodic forms take their arguments from n
+ * (a window's period is n).  By default a window is normalised to mean c0
+ * (1.0, a little less for the flat tops 8-13), applied, and rotated so that
+ * its centre lands at index 0. */
+
+#define VLX_WINDOW_UNIFORM                0
+#define VLX_WINDOW_RECTANGULAR            0
+#define VLX_WINDOW_NONE                   0
+#define VLX_WINDOW_P000                   0
+#define VLX_WINDOW_BARTLETT               1
+#define VLX_WINDOW_TRIANGULAR             1
+#define VLX_WINDOW_HANN                   2
+#define VLX_WINDOW_P110                   2
+#define VLX_WINDOW_HAMMING                3
+#define VLX_WINDOW_P100                   3
+#define VLX_WINDOW_BLACKMAN               4
+#define VLX_WINDOW_BLACKMAN_HARRIS3       5
+#define VLX_WINDOW_P200                   5
+#define VLX_WINDOW_BLACKMAN_HARRIS4       6
+#define VLX_WINDOW_P310                   6
+#define VLX_WINDOW_LOWLEAK                6
+#define VLX_WINDOW_GAUSSTOP               7
+#define VLX_WINDOW_P400                   7
+#define VLX_WINDOW_CHEBY5                 7
+#define VLX_WINDOW_FLAT4                  8
+#define VLX_WINDOW_P301                   8
+#define VLX_WINDOW_FLATTOP                9
+#define VLX_WINDOW_FLAT5                  9
+#define VLX_WINDOW_P401                   9
+#define VLX_WINDOW_FLAT6                  10
+#define VLX_WINDOW_P511                   10
+#define VLX_WINDOW_FLAT7                  11
+#define VLX_WINDOW_P611                   11
+#define VLX_WINDOW_P501                   12
+#define VLX_WINDOW_P601                   13
+#define VLX_WINDOW_KAISER70               14
+#define VLX_WINDOW_KAISER80               15
+#define VLX_WINDOW_KAISER90               16
+#define VLX_WINDOW_KAISER100              17
+#define VLX_WINDOW_KAISER110              18
+#define VLX_WINDOW_KAISER120              19
+#define VLX_WINDOW_GAUSS60                20
+#define VLX_WINDOW_GAUSS70                21
+#define VLX_WINDOW_GAUSS80                22
+#define VLX_WINDOW_RIEMANN                23
+#define VLX_WINDOW_SINC_LOBE              23
+#define VLX_WINDOW_TUKEY25                24
+#define VLX_WINDOW_COS_LOBE               25
+#define VLX_WINDOW_RRC                    25
+#define VLX_WINDOW_SQRT_HANN              25
+#define VLX_WINDOW_CHEBY6                 26
+#define VLX_WINDOW_CHEBY7                 27
+#define VLX_WINDOW_CHEBY4                 28
+#define VLX_WINDOW_NUTTALL                28
+#define VLX_WINDOW_BLACKMAN_NUTTALL       28
+#define VLX_WINDOW_ORIG_BLACKMAN_HARRIS4  29
+#define VLX_WINDOW_KAISER89               30
+#define VLX_WINDOW_GAUSS73                31
+
+/* Window flags: one normalisation mode (bits 0-1; 3 is invalid) plus bits. */
+#define VLX_WNORM_MEAN          0  /* mean of the samples is c0 */
+#define VLX_WNORM_RMS           1  /* root mean square of the samples is 1 */
+#define VLX_WNORM_PEAK          2  /* the centre value is 1 */
+#define VLX_WFLAG_SYMMETRIC     4  /* mirror-symmetric form (parametric windows only) */
+#define VLX_WFLAG_WIDTH         8  /* the width argument is in force */
+#define VLX_WFLAG_SWAP_UNIFORM 16  /* rotate after applying id 0 */
+#define VLX_WFLAG_NO_SWAP      32  /* do not rotate after applying any other id */
+
+/* --- catalogue --- */
+
+/* Window id of a name (short or VLX_WINDOW_ style), case-insensitive, whole
+ * string only.  0 when found; -1 with *id = 0 if none matches; -1 for NULL. */
+VLX_API int32_t vlx_window_from_str(const char* name, int32_t* id);
+VLX_API int32_t vlxf_window_from_str(const char* name, int32_t* id);
+/* Canonical name of id into dst of len bytes (at least 1), cut to len - 1
+ * characters and zero-terminated.  -1 (dst[0] = 0) for an unknown id. */
+VLX_API int32_t vlx_window_to_str(int32_t id, char* dst, int32_t len);
+VLX_API int32_t vlxf_window_to_str(int32_t id, char* dst, int32_t len);
+
+/* --- synthesis and application --- */
+
+/* Multiplies the real or complex v in place by window id with flags; with
+ * VLX_WFLAG_WIDTH a window of width points (real) is centred in v, zeros
+ * around it.  Windows are cached (16 per family) under lock 1.  0 or -1. */
+VLX_API int32_t vlxi_window2(vlx_t* v, int32_t id, int32_t flags, double width);
+VLX_API int32_t vlxfi_window2(vlxf_t* v, int32_t id, int32_t flags, float width);
+/* vlxi_window2 with width 0; -1 if flags has VLX_WFLAG_WIDTH. */
+VLX_API int32_t vlxi_window(vlx_t* v, int32_t id, int32_t flags);
+VLX_API int32_t vlxfi_window(vlxf_t* v, int32_t id, int32_t flags);
+/* Multiplies v by the cosine sum c0 + c1 cos(2 pi i/n) + ... of the real
+ * vector coefs (i counted from the centre), unnormalised, then rotates. */
+VLX_API int32_t vlxi_window_cos(vlx_t* v, vlx_t* coefs);
+VLX_API int32_t vlxfi_window_cos(vlxf_t* v, vlxf_t* coefs);
+
+/* --- parametric windows (no cache; rotated unless VLX_WFLAG_NO_SWAP) --- */
+
+/* Kaiser window of shape beta (limited to 460.5, rms mode 230.3; float 69.1, 34.5). */
+VLX_API int32_t vlxi_window_kaiser(vlx_t* v, double beta, int32_t flags);
+VLX_API int32_t vlxfi_window_kaiser(vlxf_t* v, float beta, int32_t flags);
+/* Gaussian exp(-0.5 (t / (sigma n))^2), t the distance from the centre. */
+VLX_API int32_t vlxi_window_gauss(vlx_t* v, double sigma, int32_t flags);
+VLX_API int32_t vlxfi_window_gauss(vlxf_t* v, float sigma, int32_t flags);
+/* Sinc lobe (sin a / a)^power, a reaching x (radians) at the window's edge;
+ * -1 with VLX_WFLAG_WIDTH. */
+VLX_API int32_t vlxi_window_sinc(vlx_t* v, double x, double power, int32_t flags);
+VLX_API int32_t vlxfi_window_sinc(vlxf_t* v, float x, float power, int32_t flags);
+/* Tukey window: flat middle, cosine taper over the fraction alpha (0 to 1)
+ * of the length; -1 with VLX_WFLAG_WIDTH. */
+VLX_API int32_t vlxi_window_tukey(vlx_t* v, double alpha, int32_t flags);
+VLX_API int32_t vlxfi_window_tukey(vlxf_t* v, float alpha, int32_t flags);
+/* FIR prototype window, peak 1, symmetric, unrotated: id 100 Gaussian of
+ * bandwidth param, 101 Kaiser of transition width param (cycles per sample),
+ * 102 and 103 sinc lobes of bandwidth param; other ids as vlxi_window. */
+VLX_API int32_t vlxi_window_fir(vlx_t* v, int32_t id, double param);
+VLX_API int32_t vlxfi_window_fir(vlxf_t* v, int32_t id, float param);
+
+/* --- metrics (results through out; nothing is cached) --- */
+
+/* Factor from the peak-normalised window to the mode in flags, for points
+ * samples (and width with VLX_WFLAG_WIDTH).  1 for peak mode or points < 1. */
+VLX_API int32_t vlx_window2_scale(double* out, int32_t id, int32_t flags, int32_t points, double width);
+VLX_API int32_t vlxf_window2_scale(float* out, int32_t id, int32_t flags, int32_t points, float width);
+/* vlx_window2_scale with width 0; -1 with VLX_WFLAG_WIDTH. */
+VLX_API int32_t vlx_window_scale(double* out, int32_t id, int32_t flags, int32_t points);
+VLX_API int32_t vlxf_window_scale(float* out, int32_t id, int32_t flags, int32_t points);
+/* Equivalent noise bandwidth in bins of points, of a window of width points. */
+VLX_API int32_t vlx_window2_enbw(double* out, int32_t id, int32_t points, double width);
+VLX_API int32_t vlxf_window2_enbw(float* out, int32_t id, int32_t points, float width);
+/* Equivalent noise bandwidth in bins of a full-length window (Hann: 1.5). */
+VLX_API int32_t vlx_window_enbw(double* out, int32_t id, int32_t points);
+VLX_API int32_t vlxf_window_enbw(float* out, int32_t id, int32_t points);
+/* selector 0: ENBW; 1: 3 dB bandwidth; 2: 6 dB bandwidth, in bins of points
+ * for a window of width points (width <= 0: 1e100, float 1e15). */
+VLX_API int32_t vlx_window_metric(double* out, int32_t selector, int32_t id, int32_t points, double width);
+VLX_API int32_t vlxf_window_metric(float* out, int32_t selector, int32_t id, int32_t points, float width);
 
 /* ======================================================================== */
 /* Element-wise: two-operand operations                                     */
@@ -458,6 +653,105 @@ VLX_API int32_t vlxu_zinter(vlx_t* src, vlx_t* dst, double scale);
 VLX_API int32_t vlxfu_zinter(vlxf_t* src, vlxf_t* dst, float scale);
 
 /* ======================================================================== */
+/* Element-wise: phase and time operations                                  */
+/* ======================================================================== */
+/* pi is 3.141592653589793 (float: 3.1415927). */
+
+/* Real only: unwraps a phase in radians, taking out whole turns so that each
+ * sample lies within pi of the previous output (the first within pi of 0). */
+VLX_API int32_t vlxi_unwrap(vlx_t* v);
+VLX_API int32_t vlxfi_unwrap(vlxf_t* v);
+/* Real only: as vlxi_unwrap against the mean of the last window outputs
+ * (fewer at the start); window 1 is vlxi_unwrap, 0 reduces against 0.  -1 if window < 0. */
+VLX_API int32_t vlxi_unwrap_wnd(vlx_t* v, int32_t window);
+VLX_API int32_t vlxfi_unwrap_wnd(vlxf_t* v, int32_t window);
+/* First difference per unit of x: (x[i] - x[i-1]) / delta with x[-1] = 0;
+ * delta 0 multiplies by 1e100 instead (float: 999999986991104).  Complex: part by part. */
+VLX_API int32_t vlxi_differ(vlx_t* v);
+VLX_API int32_t vlxfi_differ(vlxf_t* v);
+/* Running sum times delta: y[i] = y[i-1] + x[i] * delta.  Complex: part by part. */
+VLX_API int32_t vlxi_integ(vlx_t* v);
+VLX_API int32_t vlxfi_integ(vlxf_t* v);
+/* Real only: replaces the samples by the x positions (in units of delta,
+ * linearly interpolated) where they cross level; mode 1 rising, 2 falling, 3 both.  delta becomes 1. */
+VLX_API int32_t vlxi_edge(vlx_t* v, int32_t mode, double level);
+VLX_API int32_t vlxfi_edge(vlxf_t* v, int32_t mode, float level);
+/* Clips every scalar to the range between a and b (either order); *clipped
+ * (if not NULL) is 1 if any changed, else 0.  The second argument is unused; NaN stays. */
+VLX_API int32_t vlxi_limit(vlx_t* v, int32_t unused, double a, double b, int32_t* clipped);
+VLX_API int32_t vlxfi_limit(vlxf_t* v, int32_t unused, float a, float b, int32_t* clipped);
+/* Derivative of the polynomial whose coefficients (lowest power first) are
+ * the samples; one point fewer. */
+VLX_API int32_t vlxi_pdiffer(vlx_t* v);
+VLX_API int32_t vlxfi_pdiffer(vlxf_t* v);
+/* Phase in radians: complex points give atan2(im, re) (0 at the origin) as a
+ * real vector; real samples give pi below 0, else 0. */
+VLX_API int32_t vlxi_phase(vlx_t* v);
+VLX_API int32_t vlxfi_phase(vlxf_t* v);
+/* Polar form: each point becomes the complex pair (magnitude, phase in
+ * radians), a real vector turning complex. */
+VLX_API int32_t vlxi_rtop(vlx_t* v);
+VLX_API int32_t vlxfi_rtop(vlxf_t* v);
+
+/* ======================================================================== */
+/* Generators and resampling tables                                         */
+/* ======================================================================== */
+/* The generators fill a vector whose points, delta and complex flag the caller
+ * has set; sample k stands at x = k*delta, so frequencies are in cycles per
+ * unit of x.  points and delta are left as they are. */
+
+/* v[k] = offset + k*delta*slope, by adding delta*slope sample after sample;
+ * a complex v gets zero imaginary parts.  0, or -1 if storage fails. */
+VLX_API int32_t vlxc_line(vlx_t* v, double slope, double offset);
+VLX_API int32_t vlxfc_line(vlxf_t* v, float slope, float offset);
+/* v[k] = cos(2*pi*freq*k*delta + phase), phase in radians, by a rotation
+ * restarted exactly every 256 samples; a complex v gets zero imaginary parts. */
+VLX_API int32_t vlxc_cos(vlx_t* v, double freq, double phase);
+VLX_API int32_t vlxfc_cos(vlxf_t* v, float freq, float phase);
+/* v[k] = exp(j*(2*pi*freq*k*delta + phase)) in a complex v; a real v gets
+ * the cosine (vlxc_cos).  0, or -1 if storage fails. */
+VLX_API int32_t vlxc_cexp(vlx_t* v, double freq, double phase);
+VLX_API int32_t vlxfc_cexp(vlxf_t* v, float freq, float phase);
+
+/* Fills v (points and complex preset) with noise of a kind: 0 uniform in
+ * [-1, 1) (complex: in the unit disc), 1 Gaussian of variance 1 (complex:
+ * each part), 2 exponential of mean 1, 3 Laplace (2 and 3 real only).  Draws
+ * on the C library's rand(), seeded once per family from the machine; each
+ * rand() value counts by its low 15 bits (rand() & 0x7FFF), so a uniform
+ * draw takes 4 calls (60 bits; float: 2 calls, 30 bits).  Holds lock 1 for
+ * the whole fill.  -1 for another kind, kinds 2 and 3 on a complex v (after
+ * sizing it), or if storage fails. */
+VLX_API int32_t vlxc_rand(vlx_t* v, int32_t kind);
+VLX_API int32_t vlxfc_rand(vlxf_t* v, int32_t kind);
+/* Random permutation of the samples in place (complex pairs stay together),
+ * by a Fisher-Yates walk on 31-bit draws of the same generator.  Returns 0. */
+VLX_API int32_t vlxi_shuffle(vlx_t* v);
+VLX_API int32_t vlxfi_shuffle(vlxf_t* v);
+
+/* A resampling table is a real vector of n = T*P + 2 points (n even): T, the
+ * taps per phase, in data[0], then T*P + 1 samples of one low-pass kernel
+ * over P phases, symmetric about the middle entry data[1 + (n-2)/2].  The
+ * caller presets n (and so P); a design is a real vector of T and shape
+ * coefficients.  n below 2 or a design of fewer than 2 scalars: 0, v zero
+ * with data[0] = T where both have a first scalar. */
+
+/* Expands built-in design 0 to 4 (T = 8, 13, 8, 10, 13) into v, a kernel
+ * that peaks in the middle.  0; -1 for another design, an odd n or if
+ * storage fails. */
+VLX_API int32_t vlxc_rsmp(vlx_t* v, int32_t design);
+VLX_API int32_t vlxfc_rsmp(vlxf_t* v, int32_t design);
+/* Expands design d = (T, a0, a1, ...) as the cosine sum a0 + a1*cos(theta) +
+ * a2*cos(2*theta) + ..., theta from 0 at the middle to pi at the ends.  -1
+ * for an odd n, a complex d or if storage fails.  A complex v gets the
+ * table as real parts. */
+VLX_API int32_t vlxc_rsmp_cos(vlx_t* v, const vlx_t* d);
+VLX_API int32_t vlxfc_rsmp_cos(vlxf_t* v, const vlxf_t* d);
+/* As vlxc_rsmp_cos, with the shape a polynomial a0 + a1*c + a2*c^2 + ... in
+ * c = cos(theta). */
+VLX_API int32_t vlxc_rsmp_pcos(vlx_t* v, const vlx_t* d);
+VLX_API int32_t vlxfc_rsmp_pcos(vlxf_t* v, const vlxf_t* d);
+
+/* ======================================================================== */
 /* Filters: staging and decimation                                          */
 /* ======================================================================== */
 /* A filter's history `hist` is an optional vector owned by the caller that
@@ -473,6 +767,44 @@ VLX_API int32_t vlxfu_zinter(vlxf_t* src, vlxf_t* dst, float scale);
  * out may be in; out->delta = factor * in->delta. */
 VLX_API int32_t vlxd_deci(vlx_t* in, vlx_t* out, int32_t factor, vlx_t* hist);
 VLX_API int32_t vlxfd_deci(vlxf_t* in, vlxf_t* out, int32_t factor, vlxf_t* hist);
+
+/* ======================================================================== */
+/* Filters: FIR, symmetric FIR, hwfilt, resampler                           */
+/* ======================================================================== */
+/* Filters keep their delay and give as many points as the input; out may be
+ * in.  hist (may be NULL) carries the last inputs so that blocks fed in turn
+ * continue one stream.  Each returns 0, or -1 on failure. */
+
+/* FIR filter: out[k] = sum of filter[i] * in[k - i] over the filter->points taps, real or complex
+ * source and taps; hist holds the last filter->points - 1 inputs.  Long real filters run a fast
+ * convolution with the filter's spectrum cached.  An empty filter copies in. */
+VLX_API int32_t vlxd_fir(vlx_t* in, vlx_t* out, vlx_t* filter, vlx_t* hist);
+VLX_API int32_t vlxfd_fir(vlxf_t* in, vlxf_t* out, vlxf_t* filter, vlxf_t* hist);
+/* Linear-phase FIR from the first half of its taps: 2m taps, or 2m - 1 with odd non-zero
+ * (filter's last tap the centre); anti non-zero negates the mirrored half.  hist: N - 1 inputs. */
+VLX_API int32_t vlxd_sfir(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd, int32_t anti, vlx_t* hist);
+VLX_API int32_t vlxfd_sfir(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, vlxf_t* hist);
+/* vlxd_sfir then vlxd_deci by factor (below 1 taken as 1); hist holds the N - 1 inputs and, at
+ * point N - 1, the skip count.  out->delta = factor * in->delta. */
+VLX_API int32_t vlxd_sfir_deci(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd, int32_t anti, int32_t factor, vlx_t* hist);
+VLX_API int32_t vlxfd_sfir_deci(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, int32_t factor, vlxf_t* hist);
+/* Fixed low-pass of four power-of-two sections (id 0 only; zeros at 1/3 and 1/2 of the rate,
+ * gain 1 at 0); hist: 12 points of section state.  -1 for another id. */
+VLX_API int32_t vlxd_hwfilt(vlx_t* in, vlx_t* out, int32_t id, vlx_t* hist);
+VLX_API int32_t vlxfd_hwfilt(vlxf_t* in, vlxf_t* out, int32_t id, vlxf_t* hist);
+/* vlxd_hwfilt in place, from silence, with no history kept. */
+VLX_API int32_t vlxi_hwfilt(vlx_t* v, int32_t id);
+VLX_API int32_t vlxfi_hwfilt(vlxf_t* v, int32_t id);
+/* Resamples by ratio (input samples per output, >= 0) with a polyphase table coef (T in
+ * data[0], T * P + 1 entries); method 0 nearest lower phase (real only), 1 interpolated.
+ * out->points preset to the most outputs wanted, set to those made; out->delta = in->delta * ratio;
+ * hist: T + 2 points (window, mu, T + position reached).  coef under 2 points copies in. */
+VLX_API int32_t vlxd_rsmp(vlx_t* in, vlx_t* out, int32_t method, vlx_t* coef, double ratio, vlx_t* hist);
+VLX_API int32_t vlxfd_rsmp(vlxf_t* in, vlxf_t* out, int32_t method, vlxf_t* coef, float ratio, vlxf_t* hist);
+/* vlxd_rsmp with built-in table design 0 to 4 (vlxc_rsmp) made and destroyed in the call; after
+ * a failed run the table is not released. */
+VLX_API int32_t vlxd_rsmp2(vlx_t* in, vlx_t* out, int32_t method, int32_t design, double ratio, vlx_t* hist);
+VLX_API int32_t vlxfd_rsmp2(vlxf_t* in, vlxf_t* out, int32_t method, int32_t design, float ratio, vlxf_t* hist);
 
 /* ======================================================================== */
 /* Statistics: moments, histogram, sort and median                          */
@@ -573,6 +905,85 @@ VLX_API int32_t vlxs_peak(const vlx_t* src, vlx_t* dst, int32_t flags, int32_t i
 VLX_API int32_t vlxfs_peak(const vlxf_t* src, vlxf_t* dst, int32_t flags, int32_t index);
 
 /* ======================================================================== */
+/* Statistics: polynomials and roots                                        */
+/* ======================================================================== */
+
+/* A polynomial is a real vector with data[k] the coefficient of x^k (constant
+ * first); complex coefficient vectors are refused with -1. */
+
+/* dst becomes one real point: the polynomial at x by Horner's rule (0 for an
+ * empty vector).  dst may be src. */
+VLX_API int32_t vlxs_peval(const vlx_t* src, vlx_t* dst, double x);
+VLX_API int32_t vlxfs_peval(const vlxf_t* src, vlxf_t* dst, float x);
+/* One real root, searched from x (moved inside the bounds on the real roots)
+ * by Laguerre's, then Newton's step: dst becomes one real point.  dst may be
+ * src.  -1 if no root passes the residual test (dst holds the last iterate). */
+VLX_API int32_t vlxs_psolve(const vlx_t* src, vlx_t* dst, double x);
+VLX_API int32_t vlxfs_psolve(const vlxf_t* src, vlxf_t* dst, float x);
+/* One real or complex root, searched from (re, im) with restarts and polished
+ * by Newton's step: dst becomes one point, complex 0 for a root classed real
+ * (re, im still stored).  dst may be src.  -1 if no root was found. */
+VLX_API int32_t vlxs_pcsolve(const vlx_t* src, vlx_t* dst, double re, double im);
+VLX_API int32_t vlxfs_pcsolve(const vlxf_t* src, vlxf_t* dst, float re, float im);
+/* All roots of up to 6 coefficients in closed form (degree 5 with one searched
+ * real root); leading zeros lower the degree.  A real list ascends; a complex
+ * one has the real roots first (imaginary part 0), then conjugate pairs.
+ * Fewer than 2 coefficients or a constant: 0 points.  dst may be src.  -1 for
+ * more than 6 coefficients or a failure. */
+VLX_API int32_t vlxs_proots(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_proots(const vlxf_t* src, vlxf_t* dst);
+/* All roots of any degree, in place: the coefficients become a complex list
+ * sorted as vlxi_sort sorts, found by search and deflation.  A search failure
+ * returns its status with v partly deflated. */
+VLX_API int32_t vlxi_proots(vlx_t* v);
+VLX_API int32_t vlxfi_proots(vlxf_t* v);
+/* A list of roots (real or complex) becomes the coefficients of the monic
+ * polynomial with those roots, of the same complex flag; empty: 1. */
+VLX_API int32_t vlxi_pztoc(vlx_t* v);
+VLX_API int32_t vlxfi_pztoc(vlxf_t* v);
+
+/* ======================================================================== */
+/* Statistics: regression and interpolation                                 */
+/* ======================================================================== */
+
+/* Straight-line fit of src: a real vector as y against x = index * delta (delta 0 taken as 1;
+ * x restarts at 0 every 2048 points), a complex one as im against re.  dst: slope, intercept. */
+VLX_API int32_t vlxs_lin_regres(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_lin_regres(const vlxf_t* src, vlxf_t* dst);
+/* The same fit as a record of 20 real points (delta 1): y on x (slope, intercept, residual
+ * variance, slope and intercept variances, their covariance and correlation), the same 7 for x on y,
+ * means of x and y, sample variances of x and y, sample covariance, correlation.  Slopes of a
+ * vanishing variance are 1e100 (float: 999999986991104).  dst may be src. */
+VLX_API int32_t vlxs_lin_regres2(const vlx_t* src, vlx_t* dst);
+VLX_API int32_t vlxfs_lin_regres2(const vlxf_t* src, vlxf_t* dst);
+
+/* Methods of vlx_interp (the low three bits; 2, 4, 6 and 7 give every query one value) and its flag. */
+#define VLX_INTERP_STEP       0  /* the tabulated value on the left */
+#define VLX_INTERP_LINEAR     1  /* straight line between neighbours */
+#define VLX_INTERP_QUADRATIC  3  /* parabola through the three nearest points (linear below 3 points) */
+#define VLX_INTERP_SPLINE     5  /* cubic spline from second derivatives */
+#define VLX_INTERP_HOLD_ENDS 16  /* no extrapolation: outside the table take the end value */
+/* End conditions of vlxb_cspline_2d. */
+#define VLX_SPLINE_NOT_A_KNOT         0 /* the node next to the end is no knot */
+#define VLX_SPLINE_FIRST_DERIVATIVE   1 /* the end's first derivative is given */
+#define VLX_SPLINE_SECOND_DERIVATIVE  2 /* the end's second derivative is given */
+#define VLX_SPLINE_NATURAL            3 /* the end's second derivative is 0 */
+
+/* Interpolates the real table y(x) at the queries xi (meant to ascend) into yi, which gets xi's
+ * points and delta; yi may be xi but no other operand.  y2: spline second derivatives, or NULL for
+ * not-a-knot ones made here.  -1 on complex operands, unequal lengths or equal abscissas met. */
+VLX_API int32_t vlx_interp(const vlx_t* x, vlx_t* y, const vlx_t* y2, const vlx_t* xi, vlx_t* yi, int32_t flags);
+VLX_API int32_t vlxf_interp(const vlxf_t* x, vlxf_t* y, const vlxf_t* y2, const vlxf_t* xi, vlxf_t* yi, int32_t flags);
+/* vlx_interp with VLX_INTERP_SPLINE. */
+VLX_API int32_t vlx_cspline(const vlx_t* x, vlx_t* y, const vlx_t* y2, const vlx_t* xi, vlx_t* yi);
+VLX_API int32_t vlxf_cspline(const vlxf_t* x, vlxf_t* y, const vlxf_t* y2, const vlxf_t* xi, vlxf_t* yi);
+/* Cubic spline second derivatives of y(x) into y2 (x rising strictly, 4 points or more), with
+ * VLX_SPLINE_ end conditions end0, endn and their derivatives d0, dn.  y is changed during the
+ * call and put back (not on a bad endn), so no other thread may use it meanwhile. */
+VLX_API int32_t vlxb_cspline_2d(const vlx_t* x, vlx_t* y, vlx_t* y2, double d0, double dn, int32_t end0, int32_t endn);
+VLX_API int32_t vlxfb_cspline_2d(const vlxf_t* x, vlxf_t* y, vlxf_t* y2, float d0, float dn, int32_t end0, int32_t endn);
+
+/* ======================================================================== */
 /* Internal helpers, exported for the library's own layers and for tests.   */
 /* Applications do not normally need them.                                  */
 /* ======================================================================== */
@@ -615,6 +1026,74 @@ VLX_API int32_t vlxf_ceil_pts(float x);
 /* As vlx_ceil_pts, rounded down. */
 VLX_API int32_t vlx_floor_pts(double x);
 VLX_API int32_t vlxf_floor_pts(float x);
+
+/* --- polynomial root searches --- */
+
+/* Step functions: a real step returns dx (next point x - dx); a complex step
+ * writes dz[0], dz[1] (next point z - dz) and returns 0. */
+typedef double (*vlx_root_step_real_t)(const vlx_t* poly, double x);
+typedef float (*vlxf_root_step_real_t)(const vlxf_t* poly, float x);
+typedef int32_t (*vlx_root_step_t)(const vlx_t* poly, double re, double im, double* dz);
+typedef int32_t (*vlxf_root_step_t)(const vlxf_t* poly, float re, float im, float* dz);
+
+/* Largest |coefficient| over the smallest one not below largest * epsilon;
+ * 1 for a zero or empty polynomial.  Returns the spread. */
+VLX_API double vlxs_coef_spread(const vlx_t* poly);
+VLX_API float vlxfs_coef_spread(const vlxf_t* poly);
+/* Real Laguerre step at x (BOUND for a zero denominator, 0 at a root). */
+VLX_API double vlxs_laguerre_step_real(const vlx_t* poly, double x);
+VLX_API float vlxfs_laguerre_step_real(const vlxf_t* poly, float x);
+/* Real Newton step p/p' at x (p * BOUND when p' is 0). */
+VLX_API double vlxs_newton_step_real(const vlx_t* poly, double x);
+VLX_API float vlxfs_newton_step_real(const vlxf_t* poly, float x);
+/* Iterates step from x inside [lo, hi], storing the last point in *result;
+ * 0 if it passes the residual test, -1 otherwise. */
+VLX_API int32_t vlxs_root_iterate_real(const vlx_t* poly, double* result, vlx_root_step_real_t step, double x, double lo, double hi);
+VLX_API int32_t vlxfs_root_iterate_real(const vlxf_t* poly, float* result, vlxf_root_step_real_t step, float x, float lo, float hi);
+/* Lagrange's bound above the positive roots (at least 1; 0 if empty). */
+VLX_API double vlxs_root_upper_bound(const vlx_t* poly);
+VLX_API float vlxfs_root_upper_bound(const vlxf_t* poly);
+/* Lagrange's bound below the negative roots (at most -1; 0 if empty). */
+VLX_API double vlxs_root_lower_bound(const vlx_t* poly);
+VLX_API float vlxfs_root_lower_bound(const vlxf_t* poly);
+/* Complex Newton step p/p' at (re, im) into dz; returns 0. */
+VLX_API int32_t vlxs_newton_step(const vlx_t* poly, double re, double im, double* dz);
+VLX_API int32_t vlxfs_newton_step(const vlxf_t* poly, float re, float im, float* dz);
+/* Complex Laguerre step at (re, im) into dz; returns 0. */
+VLX_API int32_t vlxs_laguerre_step(const vlx_t* poly, double re, double im, double* dz);
+VLX_API int32_t vlxfs_laguerre_step(const vlxf_t* poly, float re, float im, float* dz);
+/* Iterates step from (re, im); on success stores the root as dst's first
+ * point (dst needs room for one complex point; an empty dst is sized) and
+ * sets dst's complex flag to its class.  relaxed widens the final limit.
+ * 0 or -1. */
+VLX_API int32_t vlxs_root_iterate(const vlx_t* poly, vlx_t* dst, vlx_root_step_t step, double re, double im, int32_t relaxed);
+VLX_API int32_t vlxfs_root_iterate(const vlxf_t* poly, vlxf_t* dst, vlxf_root_step_t step, float re, float im, int32_t relaxed);
+/* vlxs_root_iterate from (re, im) and three derived starts, the last one
+ * relaxed if relaxed is set; 0 at the first success, -1 if all fail. */
+VLX_API int32_t vlxs_root_restarts(const vlx_t* poly, vlx_t* dst, vlx_root_step_t step, double re, double im, int32_t relaxed);
+VLX_API int32_t vlxfs_root_restarts(const vlxf_t* poly, vlxf_t* dst, vlxf_root_step_t step, float re, float im, int32_t relaxed);
+
+/* --- regression and interpolation --- */
+
+/* Solves the tridiagonal system of m rows (lower[i] x[i-1] + diag[i] x[i] + upper[i] x[i+1] =
+ * rhs[i]) into out, eliminating from the bottom row up without pivoting; overwrites lower and rhs.  -1 if m < 1. */
+VLX_API int32_t vlxb_tridiagonal_solve(double* lower, double* diag, double* upper, double* rhs, double* out, int32_t m);
+VLX_API int32_t vlxfb_tridiagonal_solve(float* lower, float* diag, float* upper, float* rhs, float* out, int32_t m);
+
+/* --- windows --- */
+
+/* Fills the real w (points set, storage sized) with window id: no
+ * multiplication, no rotation.  0 or -1. */
+VLX_API int32_t vlx_window_synth(vlx_t* w, int32_t id, int32_t flags, double width);
+VLX_API int32_t vlxf_window_synth(vlxf_t* w, int32_t id, int32_t flags, float width);
+/* Fills w with the cosine sum of the real coefs, centred at points/2;
+ * flags VLX_WFLAG_WIDTH with width, VLX_WFLAG_SYMMETRIC gives -1. */
+VLX_API int32_t vlx_window_cos_sum(vlx_t* w, vlx_t* coefs, int32_t flags, double width);
+VLX_API int32_t vlxf_window_cos_sum(vlxf_t* w, vlxf_t* coefs, int32_t flags, float width);
+/* (sin a / a)^p; where sin a / a <= 0: itself for p = 1, 1 for p = 0, its
+ * square for p = 2, else 0. */
+VLX_API double vlx_sinc_pow(double a, double p);
+VLX_API float vlxf_sinc_pow(float a, float p);
 
 #ifdef __cplusplus
 }

@@ -52,8 +52,9 @@ void register_teardown(TeardownStep step, TeardownFn fn) {
 
 template <VlxVector V>
 int32_t free_internal() {
-    for (auto& step : Teardown<V>::steps) {
-        const TeardownFn fn = step.load();
+    for (int s = 0; s < static_cast<int>(TeardownStep::count); ++s) {
+        const TeardownFn fn = s == static_cast<int>(TeardownStep::dft_descriptors) ? &dft_descriptors_free<V>
+                                                                                     : Teardown<V>::steps[s].load();
         if (fn != nullptr && fn() < 0) return -1;
     }
     return 0;

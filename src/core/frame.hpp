@@ -88,6 +88,12 @@ enum class TeardownStep : int {
 
 using TeardownFn = int32_t (*)();
 
+// The descriptor release of the vendor transform binding.  It is always step
+// dft_descriptors, called directly rather than plugged in, because it binds
+// the modules if nothing has yet: a teardown can be their first use.
+template <VlxVector V>
+int32_t dft_descriptors_free();
+
 template <VlxVector V>
 void register_teardown(TeardownStep step, TeardownFn fn);
 

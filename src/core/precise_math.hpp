@@ -44,8 +44,12 @@ inline T own_atan2(T y, T x) {
     if constexpr (std::is_same_v<T, float>) return atan2_32(y, x); else return atan2_64(y, x);
 }
 inline double hypot64(double a, double b) { return std::hypot(a, b); }
+inline double fmod64(double x, double y) { return std::fmod(x, y); }
 // Both twins take hypot in double; the float twin rounds the result.
 template <class T>
 inline T wide_hypot(T a, T b) { return static_cast<T>(hypot64(static_cast<double>(a), static_cast<double>(b))); }
+// Phase conversions take atan2 in double in both twins as well.
+template <class T>
+inline T wide_atan2(T y, T x) { return static_cast<T>(atan2_64(static_cast<double>(y), static_cast<double>(x))); }
 
 }  // namespace vlx

@@ -119,4 +119,23 @@ template <VlxVector V> int32_t unzpad(V* v, int32_t new_n, int32_t flags);
 template <VlxVector V> int32_t zinter_to(V* src, V* dst, real_t<V> scale_by);
 template <VlxVector V> int32_t zinter(V* v);
 
+// ---- phase and time operations ----
+
+// Phase unwrapping against the last output (vlxi_unwrap) or the mean of the
+// last window outputs (vlxi_unwrap_wnd); real only.
+template <VlxVector V> int32_t unwrap(V* v);
+template <VlxVector V> int32_t unwrap_wnd(V* v, int32_t window);
+// First difference per unit of x and running sum times delta.
+template <VlxVector V> int32_t differ(V* v);
+template <VlxVector V> int32_t integ(V* v);
+// x positions of the level crossings selected by mode (1 rising, 2 falling).
+template <VlxVector V> int32_t edge(V* v, int32_t mode, real_t<V> level);
+// Clips every scalar to the range of a and b (vlxi_limit without its unused argument).
+template <VlxVector V> int32_t limit(V* v, real_t<V> a, real_t<V> b, int32_t* clipped);
+// Derivative of the polynomial held lowest power first.
+template <VlxVector V> int32_t pdiffer(V* v);
+// Phase of each sample (real result), and (magnitude, phase) pairs.
+template <VlxVector V> int32_t phase(V* v);
+template <VlxVector V> int32_t rtop(V* v);
+
 }  // namespace vlx

@@ -4,6 +4,8 @@
 
 #include "core/core.hpp"
 
+#include <cstring>
+
 namespace vlx {
 
 // ---- staging shared by every filter ----
@@ -72,5 +74,44 @@ template <VlxVector V>
 int32_t ceil_pts(real_t<V> x);
 template <VlxVector V>
 int32_t floor_pts(real_t<V> x);
+
+// The last `keep` samples of the stream into hist[0 .. keep-1], oldest
+// first, after a block x of n points (w scalars a point): a plain copy when
+// the block is long enough, otherwise the old content moves down by n.
+template <class T>
+inline void push_history(T* hist, const T* x, int64_t n, int64_t keep, int64_t w) {
+    if (keep <= 0) return;
+    if (n >= keep) {
+        std::memmove(hist, x + (n - keep) * w, static_cast<size_t>(keep * w) * sizeof(T));
+    } else if (n > 0) {
+        std::memmove(hist, hist + n * w, static_cast<size_t>((keep - n) * w) * sizeof(T));
+        std::memmove(hist + (keep - n) * w, x, static_cast<size_t>(n * w) * sizeof(T));
+    }
+}
+
+// ---- FIR engines, hwfilt, resampler ----
+
+// FIR filter over a block, real or complex source and taps, hist holding the
+// last m - 1 input samples; long real filters run a cached fast convolution
+// under lock 1 (vlxd_fir).
+template <VlxVector V>
+int32_t fir(V* in, V* out, V* filter, V* hist);
+// Linear-phase FIR from the first half of its taps (vlxd_sfir).
+template <VlxVector V>
+int32_t sfir(V* in, V* out, V* filter, int32_t odd, int32_t anti, V* hist);
+// vlxd_sfir followed by vlxd_deci, computing only the kept samples for short
+// real filters; the skip count sits at point N - 1 of hist (vlxd_sfir_deci).
+template <VlxVector V>
+int32_t sfir_deci(V* in, V* out, V* filter, int32_t odd, int32_t anti, int32_t factor, V* hist);
+// Four-section low-pass with power-of-two coefficients (vlxd_hwfilt).
+template <VlxVector V>
+int32_t hwfilt(V* in, V* out, int32_t id, V* hist);
+// Polyphase resampler by an arbitrary ratio from a table of T * P + 2 points
+// (vlxd_rsmp); out->points preset to the most outputs wanted.
+template <VlxVector V>
+int32_t rsmp(V* in, V* out, int32_t method, V* coef, real_t<V> ratio, V* hist);
+// vlxd_rsmp with a built-in table (design 0 to 4) made for the call (vlxd_rsmp2).
+template <VlxVector V>
+int32_t rsmp2(V* in, V* out, int32_t method, int32_t design, real_t<V> ratio, V* hist);
 
 }  // namespace vlx

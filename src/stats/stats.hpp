@@ -37,6 +37,54 @@ template <VlxVector V> int32_t sort(V* v);
 
 template <VlxVector V> int32_t peak(const V* src, V* dst, int32_t flags, int32_t index);
 
+// ---- polynomials (data[k] the coefficient of x^k) and their roots ----
+
+// One real point: the polynomial at x by Horner's rule (vlxs_peval).
+template <VlxVector V> int32_t peval(const V* src, V* dst, real_t<V> x);
+// One root from a start: real (vlxs_psolve), or real or complex with the
+// class in dst's complex flag (vlxs_pcsolve).  dst may be src.
+template <VlxVector V> int32_t psolve(const V* src, V* dst, real_t<V> x);
+template <VlxVector V> int32_t pcsolve(const V* src, V* dst, real_t<V> re, real_t<V> im);
+// All roots up to degree 5 in closed form (vlxs_proots), of any degree by
+// search and deflation (vlxi_proots), and roots back to the monic
+// polynomial (vlxi_pztoc).
+template <VlxVector V> int32_t proots(const V* src, V* dst);
+template <VlxVector V> int32_t proots_inplace(V* v);
+template <VlxVector V> int32_t pztoc(V* v);
+
+// The layers of the root searches, exported for tests.  A real step gives dx
+// (next point x - dx); a complex step writes dz to dz[0], dz[1].
+template <VlxVector V> using real_step_fn = real_t<V> (*)(const V*, real_t<V>);
+template <VlxVector V> using complex_step_fn = int32_t (*)(const V*, real_t<V>, real_t<V>, real_t<V>*);
+template <VlxVector V> real_t<V> coef_spread(const V* p);
+template <VlxVector V> real_t<V> laguerre_step_real(const V* p, real_t<V> x);
+template <VlxVector V> real_t<V> newton_step_real(const V* p, real_t<V> x);
+template <VlxVector V>
+int32_t root_iterate_real(const V* p, real_t<V>* result, real_step_fn<V> step, real_t<V> x, real_t<V> lo, real_t<V> hi);
+template <VlxVector V> real_t<V> root_upper_bound(const V* p);
+template <VlxVector V> real_t<V> root_lower_bound(const V* p);
+template <VlxVector V> int32_t newton_step(const V* p, real_t<V> re, real_t<V> im, real_t<V>* dz);
+template <VlxVector V> int32_t laguerre_step(const V* p, real_t<V> re, real_t<V> im, real_t<V>* dz);
+template <VlxVector V>
+int32_t root_iterate(const V* p, V* dst, complex_step_fn<V> step, real_t<V> re, real_t<V> im, int32_t relaxed);
+template <VlxVector V>
+int32_t root_restarts(const V* p, V* dst, complex_step_fn<V> step, real_t<V> re, real_t<V> im, int32_t relaxed);
+
+// ---- regression and interpolation ----
+
+// Straight-line fit: slope and intercept (vlxs_lin_regres), or the record of
+// twenty numbers (vlxs_lin_regres2).
+template <VlxVector V> int32_t lin_regres(const V* src, V* dst);
+template <VlxVector V> int32_t lin_regres2(const V* src, V* dst);
+// Table y(x) at the queries xi into yi by the method and flags of vlx_interp;
+// y2 holds spline second derivatives or is null.
+template <VlxVector V> int32_t interp(const V* x, V* y, const V* y2, const V* xi, V* yi, int32_t flags);
+// Spline second derivatives with the end conditions end0, endn (vlxb_cspline_2d).
+template <VlxVector V> int32_t cspline_2d(const V* x, V* y, V* y2, real_t<V> d0, real_t<V> dn, int32_t end0, int32_t endn);
+// Tridiagonal system of m rows, eliminated from the bottom up (vlxb_tridiagonal_solve).
+template <VlxVector V>
+int32_t tridiagonal_solve(real_t<V>* lower, real_t<V>* diag, real_t<V>* upper, real_t<V>* rhs, real_t<V>* out, int32_t m);
+
 namespace stats {
 
 // Every sum over samples runs in blocks of this many samples (points).

@@ -22,13 +22,13 @@ template <VlxVector V>
 inline constexpr real_t<V> fft_sqrt_half =
     std::is_same_v<V, vlx_t> ? real_t<V>(0.7071067811865476) : real_t<V>(0.70710677f);
 
-// Seam of the optional vendor transform binding: dft_bound_fast() is its entry
-// check (binding on first use), dft_fast_transform() its path.  Until the
-// binding exists, power-of-two transforms always take the native engines.
-template <VlxVector V> inline bool dft_bound_fast() { return false; }
-template <VlxVector V> inline int32_t dft_fast_transform(V*, int32_t /*inverse*/, int32_t /*complex_domain*/) {
-    return -1;
-}
+// The optional vendor transform binding (src/core/binding.cpp).
+// dft_bound_fast() is the entry check of vlxi_fft and vlxi_rfft: it binds the
+// modules on first use and says whether the fast bit is set.
+// dft_fast_transform() is the fast path in place: complex_domain 0 is the
+// real forward transform to the half spectrum.
+template <VlxVector V> bool dft_bound_fast();
+template <VlxVector V> int32_t dft_fast_transform(V* v, int32_t inverse, int32_t complex_domain);
 
 // Twiddle table of length n (3n/2 scalars: n/4 pairs of rotation triples),
 // found or built; the caller holds lock 0 and keeps the active counter raised

@@ -1,0 +1,289 @@
+// Polynomials: roots checked against their polynomial in long double, the
+// expansion back to coefficients, the closed forms' layout, the single-root
+// searches' fixed cases, the bounds, and allocation failure.
+#include "stats_support.hpp"
+
+#include <algorithm>
+#include <complex>
+
+#if defined(__SANITIZE_ADDRESS__)
+#include <sanitizer/lsan_interface.h>
+#endif
+
+using namespace vlxtest;
+
+namespace {
+VLX_TWIN(s, peval) VLX_TWIN(s, psolve) VLX_TWIN(s, pcsolve) VLX_TWIN(s, proots)
+VLX_TWIN(s, root_upper_bound) VLX_TWIN(s, root_lower_bound)
+VLX_TEST_TWIN(t_pztoc, vlxi_pztoc, vlxfi_pztoc)
+VLX_TWIN(s, root_restarts)
+
+using LC = std::complex<long double>;
+
+// vlxi_proots leaves its two work vectors behind by design; that storage is
+// not a leak the sanitizer should report.
+template <class V>
+int32_t iproots(V* v) {
+#if defined(__SANITIZE_ADDRESS__)
+    __lsan::ScopedDisabler keep;
+#endif
+    if constexpr (is_double<V>) return vlxi_proots(v); else return vlxfi_proots(v);
+}
+
+// Coefficients (constant first) of lead * prod (x - r), in long double.
+std::vector<long double> expand(const std::vector<LC>& roots, long double lead) {
+    std::vector<LC> c{LC(lead)};
+    for (const LC& r : roots) {
+        c.push_back(0);
+        for (size_t k = c.size() - 1; k > 0; --k) c[k] = c[k - 1] - r * c[k];
+        c[0] = -r * c[0];
+    }
+    std::vector<long double> out;
+    for (const LC& x : c) out.push_back(x.real());
+    return out;
+}
+
+// |p(z)| over the sum of |a_k| |z|^k: the residual relative to the size of
+// the terms, which is what a backward-stable root can promise.
+template <class T>
+long double relative_residual(const std::vector<T>& a, LC z) {
+    LC p = 0;
+    long double scale = 0;
+    for (size_t k = a.size(); k-- > 0;) {
+        p = p * z + LC(a[k]);
+        scale = scale * std::abs(z) + std::fabs(static_cast<long double>(a[k]));
+    }
+    return std::abs(p) / scale;
+}
+
+// Root sets, apart from each other: random real roots and conjugate pairs;
+// the same with each real root doubled 1e-3 away (clusters); a triple and a
+// double root among them; real roots over four decades.
+std::vector<LC> root_set(int kind, int degree, uint32_t seed) {
+    std::mt19937 rng(seed);
+    std::uniform_real_distribution<double> u(-2, 2);
+    std::vector<LC> r;
+    for (LC m : {1.25L, 1.25L, 1.25L, -0.5L, -0.5L})
+        if (kind == 2 && static_cast<int>(r.size()) < degree) r.push_back(m);
+    auto apart = [&](LC z, long double d) {
+        return std::none_of(r.begin(), r.end(), [&](const LC& y) { return std::abs(z - y) < d * std::max(1.0L, std::abs(z)); });
+    };
+    while (static_cast<int>(r.size()) < degree) {
+        const bool pair = degree - r.size() >= 2 && rng() % 2 && kind != 3;
+        const LC z = kind == 3 ? LC(std::pow(10.0L, u(rng)) * (rng() % 2 ? 1 : -1)) : LC(u(rng), pair ? u(rng) : 0);
+        if (!apart(z, 0.25L) || (pair && std::fabs(z.imag()) < 0.125L)) continue;
+        r.push_back(z);
+        if (pair) r.push_back(std::conj(z));
+        if (!pair && kind == 1 && degree - r.size() >= 1) r.push_back(z + 1e-3L);
+    }
+    return r;
+}
+
+// vlxs_pcsolve rebuilt from the exported layers.  The library does not know
+// these step pointers as its own, so it runs every round of every search
+// instead of skipping the cycles it recognises.
+template <class V>
+int32_t pcsolve_every_round(V* src, V* dst, real_of<V> re, real_of<V> im) {
+    using T = real_of<V>;
+    const auto [laguerre, newton] = [] {
+        if constexpr (is_double<V>) return std::pair(&vlxs_laguerre_step, &vlxs_newton_step);
+        else return std::pair(&vlxfs_laguerre_step, &vlxfs_newton_step);
+    }();
+    dst->points = 1, dst->complex = 1;
+    if (t_alloc(dst) < 0) return -1;
+    dst->data[0] = dst->data[1] = T(0);
+    if (t_root_restarts(src, dst, laguerre, re, im, 0) != 0) return t_root_restarts(src, dst, newton, re, im, 1) ? -1 : 0;
+    const int32_t cls = dst->complex;
+    const T r = dst->data[0], i = cls ? dst->data[1] : T(0);
+    if (t_root_restarts(src, dst, newton, r, i, 0) != 0) dst->data[0] = r, dst->data[1] = i, dst->complex = cls;
+    return 0;
+}
+
+template <class V>
+std::vector<real_of<V>> rounded(const std::vector<long double>& c) {
+    return std::vector<real_of<V>>(c.begin(), c.end());
+}
+
+}  // namespace
+
+template <class V>
+class Poly : public ::testing::Test {};
+TYPED_TEST_SUITE(Poly, Families);
+
+TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialAndExpandBack) {
+    using T = real_of<TypeParam>;
+    const long double eps = std::numeric_limits<T>::epsilon();
+    for (int kind = 0; kind < 4; ++kind) {
+        for (int degree = 1; degree <= 20; ++degree) {
+            const long double lead = degree % 2 ? 1e-4L : -3e5L;
+            const auto a = rounded<TypeParam>(expand(root_set(kind, degree, 17 * degree + kind), lead));
+            Vec<TypeParam> v(a, false);
+            ASSERT_EQ(iproots(v.get()), 0) << "kind " << kind << ", degree " << degree;
+            ASSERT_TRUE(has_shape(v.get(), degree, 1, 1));
+            for (int i = 0; i < degree; ++i) {
+                const LC z(v[2 * i], v[2 * i + 1]);
+                // Each root comes from a deflated polynomial, so earlier
+                // deflations' rounding adds up; clusters take the most.
+                EXPECT_LT(relative_residual(a, z), 256 * degree * eps) << "kind " << kind << ", degree " << degree << ", root " << z;
+                // sorted by power first
+                EXPECT_TRUE(i == 0 || std::norm(LC(v[2 * i - 2], v[2 * i - 1])) <= std::norm(z) * (1 + 4 * eps));
+            }
+            // Roots back to coefficients: the monic polynomial, to the size of its terms.
+            ASSERT_EQ(t_pztoc(v.get()), 0);
+            ASSERT_TRUE(has_shape(v.get(), degree + 1, 1, 1));
+            long double size = 0;
+            for (T x : a) size += std::fabs(static_cast<long double>(x / a[degree]));
+            for (int k = 0; k <= degree; ++k) {
+                EXPECT_TRUE(near(v[2 * k], a[k] / static_cast<long double>(a[degree]), 64 * degree * eps * size));
+                EXPECT_TRUE(near(v[2 * k + 1], 0, 64 * degree * eps * size));
+            }
+        }
+    }
+}
+
+TYPED_TEST(Poly, ClosedFormsKeepRealRootsReal) {
+    using T = real_of<TypeParam>;
+    const long double eps = std::numeric_limits<T>::epsilon();
+    std::mt19937 rng(5);
+    std::uniform_real_distribution<double> u(-3, 3);
+    for (int trial = 0; trial < 200; ++trial) {
+        const int degree = 1 + trial % 5;
+        const bool pairs = trial % 3 == 0 && degree >= 2;
+        std::vector<LC> r;
+        while (static_cast<int>(r.size()) < degree) {
+            if (pairs && degree - r.size() >= 2) {
+                const LC z(u(rng), 0.5 + std::fabs(u(rng)));
+                r.push_back(z), r.push_back(std::conj(z));
+            } else {
+                const LC x(u(rng));
+                // well apart, so that rounding cannot turn a pair of reals complex
+                if (std::none_of(r.begin(), r.end(), [&](const LC& y) { return std::abs(x - y) < 0.2L; })) r.push_back(x);
+            }
+        }
+        std::vector<T> a = rounded<TypeParam>(expand(r, u(rng) > 0 ? 2.5L : -0.75L));
+        a.resize(6, T(0));  // leading zeros lower the degree
+        Vec<TypeParam> src(a, false), dst;
+        ASSERT_EQ(t_proots(src.get(), dst.get()), 0);
+        ASSERT_EQ(dst->points, degree);
+        ASSERT_EQ(dst->complex, pairs ? 1 : 0) << "trial " << trial;
+        const int w = dst->complex ? 2 : 1;
+        for (int i = 0; i < degree; ++i) {
+            const LC z(dst[w * i], dst->complex ? dst[w * i + 1] : T(0));
+            // Ferrari's resolvent (also under the quintic) loses a few digits.
+            EXPECT_LT(relative_residual(a, z), (degree <= 3 ? 64 : 4096) * eps) << "trial " << trial << ", root " << z;
+            EXPECT_TRUE(i == 0 || (pairs && dst[w * i + 1] != T(0)) || dst[w * (i - 1)] <= dst[w * i]) << "trial " << trial;
+        }
+        if (pairs) {  // real roots (imaginary part exactly 0) first, then conjugate pairs
+            int i = 0;
+            while (i < degree && dst[2 * i + 1] == T(0)) ++i;
+            EXPECT_EQ((degree - i) % 2, 0) << "trial " << trial;
+            for (; i + 1 < degree; i += 2) EXPECT_EQ(dst[2 * i + 1], -dst[2 * i + 3]);
+        }
+    }
+}
+
+TYPED_TEST(Poly, FixedCases) {
+    using T = real_of<TypeParam>;
+    struct Row {
+        const char* what;
+        std::vector<T> coefficients, roots;
+        int32_t status, complex;
+    };
+    const Row rows[] = {
+        {"double root below the zero tail", {1, 2, 1, 0, 0, 0}, {-1, -1}, 0, 0},
+        {"constant", {5}, {}, 0, 0},
+        {"empty", {}, {}, 0, 0},
+        {"zero polynomial", {0, 0, 0}, {}, 0, 0},
+        {"seven coefficients", {1, 2, 3, 4, 5, 6, 7}, {}, -1, 0},
+        {"x^2 + 1, negative imaginary part first", {1, 0, 1}, {-0.0, -1, -0.0, 1}, 0, 1},
+        {"root at zero", {0, 3, 2}, {-1.5, -0.0}, 0, 0},
+        {"exact quadratic", {2, -3, 1}, {1, 2}, 0, 0},
+        {"linear", {3, -4}, {0.75}, 0, 0},
+    };
+    for (const Row& row : rows) {
+        Vec<TypeParam> src(row.coefficients, false), dst;
+        ASSERT_EQ(t_proots(src.get(), dst.get()), row.status) << row.what;
+        if (row.status) continue;
+        EXPECT_EQ(dst->complex, row.complex) << row.what;
+        EXPECT_TRUE(same_scalars(dst.values(), row.roots)) << row.what;
+        // the same in place
+        EXPECT_EQ(t_proots(src.get(), src.get()), 0);
+        EXPECT_TRUE(same_scalars(src.values(), row.roots)) << row.what;
+    }
+    Vec<TypeParam> cx({1, 0, 1, 0}, true), out;
+    EXPECT_EQ(t_proots(cx.get(), out.get()), -1);
+    EXPECT_EQ(iproots(cx.get()), -1);
+    Vec<TypeParam> constant{4, 0, 0};
+    EXPECT_EQ(iproots(constant.get()), 0);
+    EXPECT_EQ(constant->points, 0);
+    Vec<TypeParam> list{1, 2}, none;
+    ASSERT_EQ(t_pztoc(list.get()), 0);
+    EXPECT_TRUE(same_scalars(list.values(), {2, -3, 1}));
+    ASSERT_EQ(t_pztoc(none.get()), 0);
+    EXPECT_TRUE(same_scalars(none.values(), {1}));
+}
+
+TYPED_TEST(Poly, SingleRootSearches) {
+    using T = real_of<TypeParam>;
+    Vec<TypeParam> empty, constant{5}, zero{0}, unit_circle{1, 0, 1}, origin{0, 1, 1}, dst;
+    EXPECT_EQ(t_peval(empty.get(), dst.get(), T(3)), 0);
+    EXPECT_TRUE(same_scalars(dst.values(), {0}));
+    EXPECT_EQ(t_psolve(empty.get(), dst.get(), T(3)), 0);
+    EXPECT_TRUE(same_scalars(dst.values(), {0}));
+    EXPECT_EQ(t_pcsolve(empty.get(), dst.get(), T(3), T(1)), 0);
+    EXPECT_EQ(dst->complex, 0);
+    EXPECT_EQ(dst[0], T(0));
+    EXPECT_EQ(t_psolve(constant.get(), dst.get(), T(0)), -1);
+    EXPECT_EQ(t_pcsolve(constant.get(), dst.get(), T(0), T(0)), -1);
+    // the zero polynomial passes at once, from the start moved onto the bound 1
+    EXPECT_EQ(t_psolve(zero.get(), dst.get(), T(7)), 0);
+    EXPECT_EQ(dst[0], T(1));
+    EXPECT_EQ(t_psolve(unit_circle.get(), dst.get(), T(0)), -1);
+    ASSERT_EQ(t_pcsolve(unit_circle.get(), dst.get(), T(0), T(0)), 0);
+    EXPECT_EQ(dst->complex, 1);
+    EXPECT_TRUE(near(std::fabs(dst[1]), 1, 4 * std::numeric_limits<T>::epsilon()));
+    EXPECT_TRUE(near(dst[0], 0, 4 * std::numeric_limits<T>::epsilon()));
+    // constant term 0: always classed real
+    ASSERT_EQ(t_pcsolve(origin.get(), dst.get(), T(0.3), T(0.7)), 0);
+    EXPECT_EQ(dst->complex, 0);
+    // in place, on odd degrees with a real root somewhere in the bounds
+    const long double eps = std::numeric_limits<T>::epsilon();
+    for (int degree = 1; degree <= 19; degree += 2) {
+        const auto a = rounded<TypeParam>(expand(root_set(0, degree, degree), 1));
+        Vec<TypeParam> v(a, false);
+        const T lo = t_root_lower_bound(v.get()), hi = t_root_upper_bound(v.get());
+        for (const LC& z : root_set(0, degree, degree))
+            EXPECT_TRUE(z.imag() != 0 || (lo <= z.real() && z.real() <= hi)) << z;
+        ASSERT_EQ(t_psolve(v.get(), v.get(), T(0.25)), 0) << degree;
+        ASSERT_TRUE(has_shape(v.get(), 1, 0, 1));
+        EXPECT_LT(relative_residual(a, LC(v[0])), 64 * degree * eps);
+        EXPECT_TRUE(v[0] >= lo && v[0] <= hi);
+    }
+}
+
+TYPED_TEST(Poly, SkippedCyclesChangeNoBit) {
+    using T = real_of<TypeParam>;
+    for (int kind = 0; kind < 4; ++kind) {
+        for (int degree = 1; degree <= 20; ++degree) {
+            Vec<TypeParam> v(rounded<TypeParam>(expand(root_set(kind, degree, degree + 40 * kind), 1)), false), fast, slow;
+            for (const T start : {T(0), T(0.7)}) {
+                const int32_t status = t_pcsolve(v.get(), fast.get(), start, -start);
+                ASSERT_EQ(status, pcsolve_every_round(v.get(), slow.get(), start, -start));
+                if (status) continue;
+                EXPECT_EQ(fast->complex, slow->complex);
+                EXPECT_TRUE(same_scalars(std::vector<T>{fast[0], fast[1]}, {slow[0], slow[1]})) << kind << " " << degree;
+            }
+        }
+    }
+}
+
+TYPED_TEST(Poly, AllocationFailure) {
+    using T = real_of<TypeParam>;
+    Vec<TypeParam> quartic{1, 0, 0, 0, 1}, dst, list{1, 2, 3}, coefficients{2, -3, 1};
+    FailingAlloc<TypeParam> failing;
+    EXPECT_EQ(t_proots(quartic.get(), dst.get()), -1);
+    EXPECT_EQ(t_pcsolve(quartic.get(), dst.get(), T(0), T(0)), -1);
+    EXPECT_EQ(t_peval(quartic.get(), dst.get(), T(0)), -1);
+    EXPECT_LT(t_pztoc(list.get()), 0);
+    EXPECT_LT(iproots(coefficients.get()), 0);
+}

@@ -1,0 +1,63 @@
+// Twin shorthands, a synthesised window as a plain vector, mean and rms.
+#pragma once
+
+#include "vlx_test.hpp"
+
+#include <cmath>
+#include <vector>
+
+namespace vlxtest {
+
+VLX_TWIN(i, window2)
+VLX_TWIN(i, window)
+VLX_TWIN(i, window_cos)
+VLX_TWIN(i, window_kaiser)
+VLX_TWIN(i, window_gauss)
+VLX_TWIN(i, window_sinc)
+VLX_TWIN(i, window_tukey)
+VLX_TWIN(i, window_fir)
+VLX_TWIN(i, swap_halves2)
+VLX_TEST_TWIN(t_synth, vlx_window_synth, vlxf_window_synth)
+VLX_TEST_TWIN(t_cos_sum, vlx_window_cos_sum, vlxf_window_cos_sum)
+
+// The metrics take a scalar out pointer; these route by its type.
+#define VLX_METRIC_TWIN(name)                                                                  \
+    inline int32_t t_##name(double* out, auto... a) { return vlx_##name(out, a...); }          \
+    inline int32_t t_##name(float* out, auto... a) { return vlxf_##name(out, a...); }
+VLX_METRIC_TWIN(window2_scale)
+VLX_METRIC_TWIN(window_scale)
+VLX_METRIC_TWIN(window_metric)
+#undef VLX_METRIC_TWIN
+
+template <class V>
+inline int32_t t_free_internal() {
+    return is_double<V> ? vlx_free_internal() : vlxf_free_internal();
+}
+
+// Window id with flags on n points, through the synthesis engine.
+template <class V>
+std::vector<real_of<V>> synth(int32_t id, int32_t flags, int32_t n, double width = 0.0, int32_t* status = nullptr) {
+    Vec<V> w;
+    w->points = n;
+    EXPECT_EQ(t_alloc(w.get()), 0);
+    const int32_t st = t_synth(w.get(), id, flags, static_cast<real_of<V>>(width));
+    if (status != nullptr) *status = st;
+    else EXPECT_EQ(st, 0) << "id " << id << " flags " << flags << " n " << n;
+    return w.values();
+}
+
+template <class T>
+long double mean_of(const std::vector<T>& x) {
+    long double s = 0;
+    for (T v : x) s += v;
+    return s / static_cast<long double>(x.size());
+}
+
+template <class T>
+long double rms_of(const std::vector<T>& x) {
+    long double s = 0;
+    for (T v : x) s += static_cast<long double>(v) * v;
+    return std::sqrt(s / static_cast<long double>(x.size()));
+}
+
+}  // namespace vlxtest
