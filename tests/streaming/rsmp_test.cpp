@@ -1,0 +1,242 @@
+// The streaming resampler: set-up, point counts, delay and start-up, a
+// stream run in blocks, and the road of one measurement, both families.
+#include "vlx_test.hpp"
+
+#include <complex>
+
+using namespace vlxtest;
+
+namespace {
+
+VLX_TWIN(c, cos)
+VLX_TWIN(c, rand)
+VLX_TWIN(i, scale)
+VLX_TWIN(b, add)
+VLX_TWIN(h, fft)
+VLX_TWIN(h, avg)
+VLX_TWIN(s, peak)
+VLX_TWIN(i, window_gauss)
+
+template <class V>
+struct Rsmp;
+#define VLX_RSMP_API(P, V)                                                                                     \
+    template <>                                                                                                \
+    struct Rsmp<V> {                                                                                           \
+        using Coef = P##_rsmp_coef_t;                                                                          \
+        using State = P##_rsmp_state_t;                                                                        \
+        static constexpr auto coef_init = P##_rsmp_coef_init, coef_alloc = P##_rsmp_coef_alloc,                \
+                              coef_setup = P##_rsmp_coef_setup, coef_destroy = P##_rsmp_coef_destroy,          \
+                              state_init = P##_rsmp_state_init, state_reset = P##_rsmp_state_reset,            \
+                              state_destroy = P##_rsmp_state_destroy, run = P##_rsmp, in_pts = P##_rsmp_get_in_pts, \
+                              out_pts = P##_rsmp_get_out_pts, delay = P##_rsmp_get_delay_pts,                  \
+                              settle = P##_rsmp_get_settle_pts;                                                \
+    };
+VLX_RSMP_API(vlxh, vlx_t)
+VLX_RSMP_API(vlxfh, vlxf_t)
+#undef VLX_RSMP_API
+
+// A coefficient object set up for a ratio and one stream's state, armed
+// (start-up discards on).
+template <class V, class R = Rsmp<V>>
+struct Stream {
+    typename R::Coef coef;
+    typename R::State state;
+    Stream(double ratio, int32_t forced) {
+        R::coef_init(&coef), R::state_init(&state);
+        EXPECT_EQ(R::coef_alloc(&coef, 0) | R::coef_setup(&coef, real_of<V>(ratio), forced, 0) | R::state_reset(&coef, &state), 0);
+    }
+    ~Stream() { R::state_destroy(&state), R::coef_destroy(&coef); }
+    int32_t out_pts(int32_t n, int32_t settled, int32_t at_least) {
+        int32_t r = -1;
+        return R::out_pts(&r, &coef, n, settled, at_least) == 0 ? r : -1;
+    }
+    int32_t run(V* in, V* out, V* work, bool keep = true) { return R::run(in, out, work, &coef, keep ? &state : nullptr); }
+};
+
+template <class V>
+class StreamingResampler : public ::testing::Test {};
+TYPED_TEST_SUITE(StreamingResampler, Families);
+
+// Ratio split, filter (half lengths 20, 38, 61), discards, delay and start-up;
+// one object through every set-up, reloading its filter as r crosses 1.5625.
+TYPED_TEST(StreamingResampler, SetupAndArithmetic) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    using R = Rsmp<V>;
+    const struct {
+        T ratio;
+        int32_t forced, k;
+        T r;
+        int32_t half, skip_mid, skip_out;
+        T figures[3];  // -1: not checked
+    } cases[] = {
+        {T(4), 0, 2, T(1), 20, 33, 0, {T(57), T(14.25), T(132)}},
+        {T(3), 0, 1, T(1.5), 20, 33, 43, {T(82.5), T(27.5), T(195)}},  // 24 + 19 behind 35 / 1.5
+        {T(-5), 1, 0, T(1), 20, 0, 54, {T(27), T(27), T(54)}},         // 0 or below reads as 1
+        {T(1.9999), 0, 0, T(1.9999), 20, 0, 37, {-1, -1, -1}},
+        {T(0.9765625), 0, 0, T(0.9765625), 20, 0, 55, {-1, -1, -1}},
+        {T(0.97), 0, -1, T(1.94), 38, 74, 56, {-1, -1, -1}},
+        {T(0.1), 0, -1, T(0.2), 61, 120, 235, {T(41.75), T(417.5), -1}},  // not brought up further
+        {T(0.7), 0, -1, T(1.4), 61, 120, 85, {-1, -1, -1}},
+        {T(0.5), 0, -1, T(1), 61, 120, 0, {T(30), T(60), T(60)}},
+    };
+    Stream<V> s(1, 0);
+    T got[3];
+    for (const auto& c : cases) {
+        ASSERT_EQ(R::coef_setup(&s.coef, c.ratio, c.forced, 0), 0);
+        const auto& o = s.coef;
+        EXPECT_TRUE(o.octaves == c.k && o.ratio == c.r && o.half_filter.points == c.half && o.skip_mid == c.skip_mid &&
+                    o.skip_out == c.skip_out) << c.ratio;
+        R::delay(&got[0], &s.coef, 0), R::delay(&got[1], &s.coef, 1), R::settle(&got[2], &s.coef, 0);
+        for (int i = 0; i < 3; ++i) EXPECT_TRUE(c.figures[i] < 0 || got[i] == c.figures[i]) << c.ratio << " figure " << i;
+        EXPECT_TRUE(R::coef_setup(&s.coef, T(8), 0, 1) == -1 && s.coef.octaves == c.k);  // reserved: nothing stored
+    }
+    typename R::Coef fresh;  // never set up: r 0, total = s, resampling formula
+    R::coef_init(&fresh), R::delay(&got[0], &fresh, 1);
+    EXPECT_EQ(got[0], T(17.5));
+}
+
+// Inputs asked for by get_in_pts give what get_out_pts promises; the edges.
+TYPED_TEST(StreamingResampler, PointCountsAgree) {
+    using R = Rsmp<TypeParam>;
+    for (double ratio : {0.1, 0.97, 1.0, 1.25, 1.9999, 2.0, 3.0, 4.0, 6.3, 1000.0}) {
+        Stream<TypeParam> s(ratio, 0);
+        for (int32_t settled : {0, 1})
+            for (int32_t want : {0, 1, 2, 7, 100, 4096, 100000}) {
+                int32_t in = -1;
+                ASSERT_EQ(R::in_pts(&in, &s.coef, want, settled), 0);
+                EXPECT_GE(s.out_pts(in, settled, 1), want) << "ratio " << ratio << " settled " << settled;
+                EXPECT_TRUE(s.out_pts(in, 0, 0) >= s.out_pts(in, 0, 1) && (want != 0 || !settled || in == 0)) << ratio;
+            }
+        int32_t n = 5;
+        EXPECT_TRUE(R::in_pts(nullptr, &s.coef, 10, 0) == 0 && R::in_pts(&n, nullptr, 10, 0) == -1 && n == 5);
+        EXPECT_TRUE(ratio != 1.0 || (s.out_pts(-7, 1, 0) == 0 && s.out_pts(13, 1, 0) == 13));  // a copy
+    }
+}
+
+// Blocks of random sizes, each limited to the most it can give, continue one
+// stream: one call's points, up to the rounding that block boundaries change;
+// after the start-up each block gives at least the certain count.
+TYPED_TEST(StreamingResampler, BlocksContinueOneStream) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const int32_t total = 3000;
+    for (double ratio : {0.1, 0.5, 0.97, 1.0, 1.088, 1.5, 2.0, 3.3, 4.0, 8.0})
+        for (int64_t w : {1, 2}) {  // real, complex
+            const auto x = random_values<T>(size_t(total * w), 7);
+            Stream<V> whole(ratio, ratio == 1.0), blocks(ratio, ratio == 1.0);
+            Vec<V> in(x, w == 2), out, work, scratch;
+            in->delta = T(0.5);
+            out->points = whole.out_pts(total, 0, 0);
+            ASSERT_EQ(whole.run(in.get(), out.get(), work.get()), 0);
+            EXPECT_EQ(out->delta, T(0.5) * T(ratio));
+            std::vector<T> got;
+            std::mt19937 rng(11);
+            for (int32_t at = 0, len = 0; at < total; at += len) {
+                len = std::min<int32_t>(int32_t(rng() % 400), total - at);
+                Vec<V> block(std::vector<T>(x.begin() + at * w, x.begin() + (at + len) * w), w == 2);
+                const int32_t most = blocks.out_pts(len, 0, 0), least = blocks.out_pts(len, 0, 1);
+                const bool started = blocks.state.skip_mid == 0 && blocks.state.skip_out == 0;
+                work->points = most;
+                ASSERT_EQ(blocks.run(block.get(), work.get(), at % 3 ? scratch.get() : nullptr), 0);
+                EXPECT_TRUE(work->points <= most && (!started || work->points >= least)) << ratio;
+                got.insert(got.end(), work->data, work->data + work->points * w);
+            }
+            ASSERT_EQ(got.size(), size_t(out.scalars())) << "ratio " << ratio;
+            for (size_t i = 0; i < got.size(); ++i)
+                ASSERT_TRUE(near(got[i], out[int64_t(i)], 2000 * std::numeric_limits<T>::epsilon())) << ratio << " " << i;
+        }
+}
+
+// A tone comes out delayed by get_delay_pts, in input and in output points.
+TYPED_TEST(StreamingResampler, ToneDelay) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    for (double ratio : {0.1, 0.7, 0.97, 1.0, 1.088, 1.5, 2.0, 3.3, 8.0}) {
+        Stream<V> s(ratio, ratio == 1.0);
+        const double f = 0.01 / std::max(ratio, 1.0);
+        Vec<V> in, out;
+        in->points = 16000, out->points = s.out_pts(16000, 0, 0);
+        ASSERT_EQ(t_cos(in.get(), T(f), T(0)), 0);
+        ASSERT_EQ(s.run(in.get(), out.get(), nullptr, false), 0);  // no state: output j at input time j * ratio
+        std::complex<double> z = 0;  // Hann-weighted phase of the settled middle
+        const int32_t a = out->points / 4, b = out->points - 300;
+        for (int32_t j = a; j < b; ++j)
+            z += (1 - std::cos(2 * M_PI * (j - a) / (b - a))) * double(out[j]) * std::polar(1.0, -2 * M_PI * f * ratio * j);
+        T want = 0, want_out = 0;
+        Rsmp<V>::delay(&want, &s.coef, 0), Rsmp<V>::delay(&want_out, &s.coef, 1);
+        const double period = 1 / f, got = std::fmod(-std::arg(z) / (2 * M_PI * f) - want + 2.5 * period, period) - period / 2;
+        EXPECT_TRUE(near(got, 0, 0.1) && near(want_out * ratio, want, 1e-4 * want)) << ratio << ": " << got;
+    }
+}
+
+// |sum of taps[i] e^(-j 2 pi f i / step)| / step: a filter's gain at f
+// cycles per sample, the table's kernel read at `step` entries a sample.
+// A half filter (centre tap last) counts its mirrored half too.
+template <class V>
+double gain(const V* taps, double f, bool half, int64_t from = 0, double step = 1) {
+    std::vector<double> t(taps->data + from, taps->data + taps->points);
+    if (half) t.insert(t.end(), t.rbegin() + 1, t.rend());
+    std::complex<double> z = 0;
+    for (size_t i = 0; i < t.size(); ++i) z += t[i] * std::polar(1.0, -2 * M_PI * f * double(i) / step);
+    return std::abs(z) / step;
+}
+
+// The road of one measurement: a tone with noise from the generators,
+// streamed through the resampler in blocks, turned into spectra, averaged
+// over sweeps and read by the peak search.
+TYPED_TEST(StreamingResampler, MeasurementRoad) {
+    using V = TypeParam;
+    using T = real_of<V>;
+    const double rate_in = 48000, rate_out = 44100, tone = 1000, amplitude = 0.5;
+    const int32_t n = 4096, sweeps = 32;
+
+    // 48 kHz input: tone plus Gaussian noise of standard deviation 1e-3
+    Vec<V> in, noise;
+    in->points = noise->points = int32_t((sweeps + 1) * n * rate_in / rate_out);
+    in->delta = noise->delta = T(1 / rate_in);
+    ASSERT_EQ(t_cos(in.get(), T(tone), T(0.3)) | t_scale(in.get(), T(amplitude)), 0);
+    ASSERT_EQ(t_rand(noise.get(), 1) | t_scale(noise.get(), T(1e-3)) | t_add(in.get(), noise.get(), in.get()), 0);
+
+    // to 44.1 kHz in blocks of 4096, start-up discarded
+    Stream<V> rs(rate_in / rate_out, 0);
+    std::vector<T> stream;
+    Vec<V> block, out, work;
+    for (int32_t at = 0; at < in->points; at += 4096) {
+        out->points = 8192;
+        ASSERT_EQ(t_subvec(in.get(), block.get(), at, 4096) | rs.run(block.get(), out.get(), work.get()), 0);
+        stream.insert(stream.end(), out->data, out->data + out->points);
+    }
+    ASSERT_TRUE(stream.size() >= size_t(sweeps * n) && near(out->delta, 1 / rate_out, 1e-6 / rate_out));
+
+    // the cascade's gain: pre-filter, kernel, half-band filter at twice the output rate
+    const double f = tone / rate_in, phases = (rs.coef.table.points - 2) / rs.coef.table.data[0];
+    const double cascade = gain(&rs.coef.pre_filter, f, true) * gain(&rs.coef.half_filter, f * rs.coef.ratio / 2, true) *
+                           gain(&rs.coef.table, f, false, 1, phases);
+
+    Vec<V> record, spectrum, acc, peak, gauss;
+    std::vector<double> spread;  // floor's highest bin over its mean after 1, 4, 32 sweeps
+    for (int32_t k = 1; k <= sweeps; ++k) {
+        record.assign(std::vector<T>(stream.begin() + (k - 1) * n, stream.begin() + k * n), false);
+        record->delta = out->delta;
+        ASSERT_EQ(t_fft(record.get(), spectrum.get(), n, T(1), VLX_WINDOW_FLATTOP, 0) |
+                      t_avg(spectrum.get(), acc.get(), nullptr, VLX_AVG_LINEAR | VLX_AVG_POWER, k, 0, T(-1), T(0)), 0);
+        if (k == 1) {  // frequency: the log-ratio peak's constant fits this Gaussian
+            ASSERT_EQ(t_window_gauss(record.get(), T(1 / (2 * M_PI * std::sqrt(2 * 0.792233201343665))), 0) |
+                          t_fft(record.get(), gauss.get(), n, T(1), 0, VLX_SPEC_NO_WINDOW) |
+                          t_peak(gauss.get(), peak.get(), VLX_PEAK_LOG_RATIO, 0), 0);
+            EXPECT_TRUE(near(peak[1], tone / rate_out * n, 0.01) && near(gauss->delta, rate_out / n, 1e-3)) << peak[1];
+        }
+        if (k == 1 || k == 4 || k == sweeps) {
+            double top = 0, sum = 0;
+            for (int32_t b = 300; b < 700; ++b) top = std::max(top, double(acc[b])), sum += double(acc[b]);
+            spread.push_back(top / (sum / 400));
+        }
+    }
+    ASSERT_EQ(t_peak(acc.get(), peak.get(), VLX_PEAK_SAMPLE, 0), 0);
+    const double db = 20 * std::log10(std::sqrt(double(peak[0])) / (amplitude * cascade));
+    EXPECT_TRUE(near(db, 0, 0.01)) << "reads " << db << " dB from the cascade's gain " << cascade;
+    EXPECT_TRUE(spread[2] < spread[1] && spread[1] < spread[0] && spread[2] < 2.0) << spread[0] << " " << spread[1];
+}
+
+}  // namespace
