@@ -1,6 +1,8 @@
 #include "vlx_io.hpp"
 
 #include <algorithm>
+#include <cctype>
+#include <cmath>
 #include <cerrno>
 #include <cstring>
 #include <unistd.h>
@@ -94,7 +96,9 @@ Recording read_input(const std::string& path, int channel) {
             throw Failure{path + ": not a readable sample file (corrupt or truncated at vector " +
                           std::to_string(rec.vectors.size() + 1) + ")"};
         }
-        rec.vectors.push_back(std::move(v));
+        // White space after the last vector of a text file reads as one
+        // more, empty vector: it carries nothing.
+        if (v->points > 0) rec.vectors.push_back(std::move(v));
     }
     vlxf_fclose(in);
     if (rec.vectors.empty()) throw Failure{path + ": holds no samples"};

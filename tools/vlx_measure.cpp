@@ -4,6 +4,7 @@
 #include <cmath>
 #include <cstdio>
 #include <cstring>
+#include <fcntl.h>
 #include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -49,8 +50,9 @@ struct Resampler {
         vlxh_rsmp_state_init(&state);
         check(vlxh_rsmp_coef_alloc(&coef, 0), "resampler set-up");
         check(vlxh_rsmp_coef_setup(&coef, ratio, 0, 0), "resampler set-up");
+        // No reset: a fresh state discards nothing, and the caller drops
+        // the cascade's delay itself.
         check(vlxh_rsmp_state_alloc(&coef, &state, complex), "resampler set-up");
-        check(vlxh_rsmp_state_reset(&coef, &state), "resampler set-up");
     }
     ~Resampler() {
         vlxh_rsmp_state_destroy(&state);
@@ -94,12 +96,11 @@ std::string window_name(int32_t id) {
 void resample(vlx_t* in, vlx_t* out, double ratio, bool progress) {
     if (!(ratio > 0) || !std::isfinite(ratio)) throw Failure{"the ratio must be a positive number"};
     Resampler rs(ratio, in->complex);
-    // Outputs lost to start-up are discarded by the state; the rest of the
-    // group delay is dropped here so the output lines up with the input.
-    double delay = 0, settle = 0;
+    // The group delay is dropped from the front so the output lines up with
+    // the input.
+    double delay = 0;
     vlxh_rsmp_get_delay_pts(&delay, &rs.coef, 1);
-    vlxh_rsmp_get_settle_pts(&settle, &rs.coef, 1);
-    const int64_t lead = std::max<int64_t>(0, std::llround(delay - settle));
+    const int64_t lead = std::max<int64_t>(0, std::llround(delay));
     const int64_t wanted = std::llround(in->points / ratio);
     if (wanted > INT32_MAX) throw Failure{"the result would be too long"};
 
@@ -165,17 +166,29 @@ void measure_spectrum(vlx_t* signal, const SpectrumSettings& s, vlx_t* power, Re
     }
     power->delta = spectrum->delta;
 
+    // The peak bin gives the level (a sine's peak bin reads its amplitude);
+    // the power centroid over the main lobe gives where the peak lies, which
+    // is unbiased for any symmetric window, unlike a parabola through a flat
+    // top.
     Vector peak;
-    check(vlxs_peak(power, &peak, VLX_PEAK_PARABOLA, 0), "peak search");
-    // A sine's peak bin reads its amplitude; the parabola refines where it lies.
-    r.frequency = peak->data[1] * power->delta;
-    Vector sample_peak;
-    check(vlxs_peak(power, &sample_peak, VLX_PEAK_SAMPLE, 0), "peak search");
-    r.level_db = 10.0 * std::log10(std::max(sample_peak->data[0], 1e-40));
+    check(vlxs_peak(power, &peak, VLX_PEAK_SAMPLE, 0), "peak search");
+    r.level_db = 10.0 * std::log10(std::max(peak->data[0], 1e-40));
+    const int32_t top = static_cast<int32_t>(peak->data[1]);
+    const double width = std::min<double>(span, signal->points);
+    double bw6 = 0;
+    check(vlx_window_metric(&bw6, 2, s.window, nfft, width), "window metric");
+    const int32_t half = std::max<int32_t>(2, static_cast<int32_t>(std::ceil(1.5 * bw6)));
+    double moment = 0, total = 0;
+    for (int32_t k = std::max(0, top - half); k <= std::min(power->points - 1, top + half); ++k) {
+        moment += power->data[k] * k;
+        total += power->data[k];
+    }
+    const double index = total > 0 ? moment / total : top;
+    // A complex record gives a two-sided spectrum with zero frequency in the middle.
+    r.frequency = (signal->complex ? index - power->points / 2 : index) * power->delta;
     Vector median;
     check(vlxs_median(power, &median), "noise floor");
     r.floor_db = 10.0 * std::log10(std::max(median->data[0], 1e-40));
-    const double width = std::min<double>(span, signal->points);
     check(vlx_window_metric(&r.enbw_bins, 0, s.window, nfft, width), "window metric");
     check(vlx_window_metric(&r.bw3_bins, 1, s.window, nfft, width), "window metric");
     r.bin_hz = power->delta;
