@@ -1,6 +1,5 @@
-// Shared test support: the two families as GoogleTest types, overloads that
-// route a call to the twin of the vector's family, an owning vector wrapper,
-// and closeness checks in which a NaN never passes.
+// Shared test support: the two families as GoogleTest types, overloads that route a call to the twin of the vector's
+// family, an owning vector wrapper, and closeness checks in which a NaN never passes.
 #pragma once
 
 #include "libvlx.h"
@@ -22,6 +21,12 @@ namespace vlxtest {
 
 using Families = ::testing::Types<vlx_t, vlxf_t>;
 
+// A typed test suite over both families: VLX_TYPED_SUITE(Name); then TYPED_TEST(Name, ...).
+#define VLX_TYPED_SUITE(name) \
+    template <class V>        \
+    class name : public ::testing::Test {}; \
+    TYPED_TEST_SUITE(name, ::vlxtest::Families)
+
 // The scalar type of a family: double for vlx_t, float for vlxf_t.
 template <class V>
 using real_of = std::remove_pointer_t<decltype(V::data)>;
@@ -29,8 +34,8 @@ using real_of = std::remove_pointer_t<decltype(V::data)>;
 template <class V>
 constexpr bool is_double = std::is_same_v<V, vlx_t>;
 
-// Defines `name(vector, args...)` for both families, forwarding to the
-// double export or its float twin by the type of the first argument.
+// Defines `name(vector, args...)` for both families, forwarding to the double export or its float twin by the type of
+// the first argument.
 #define VLX_TEST_TWIN(name, dfn, ffn)                                                            \
     template <class... A>                                                                        \
     inline auto name(vlx_t* v, A&&... a) { return dfn(v, std::forward<A>(a)...); }              \
@@ -40,19 +45,13 @@ constexpr bool is_double = std::is_same_v<V, vlx_t>;
 // The usual prefixes: VLX_TWIN(i, neg) is t_neg over vlxi_neg and vlxfi_neg.
 #define VLX_TWIN(prefix, name) VLX_TEST_TWIN(t_##name, vlx##prefix##_##name, vlxf##prefix##_##name)
 
-VLX_TEST_TWIN(t_init, vlx_init, vlxf_init)
-VLX_TEST_TWIN(t_destroy, vlx_destroy, vlxf_destroy)
-VLX_TEST_TWIN(t_alloc, vlx_alloc, vlxf_alloc)
-VLX_TEST_TWIN(t_realloc, vlx_realloc, vlxf_realloc)
-VLX_TEST_TWIN(t_zero, vlxi_zero, vlxfi_zero)
-VLX_TEST_TWIN(t_rtoc, vlxi_rtoc, vlxfi_rtoc)
-VLX_TEST_TWIN(t_zpad, vlxi_zpad, vlxfi_zpad)
-VLX_TEST_TWIN(t_append, vlx_append, vlxf_append)
-VLX_TEST_TWIN(t_copy, vlx_copy, vlxf_copy)
-VLX_TEST_TWIN(t_copy_at_most, vlx_copy_at_most, vlxf_copy_at_most)
-VLX_TEST_TWIN(t_subvec, vlxu_subvec, vlxfu_subvec)
+VLX_TEST_TWIN(t_init, vlx_init, vlxf_init) VLX_TEST_TWIN(t_destroy, vlx_destroy, vlxf_destroy)
+VLX_TEST_TWIN(t_alloc, vlx_alloc, vlxf_alloc) VLX_TEST_TWIN(t_realloc, vlx_realloc, vlxf_realloc)
+VLX_TEST_TWIN(t_zero, vlxi_zero, vlxfi_zero) VLX_TEST_TWIN(t_rtoc, vlxi_rtoc, vlxfi_rtoc)
+VLX_TEST_TWIN(t_zpad, vlxi_zpad, vlxfi_zpad) VLX_TEST_TWIN(t_append, vlx_append, vlxf_append)
+VLX_TEST_TWIN(t_copy, vlx_copy, vlxf_copy) VLX_TEST_TWIN(t_copy_at_most, vlx_copy_at_most, vlxf_copy_at_most)
+VLX_TEST_TWIN(t_subvec, vlxu_subvec, vlxfu_subvec) VLX_TEST_TWIN(t_cmp, vlx_cmp, vlxf_cmp)
 VLX_TEST_TWIN(t_insert_subvec, vlx_insert_subvec, vlxf_insert_subvec)
-VLX_TEST_TWIN(t_cmp, vlx_cmp, vlxf_cmp)
 
 // An owning vector for tests: initialised on construction, destroyed on exit.
 template <class V>
@@ -132,8 +131,7 @@ template <class V>
                                          << v->delta << "; want " << points << ", " << is_complex << ", " << delta;
 }
 
-// Every scalar of `got` within `ulps` of `want` (0: bit for bit); a NaN
-// matches only a NaN.
+// Every scalar of `got` within `ulps` of `want` (0: bit for bit); a NaN matches only a NaN.
 template <class T>
 ::testing::AssertionResult same_scalars(const std::vector<T>& got, const std::vector<T>& want, double ulps = 0) {
     if (got.size() != want.size()) return ::testing::AssertionFailure() << got.size() << " scalars, want " << want.size();
@@ -155,8 +153,7 @@ void set_hooks(int32_t (*a)(V*), int32_t (*r)(V*, int32_t, int32_t), int32_t (*f
     }
 }
 
-// While in scope every allocation of the family fails: the hooks release the
-// old block and hand back no storage.
+// While in scope every allocation of the family fails: the hooks release the old block and hand back no storage.
 template <class V>
 struct FailingAlloc {
     static int32_t alloc(V* v) {

@@ -1,5 +1,5 @@
-// Regression: the twenty-number record against the closed-form least squares
-// in long double, and the settled results of degenerate vectors.
+// Regression: the twenty-number record against the closed-form least squares in long double, and the settled results
+// of degenerate vectors.
 #include "stats_support.hpp"
 
 using namespace vlxtest;
@@ -33,12 +33,10 @@ std::vector<LD> reference(const std::vector<LD>& x, const std::vector<LD>& y) {
 
 }  // namespace
 
-template <class V>
-class Regression : public ::testing::Test {};
-TYPED_TEST_SUITE(Regression, Families);
+VLX_TYPED_SUITE(Regression);
 
-// Real vectors (one crossing the 2048-point block, where x starts again at 0)
-// and a complex scatter far from the origin, against the long double fit.
+// Real vectors (one crossing the 2048-point block, where x starts again at 0) and a complex scatter far from the
+// origin, against the long double fit.
 TYPED_TEST(Regression, MatchesLeastSquares) {
     using T = real_of<TypeParam>;
     const LD tol = is_double<TypeParam> ? 1e-9L : 3e-3L;

@@ -20,11 +20,7 @@ constexpr real_of<V> bound_of() {
 
 // A statistic of src as (status, re, im, complex flag of the result).
 template <class V>
-struct StatResult {
-    int32_t status;
-    real_of<V> re, im;
-    int32_t complex;
-};
+struct StatResult { int32_t status; real_of<V> re, im; int32_t complex; };
 
 template <class V, class Fn>
 StatResult<V> stat(Fn fn, Vec<V>& src) {

@@ -1,24 +1,20 @@
-// Analytic signal and Hilbert transform: tones turn cos into sin, DC and
-// Nyquist have no quadrature part, and the short lengths keep their shape.
+// Analytic signal and Hilbert transform: tones turn cos into sin, DC and Nyquist have no quadrature part, and the
+// short lengths keep their shape.
 #include "fft_reference.hpp"
 
 using namespace vlxtest;
 
 namespace {
 
-VLX_TEST_TWIN(t_analytic, vlxi_analytic, vlxfi_analytic)
-VLX_TEST_TWIN(t_hilbert, vlxi_hilbert, vlxfi_hilbert)
+VLX_TEST_TWIN(t_analytic, vlxi_analytic, vlxfi_analytic) VLX_TEST_TWIN(t_hilbert, vlxi_hilbert, vlxfi_hilbert)
 
-template <class V>
-class AnalyticTest : public ::testing::Test {};
-TYPED_TEST_SUITE(AnalyticTest, Families);
+VLX_TYPED_SUITE(AnalyticTest);
 
 }  // namespace
 
-// x = a cos(w i) + DC + Nyquist (even N): the analytic signal is x + j a
-// sin(w i), the Hilbert transform a sin(w i), for real input and for complex
-// input with zero imaginary parts.  Tolerance as for the transforms of any
-// length up to L = 1024.
+// x = a cos(w i) + DC + Nyquist (even N): the analytic signal is x + j a sin(w i), the Hilbert transform a sin(w i),
+// for real input and for complex input with zero imaginary parts.  Tolerance as for the transforms of any length up
+// to L = 1024.
 TYPED_TEST(AnalyticTest, TonesAndEdgeBins) {
     using T = real_of<TypeParam>;
     const double tol = 2 * fftref::transform_tolerance(std::numeric_limits<T>::epsilon(), 10);
@@ -56,8 +52,8 @@ TYPED_TEST(AnalyticTest, ShortLengths) {
     for (size_t i = 0; i < 8; ++i) EXPECT_TRUE(near(a[i], want_a[i], 1e-6)) << i;
     for (size_t i = 0; i < 4; ++i) EXPECT_TRUE(near(h[i], want_h[i], 1e-6) && near(two[i], want_two[i], 1e-6)) << i;
 
-    // One real sample in a one-scalar block: the analytic signal keeps it
-    // (and delta), the Hilbert transform zeroes it in place and stays real.
+    // One real sample in a one-scalar block: the analytic signal keeps it (and delta), the Hilbert transform zeroes
+    // it in place and stays real.
     Vec<TypeParam> one({5}), zero({5});
     one->delta = T(4);
     ASSERT_EQ(t_analytic(&one), 0);

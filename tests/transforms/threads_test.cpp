@@ -1,5 +1,5 @@
-// Transforms on several threads sharing the caches while another thread
-// releases them: every result stays bit-identical to a single-threaded run.
+// Transforms on several threads sharing the caches while another thread releases them: every result stays
+// bit-identical to a single-threaded run.
 #include "fft_reference.hpp"
 
 #include <atomic>

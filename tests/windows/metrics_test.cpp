@@ -1,14 +1,12 @@
-// The metrics' fixed values, and the bandwidth table against widths measured
-// numerically on long windows of the catalogue's shapes.
+// The metrics' fixed values, and the bandwidth table against widths measured numerically on long windows of the
+// catalogue's shapes.
 #include "window_support.hpp"
 
 #include <numeric>
 
 using namespace vlxtest;
 
-template <class V>
-class Metrics : public ::testing::Test {};
-TYPED_TEST_SUITE(Metrics, Families);
+VLX_TYPED_SUITE(Metrics);
 
 namespace {
 

@@ -8,15 +8,8 @@
 
 namespace vlxtest {
 
-VLX_TWIN(i, window2)
-VLX_TWIN(i, window)
-VLX_TWIN(i, window_cos)
-VLX_TWIN(i, window_kaiser)
-VLX_TWIN(i, window_gauss)
-VLX_TWIN(i, window_sinc)
-VLX_TWIN(i, window_tukey)
-VLX_TWIN(i, window_fir)
-VLX_TWIN(i, swap_halves2)
+VLX_TWIN(i, window2) VLX_TWIN(i, window) VLX_TWIN(i, window_cos) VLX_TWIN(i, window_kaiser) VLX_TWIN(i, window_gauss)
+VLX_TWIN(i, window_sinc) VLX_TWIN(i, window_tukey) VLX_TWIN(i, window_fir) VLX_TWIN(i, swap_halves2)
 VLX_TEST_TWIN(t_synth, vlx_window_synth, vlxf_window_synth)
 VLX_TEST_TWIN(t_cos_sum, vlx_window_cos_sum, vlxf_window_cos_sum)
 
