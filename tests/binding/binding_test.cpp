@@ -54,9 +54,7 @@ std::string calls() {
     return fresh;
 }
 template <class V>
-std::string created() {
-    return std::string(1, 'c').append(std::to_string(api<V>::precision)).append(".");
-}
+std::string created() { return std::string(1, 'c').append(std::to_string(api<V>::precision)).append("."); }
 
 enum Kind { forward, inverse, real_fft, real_as_complex };
 
@@ -110,8 +108,7 @@ TYPED_TEST(Binding, Present) {
     const std::string c = created<TypeParam>();
     // Without KEEP each transform makes and frees its descriptor; forward scale 1/N.
     const struct { Kind kind; int n; std::string calls; } cases[] = {{forward, 8, c + "32.1/8 s4=0.125 m f x "},
-                 {inverse, 8, c + "32.1/8 s4=0.125 m b x "},
-                 {real_fft, 16, c + "33.1/16 s4=0.0625 m f x "},
+                 {inverse, 8, c + "32.1/8 s4=0.125 m b x "}, {real_fft, 16, c + "33.1/16 s4=0.0625 m f x "},
                  {real_fft, 1, c + "33.1/1 s4=1 m f x "},  // one real point comes back complex
                  {real_as_complex, 1, c + "32.1/1 s4=1 m f x "}};
     for (const auto& k : cases) {

@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
@@ -33,6 +34,13 @@ using real_of = std::remove_pointer_t<decltype(V::data)>;
 
 template <class V>
 constexpr bool is_double = std::is_same_v<V, vlx_t>;
+
+// The family's saturation bound, also the spacing a transform gives a vector of spacing 0.
+template <class V>
+constexpr real_of<V> bound_of() { return is_double<V> ? real_of<V>(1e100) : real_of<V>(1e15f); }
+
+template <class V>
+inline int32_t t_free_internal() { return is_double<V> ? vlx_free_internal() : vlxf_free_internal(); }
 
 // Defines `name(vector, args...)` for both families, forwarding to the double export or its float twin by the type of
 // the first argument.
@@ -98,9 +106,7 @@ std::vector<T> random_values(size_t n, uint32_t seed, double lo = -1.0, double h
 
 // Bit-for-bit equality (so -0.0 differs from +0.0, and equal NaNs match).
 template <class T>
-bool same_bits(T a, T b) {
-    return std::memcmp(&a, &b, sizeof(T)) == 0;
-}
+bool same_bits(T a, T b) { return std::memcmp(&a, &b, sizeof(T)) == 0; }
 
 // Distance in units in the last place; a NaN is infinitely far from anything.
 template <class T>
@@ -141,6 +147,26 @@ template <class T>
         if (!ok) return ::testing::AssertionFailure() << "scalar " << i << ": " << got[i] << " want " << want[i];
     }
     return ::testing::AssertionSuccess();
+}
+
+// x in blocks of random length below max_len (in place on odd ones if asked) through run(block, out), the outputs
+// joined.
+template <class V, class Run>
+std::vector<real_of<V>> in_blocks(const std::vector<real_of<V>>& x, bool xc, uint32_t seed, Run run, bool in_place = true,
+                                   int64_t max_len = 90) {
+    using T = real_of<V>;
+    const int64_t w = xc ? 2 : 1, total = int64_t(x.size()) / w;
+    std::vector<T> got;
+    std::mt19937 rng(seed);
+    for (int64_t at = 0, i = 0; at < total; ++i) {
+        const int64_t len = std::min<int64_t>(int64_t(rng() % uint64_t(max_len)), total - at);
+        Vec<V> block(std::vector<T>(x.begin() + at * w, x.begin() + (at + len) * w), xc), other;
+        V* out = in_place && i % 2 ? block.get() : other.get();
+        EXPECT_EQ(run(block.get(), out), 0);
+        got.insert(got.end(), out->data, out->data + out->points * w);
+        at += len;
+    }
+    return got;
 }
 
 // Installs the family's storage hooks; null restores the library's own.

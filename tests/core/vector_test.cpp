@@ -19,18 +19,13 @@ struct Counting {
     static int64_t wanted(const V* v) { return v->complex ? 2 * int64_t(v->points) : v->points; }
     static int32_t on_alloc(V* v) {
         ++allocs;
-        if (v->alloc > 0) {  // the hook releases the old block itself
-            std::free(v->data);
-            --live;
-        }
+        if (v->alloc > 0) std::free(v->data), --live;  // the hook releases the old block itself
         v->data = fail ? nullptr : static_cast<T*>(std::malloc(size_t(wanted(v)) * sizeof(T)));
         if (v->data) ++live;
         return 0;
     }
     static int32_t on_realloc(V* v, int32_t old_points, int32_t old_complex) {
-        ++reallocs;
-        last_old_points = old_points;
-        last_old_complex = old_complex;
+        ++reallocs, last_old_points = old_points, last_old_complex = old_complex;
         if (fail) {
             if (v->alloc > 0) --live, std::free(v->data);
             v->data = nullptr;
@@ -40,17 +35,8 @@ struct Counting {
         v->data = static_cast<T*>(std::realloc(v->data, size_t(wanted(v)) * sizeof(T)));
         return 0;
     }
-    static int32_t on_free(V* v) {
-        ++frees;
-        --live;
-        std::free(v->data);
-        return 0;
-    }
-    static void install() {
-        allocs = reallocs = frees = live = 0;
-        fail = false;
-        set_hooks<V>(&on_alloc, &on_realloc, &on_free);
-    }
+    static int32_t on_free(V* v) { return ++frees, --live, std::free(v->data), 0; }
+    static void install() { allocs = reallocs = frees = live = 0, fail = false, set_hooks<V>(&on_alloc, &on_realloc, &on_free); }
 };
 
 template <class V>
@@ -99,8 +85,7 @@ TYPED_TEST(VectorTest, FailedResizeLeavesTheEmptyState) {
     const Case cases[] = {
         {"alloc", [](V* v) { v->points = 100; return t_alloc(v); }},
         {"realloc", [](V* v) { v->points = 100; return t_realloc(v, 4, v->complex); }},
-        {"zero", [](V* v) { v->points = 100; return t_zero(v); }},
-        {"zpad", [](V* v) { return t_zpad(v, 100); }},
+        {"zero", [](V* v) { v->points = 100; return t_zero(v); }}, {"zpad", [](V* v) { return t_zpad(v, 100); }},
         {"append", [](V* v) { return t_append(v, v); }},
         {"rtoc", [](V* v) { v->complex = 0, v->points = 4; return t_rtoc(v); }},
     };
@@ -252,8 +237,7 @@ TYPED_TEST(VectorTest, CompareWalksDeltaThenSamples) {
         {{9, 9}, false, {1, 1}, false, 1, 3, -1},          // delta decides first
         {{1, nan}, false, {1, 7}, false, 0, 1, 0},         // NaN counts as equal
         {{1, 2}, true, {1}, false, 1, 1, 1},               // a.im = 2 against an absent 0
-        {{1, -2}, true, {1}, false, 1, 1, -1},
-        {{1, 0.5}, true, {1}, false, 1, 1, 0},
+        {{1, -2}, true, {1}, false, 1, 1, -1}, {{1, 0.5}, true, {1}, false, 1, 1, 0},
         {{3, 0, 1, 0}, true, {3, 0, 1, 1}, true, 0.5, 1, -1},
     };
     for (size_t i = 0; i < std::size(cases); ++i) {

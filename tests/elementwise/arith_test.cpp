@@ -26,7 +26,7 @@ VLX_TYPED_SUITE(Arith);
 template <class V>
 struct Limits {
     using T = real_of<V>;
-    static constexpr T big = is_double<V> ? T(1e100) : T(1e15f);
+    static constexpr T big = bound_of<V>();
     static constexpr T e = is_double<V> ? T(230.25850929940458) : T(34.538776f);
     static constexpr T tiny = is_double<V> ? T(2.2250738585072014e-308) : T(1.1754944e-38f);
     static constexpr T exp10_max = is_double<V> ? T(100) : T(15);
@@ -171,9 +171,7 @@ TYPED_TEST(Arith, StreamingLoopsMatchScalarOrder) {
     in[1401] = -above(big);
     in[1500] = big;
     Vec<V> v(in, true), power;
-    ASSERT_EQ(t_umagsq(v.get(), power.get()), 0);
-    ASSERT_EQ(t_scale(v.get(), T(0.7)), 0);
-    ASSERT_EQ(t_conj(v.get()), 0);
+    ASSERT_TRUE(t_umagsq(v.get(), power.get()) == 0 && t_scale(v.get(), T(0.7)) == 0 && t_conj(v.get()) == 0);
     for (int64_t i = 0; i < 1003; ++i) {
         const T a = in[2 * i], b = in[2 * i + 1];
         const T want = std::fabs(a) > big || std::fabs(b) > big ? big : b * b + a * a;

@@ -55,7 +55,7 @@ TYPED_TEST(Phase, EdgesOfSine) {
 TYPED_TEST(Phase, FixedCases) {
     using T = real_of<TypeParam>;
     const T pi = is_double<TypeParam> ? T(3.141592653589793) : T(3.1415927f);
-    const T b = is_double<TypeParam> ? T(1e100) : T(1e15f);
+    const T b = bound_of<TypeParam>();
     const T nan = std::numeric_limits<T>::quiet_NaN();
     int32_t clipped = -5;
     struct Row {

@@ -26,9 +26,7 @@ T blockwise(int64_t n, Term term) {
 }
 
 template <class T>
-T saturated(T x, T b) {
-    return x > b ? b : (x < -b ? -b : x);
-}
+T saturated(T x, T b) { return x > b ? b : (x < -b ? -b : x); }
 
 }  // namespace
 
@@ -62,18 +60,13 @@ TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
             long double scale = 0;  // what the ulps are counted in, if not the result
         };
         const Row rows[] = {
-            {"sum", STAT(t_sum), s1},
-            {"mean", STAT(t_mean), m},
-            {"magsq_sum", STAT(t_magsq_sum), sq},
-            {"rms", STAT(t_rms), std::sqrt(sq / n)},
-            {"pop_var", STAT(t_pop_var), var},
-            {"samp_var", STAT(t_samp_var), s2 / (n - 1)},
-            {"pop_stddev", STAT(t_pop_stddev), std::sqrt(var)},
+            {"sum", STAT(t_sum), s1}, {"mean", STAT(t_mean), m}, {"magsq_sum", STAT(t_magsq_sum), sq},
+            {"rms", STAT(t_rms), std::sqrt(sq / n)}, {"pop_var", STAT(t_pop_var), var},
+            {"samp_var", STAT(t_samp_var), s2 / (n - 1)}, {"pop_stddev", STAT(t_pop_stddev), std::sqrt(var)},
             {"samp_stddev", STAT(t_samp_stddev), std::sqrt(s2 / (n - 1))},
             {"skew", STAT(t_skew), (s3 / n) / (var * std::sqrt(var))},
             {"excess", STAT(t_excess), (s4 / n) / (var * var) - 3, (s4 / n) / (var * var)},
-            {"gmean", STAT(t_gmean), std::exp(logs / n)},
-            {"hmean", STAT(t_hmean), n / inv},
+            {"gmean", STAT(t_gmean), std::exp(logs / n)}, {"hmean", STAT(t_hmean), n / inv},
         };
         const double tolerance = 8.0 + 2.0 * std::sqrt(static_cast<double>(std::min<int64_t>(n, kBlock)));
         for (const Row& row : rows) {
@@ -142,16 +135,11 @@ TYPED_TEST(Moments, FixedResults) {
     using Fn = StatFn<TypeParam>;
     struct Row { const char* what; Fn fn; std::vector<T> in; bool complex; T re, im; };
     const Row rows[] = {
-        {"empty sum", STAT(t_sum), {}, true, 0, 0},
-        {"empty mean", STAT(t_mean), {}, false, 0, 0},
-        {"empty variance", STAT(t_pop_var), {}, false, 0, 0},
-        {"empty skew", STAT(t_skew), {}, false, 0, 0},
-        {"empty excess", STAT(t_excess), {}, false, -3, 0},
-        {"empty gmean", STAT(t_gmean), {}, true, 0, 0},
-        {"empty hmean", STAT(t_hmean), {}, true, 0, 0},
-        {"empty min", STAT(t_min), {}, false, 0, 0},
-        {"empty max", STAT(t_max), {}, true, 0, 0},
-        {"empty median", STAT(t_median), {}, false, 0, 0},
+        {"empty sum", STAT(t_sum), {}, true, 0, 0}, {"empty mean", STAT(t_mean), {}, false, 0, 0},
+        {"empty variance", STAT(t_pop_var), {}, false, 0, 0}, {"empty skew", STAT(t_skew), {}, false, 0, 0},
+        {"empty excess", STAT(t_excess), {}, false, -3, 0}, {"empty gmean", STAT(t_gmean), {}, true, 0, 0},
+        {"empty hmean", STAT(t_hmean), {}, true, 0, 0}, {"empty min", STAT(t_min), {}, false, 0, 0},
+        {"empty max", STAT(t_max), {}, true, 0, 0}, {"empty median", STAT(t_median), {}, false, 0, 0},
         {"constant skew", STAT(t_skew), {2.5, 2.5, 2.5, 2.5}, false, 0, 0},
         {"constant excess", STAT(t_excess), {2.5, 2.5, 2.5, 2.5}, false, -3, 0},
         {"one-point sample variance", STAT(t_samp_var), {7}, false, 0, 0},

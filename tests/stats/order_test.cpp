@@ -60,10 +60,7 @@ TYPED_TEST(Order, Median) {
     using T = real_of<TypeParam>;
     struct Row { std::vector<T> in; bool complex; T re, im; };
     const Row rows[] = {
-        {{5, 1, 4}, false, 4, 0},
-        {{5, 1, 4, 2}, false, 3, 0},
-        {{7}, false, 7, 0},
-        {{3, 0, 0, 1}, true, 1.5, 0.5},
+        {{5, 1, 4}, false, 4, 0}, {{5, 1, 4, 2}, false, 3, 0}, {{7}, false, 7, 0}, {{3, 0, 0, 1}, true, 1.5, 0.5},
         {{0, 9, 1, 0, 2, 2}, true, 2, 2},
     };
     for (const Row& row : rows) {

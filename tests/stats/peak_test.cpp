@@ -82,9 +82,7 @@ TYPED_TEST(Peak, ParabolaIsExact) {
 }
 
 // Hann window spectrum, amplitude at f bins from the centre.
-double hann_lobe(double f) {
-    return std::fabs(f) < 1e-9 ? 1.0 : std::sin(M_PI * f) / (M_PI * f) / (1.0 - f * f);
-}
+double hann_lobe(double f) { return std::fabs(f) < 1e-9 ? 1.0 : std::sin(M_PI * f) / (M_PI * f) / (1.0 - f * f); }
 
 // The log ratio puts the Gaussian lobe of its constant at its true position. On a Hann window's main-lobe power,
 // sampled where one sample off the top matches that Gaussian, both forms move monotonically with the true position

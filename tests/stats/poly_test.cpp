@@ -122,8 +122,7 @@ TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialAndExpandBack) {
                 EXPECT_TRUE(i == 0 || std::norm(LC(v[2 * i - 2], v[2 * i - 1])) <= std::norm(z) * (1 + 4 * eps));
             }
             // Roots back to coefficients: the monic polynomial, to the size of its terms.
-            ASSERT_EQ(t_pztoc(v.get()), 0);
-            ASSERT_TRUE(has_shape(v.get(), degree + 1, 1, 1));
+            ASSERT_TRUE(t_pztoc(v.get()) == 0 && has_shape(v.get(), degree + 1, 1, 1));
             long double size = 0;
             for (T x : a) size += std::fabs(static_cast<long double>(x / a[degree]));
             for (int k = 0; k <= degree; ++k) {
@@ -156,8 +155,7 @@ TYPED_TEST(Poly, ClosedFormsKeepRealRootsReal) {
         std::vector<T> a = rounded<TypeParam>(expand(r, u(rng) > 0 ? 2.5L : -0.75L));
         a.resize(6, T(0));  // leading zeros lower the degree
         Vec<TypeParam> src(a, false), dst;
-        ASSERT_EQ(t_proots(src.get(), dst.get()), 0);
-        ASSERT_EQ(dst->points, degree);
+        ASSERT_TRUE(t_proots(src.get(), dst.get()) == 0 && dst->points == degree);
         ASSERT_EQ(dst->complex, pairs ? 1 : 0) << "trial " << trial;
         const int w = dst->complex ? 2 : 1;
         for (int i = 0; i < degree; ++i) {
@@ -179,14 +177,11 @@ TYPED_TEST(Poly, FixedCases) {
     using T = real_of<TypeParam>;
     struct Row { const char* what; std::vector<T> coefficients, roots; int32_t status, complex; };
     const Row rows[] = {
-        {"double root below the zero tail", {1, 2, 1, 0, 0, 0}, {-1, -1}, 0, 0},
-        {"constant", {5}, {}, 0, 0},
-        {"empty", {}, {}, 0, 0},
-        {"zero polynomial", {0, 0, 0}, {}, 0, 0},
+        {"double root below the zero tail", {1, 2, 1, 0, 0, 0}, {-1, -1}, 0, 0}, {"constant", {5}, {}, 0, 0},
+        {"empty", {}, {}, 0, 0}, {"zero polynomial", {0, 0, 0}, {}, 0, 0},
         {"seven coefficients", {1, 2, 3, 4, 5, 6, 7}, {}, -1, 0},
         {"x^2 + 1, negative imaginary part first", {1, 0, 1}, {-0.0, -1, -0.0, 1}, 0, 1},
-        {"root at zero", {0, 3, 2}, {-1.5, -0.0}, 0, 0},
-        {"exact quadratic", {2, -3, 1}, {1, 2}, 0, 0},
+        {"root at zero", {0, 3, 2}, {-1.5, -0.0}, 0, 0}, {"exact quadratic", {2, -3, 1}, {1, 2}, 0, 0},
         {"linear", {3, -4}, {0.75}, 0, 0},
     };
     for (const Row& row : rows) {

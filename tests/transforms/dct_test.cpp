@@ -71,9 +71,7 @@ TYPED_TEST(DctTest, ForwardAndInverseForAnyLength) {
             const std::vector<T> x = random_values<T>(size_t(n), 5u * n);
             Vec<TypeParam> v(x, false);
             v->delta = T(0.25);
-            ASSERT_EQ(t_dct(&v, flags), 0);
-            ASSERT_EQ(v->points, n);
-            ASSERT_EQ(v->complex, 0);
+            ASSERT_TRUE(t_dct(&v, flags) == 0 && v->points == n && v->complex == 0);
             long double num = 0, den = 0;
             for (int32_t k = 0; k < n; ++k) {
                 long double want = 0;
@@ -110,7 +108,5 @@ TYPED_TEST(DctTest, Edges) {
     empty->delta = T(4);
     EXPECT_TRUE(t_dct(&empty, 1u) == 0 && same_bits(empty->delta, T(0.125)));
     empty->delta = T(0);
-    EXPECT_EQ(t_dct(&empty, 0u), 0);
-    EXPECT_TRUE(same_bits(empty->delta, is_double<TypeParam> ? T(1e100) : T(999999986991104.0f)));
-    EXPECT_EQ(t_dct(&c, 0u), -1);
+    EXPECT_TRUE(t_dct(&empty, 0u) == 0 && same_bits(empty->delta, bound_of<TypeParam>()) && t_dct(&c, 0u) == -1);
 }

@@ -78,8 +78,8 @@ std::vector<T> literal_table(size_t n) {
     return t;
 }
 
-// The engines' blocks by recursion.  A block depends only on its parent (complex) or its children (real), so any
-// such order gives the bits of the library's stage-by-stage level walk.
+// The engines' blocks by recursion.  A block depends only on its parent (complex) or its children (real), so any such
+// order gives the bits of the library's stage-by-stage level walk.
 template <class T>
 void literal_block(T* x, size_t len, size_t n, const std::vector<T>& t, bool inverse) {
     auto rot = [inverse](T& re, T& im, const T* tri) {

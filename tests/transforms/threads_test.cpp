@@ -40,8 +40,7 @@ TEST(Threads, SharedCachesUnderTeardown) {
             jobs.push_back(std::move(j));
         }
     }
-    ASSERT_EQ(vlx_free_internal(), 0);
-    ASSERT_EQ(vlxf_free_internal(), 0);
+    ASSERT_TRUE(vlx_free_internal() == 0 && vlxf_free_internal() == 0);
 
     std::atomic<bool> done{false};
     std::atomic<int> mismatches{0};

@@ -22,11 +22,6 @@ VLX_METRIC_TWIN(window_scale)
 VLX_METRIC_TWIN(window_metric)
 #undef VLX_METRIC_TWIN
 
-template <class V>
-inline int32_t t_free_internal() {
-    return is_double<V> ? vlx_free_internal() : vlxf_free_internal();
-}
-
 // Window id with flags on n points, through the synthesis engine.
 template <class V>
 std::vector<real_of<V>> synth(int32_t id, int32_t flags, int32_t n, double width = 0.0, int32_t* status = nullptr) {
