@@ -61,7 +61,6 @@ TYPED_TEST(Filters, DirectKernelsKeepTheirOrder) {
             ASSERT_EQ(t_fir(&in, &out, &filter, with_hist ? hist.get() : nullptr), 0);
             EXPECT_TRUE(has_shape(out.get(), n, (xc || hc) ? 1 : 0, 0.25));
             EXPECT_TRUE(same_scalars(out.values(), conv<T>(x, xc, h, hc, past))) << "m " << taps << " cx " << cx;
-            EXPECT_TRUE(close_to(out.values(), conv<long double>(x, xc, h, hc, past), is_double<V> ? 1e-13 : 2e-5));
             EXPECT_EQ(hist.values(), with_hist ? std::vector<T>(x.end() - (taps - 1) * (xc ? 2 : 1), x.end()) : past);
         }
 }
