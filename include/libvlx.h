@@ -18,6 +18,7 @@
 #define LIBVLX_H
 
 #include <stdint.h>
+#include <stdio.h>
 
 #if defined(_WIN32)
 #  if defined(VLX_BUILDING)
@@ -984,6 +985,46 @@ VLX_API int32_t vlxb_cspline_2d(const vlx_t* x, vlx_t* y, vlx_t* y2, double d0, 
 VLX_API int32_t vlxfb_cspline_2d(const vlxf_t* x, vlxf_t* y, vlxf_t* y2, float d0, float dn, int32_t end0, int32_t endn);
 
 /* ======================================================================== */
+/* Sample files                                                             */
+/* ======================================================================== */
+
+/* Here `vlxf_` names the file functions on double vectors (vlx_t) and
+ * `vlxff_` those on single-precision vectors (vlxf_t). */
+
+/* Format selector of vlxf_fwrite2: the low 8 bits choose the form, two flags
+ * leave out part of the output, other bits are ignored. */
+#define VLX_FORMAT_BINARY     0     /* binary form, read back by vlxf_fread */
+#define VLX_FORMAT_ASCII      1     /* text form, read back by vlxf_fread */
+#define VLX_FORMAT_SUMMARY    2     /* one line: size, spacing, first 32 samples */
+#define VLX_FORMAT_GNUPLOT    3     /* gnuplot script with inline data */
+#define VLX_FORMAT_TRACE      4     /* tab-separated trace with a display range */
+#define VLX_FORMAT_NO_HEADER  0x100 /* flag: leave the header out */
+#define VLX_FORMAT_NO_DATA    0x200 /* flag: leave the samples out */
+
+/* fopen(path, mode), except that path "-" is standard input (mode "r...") or
+ * output ("w...", else NULL), in binary mode if mode[1] or mode[2] is 'b'. */
+VLX_API FILE* vlxf_fopen(const char* path, const char* mode);
+VLX_API FILE* vlxff_fopen(const char* path, const char* mode);
+/* fclose(stream), except that standard input and output stay open (0). */
+VLX_API int32_t vlxf_fclose(FILE* stream);
+VLX_API int32_t vlxff_fclose(FILE* stream);
+/* Reads the next vector of a stream into the initialised v, text or binary
+ * form as the first byte says, scalars of either width.  Returns 1 when a
+ * vector was read, 0 when the stream was at its end, -1 on failure. */
+VLX_API int32_t vlxf_fread(vlx_t* v, FILE* stream);
+VLX_API int32_t vlxff_fread(vlxf_t* v, FILE* stream);
+/* Writes v in the binary form.  Returns 0, -1 on a short write. */
+VLX_API int32_t vlxf_fwrite(const vlx_t* v, FILE* stream);
+VLX_API int32_t vlxff_fwrite(const vlxf_t* v, FILE* stream);
+/* Writes v in the text form (16 significant digits; vlxff_: 7).  Returns 0. */
+VLX_API int32_t vlxf_fwrite_ascii(const vlx_t* v, FILE* stream);
+VLX_API int32_t vlxff_fwrite_ascii(const vlxf_t* v, FILE* stream);
+/* Writes v in the form VLX_FORMAT_* with the flags.  Returns 0; -1 for a form
+ * above 4 or a short binary write; the trace header passes on a peak failure. */
+VLX_API int32_t vlxf_fwrite2(const vlx_t* v, FILE* stream, int32_t format);
+VLX_API int32_t vlxff_fwrite2(const vlxf_t* v, FILE* stream, int32_t format);
+
+/* ======================================================================== */
 /* Internal helpers, exported for the library's own layers and for tests.   */
 /* Applications do not normally need them.                                  */
 /* ======================================================================== */
@@ -1094,6 +1135,19 @@ VLX_API int32_t vlxf_window_cos_sum(vlxf_t* w, vlxf_t* coefs, int32_t flags, flo
  * square for p = 2, else 0. */
 VLX_API double vlx_sinc_pow(double a, double p);
 VLX_API float vlxf_sinc_pow(float a, float p);
+
+/* --- sample files --- */
+
+/* The two forms of vlxf_fread on their own, from the stream's position.
+ * Return 1 when a vector was read, -1 on failure. */
+VLX_API int32_t vlxf_read_text(vlx_t* v, FILE* stream);
+VLX_API int32_t vlxff_read_text(vlxf_t* v, FILE* stream);
+VLX_API int32_t vlxf_read_binary(vlx_t* v, FILE* stream);
+VLX_API int32_t vlxff_read_binary(vlxf_t* v, FILE* stream);
+/* Display range of the trace form: value (0 or less counts as 1) rounded up
+ * to 1, 2, 4, 5 or 10 times its decade, at most 1e100 (vlxff_: 1e15). */
+VLX_API double vlxf_auto_range(double value);
+VLX_API float vlxff_auto_range(float value);
 
 #ifdef __cplusplus
 }

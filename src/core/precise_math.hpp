@@ -45,6 +45,7 @@ inline T own_atan2(T y, T x) {
 }
 inline double hypot64(double a, double b) { return std::hypot(a, b); }
 inline double fmod64(double x, double y) { return std::fmod(x, y); }
+inline double pow64(double x, double y) { return std::pow(x, y); }
 // Both twins take hypot in double; the float twin rounds the result.
 template <class T>
 inline T wide_hypot(T a, T b) { return static_cast<T>(hypot64(static_cast<double>(a), static_cast<double>(b))); }

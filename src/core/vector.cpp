@@ -93,7 +93,14 @@ int32_t alloc(V* v) {
     const int64_t required = scalar_count(v);
     if (required <= v->alloc) return 0;
     if (!representable(required)) {
-        if (Hooks<V>::alloc == nullptr && v->alloc > 0) std::free(v->data);
+        // The old samples are dropped as on any allocation; the hook that
+        // would have released them is not called, so release them here.
+        if (v->alloc > 0) {
+            if (Hooks<V>::free != nullptr)
+                Hooks<V>::free(v);
+            else if (Hooks<V>::alloc == nullptr)
+                std::free(v->data);
+        }
         return fail_empty(v);
     }
     if (Hooks<V>::alloc != nullptr) {

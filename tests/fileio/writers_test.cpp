@@ -1,0 +1,180 @@
+// The writers byte for byte, round trips through the reader in both families,
+// the gnuplot script through gnuplot, and text under a decimal-comma locale.
+#include "fileio_support.hpp"
+
+#include <clocale>
+#include <fstream>
+#include <thread>
+
+using namespace vlxtest;
+
+template <class V>
+class Writers : public ::testing::Test {};
+TYPED_TEST_SUITE(Writers, Families);
+
+namespace {
+
+// The value read is the value written in the reader's type: converted for
+// binary files, for text the value of the printed digits (16, or 7 for float
+// vectors) parsed independently.  Bit for bit, signs of zero and NaN included.
+template <class R, class W>
+void expect_same(const std::vector<R>& got, const std::vector<W>& written, bool text) {
+    std::vector<R> want;
+    for (W w : written) {
+        char digits[64];
+        std::snprintf(digits, sizeof digits, sizeof(W) == 8 ? "%.16g" : "%.7g", static_cast<double>(w));
+        const R parsed = sizeof(R) == 8 ? R(std::strtod(digits, nullptr)) : R(std::strtof(digits, nullptr));
+        want.push_back(text ? parsed : static_cast<R>(w));
+    }
+    EXPECT_TRUE(same_scalars(got, want));
+    for (size_t i = 0; i < got.size() && i < want.size(); ++i) EXPECT_EQ(std::signbit(got[i]), std::signbit(want[i]));
+}
+
+// Several vectors in one stream, written by family V and read by family R.
+template <class V, class R>
+void round_trip(int32_t format) {
+    using T = real_of<V>;
+    using L = std::numeric_limits<T>;
+    std::vector<T> many = random_values<T>(2500, 5, -1e6, 1e6);
+    many.insert(many.begin(), {L::quiet_NaN(), -L::quiet_NaN(), L::infinity(), -L::infinity(), T(-0.0), L::max(),
+                               L::lowest(), L::min(), L::denorm_min(), T(1) / T(3)});
+    // An empty text vector reads on into the next header: one, at the end.
+    const bool text = format == VLX_FORMAT_ASCII;
+    std::vector<std::pair<std::vector<T>, bool>> sets = {
+        {{T(-2.5)}, false}, {many, false}, {{T(-2.5), T(4)}, true}, {many, true}, {{}, text}};
+    if (!text) sets.push_back({{}, false});
+    FILE* f = std::tmpfile();
+    for (const auto& [x, is_complex] : sets) {
+        Vec<V> v(x, is_complex);
+        v->delta = T(0.25);
+        ASSERT_EQ(t_fwrite2(v.get(), f, format), 0);
+    }
+    std::rewind(f);
+    for (const auto& [x, is_complex] : sets) {
+        Vec<R> r;
+        ASSERT_EQ(t_fread(r.get(), f), 1);
+        EXPECT_TRUE(has_shape(r.get(), int32_t(x.size()) / (is_complex ? 2 : 1), is_complex, 0.25));
+        expect_same(r.values(), x, text);
+    }
+    EXPECT_EQ(t_fread(Vec<R>().get(), f), 0);
+    std::fclose(f);
+}
+
+}  // namespace
+
+TYPED_TEST(Writers, RoundTripsThroughTheReader) {
+    for (int32_t format : {VLX_FORMAT_BINARY, VLX_FORMAT_ASCII}) {
+        SCOPED_TRACE(format);
+        round_trip<TypeParam, vlx_t>(format);
+        round_trip<TypeParam, vlxf_t>(format);
+    }
+}
+
+TYPED_TEST(Writers, EveryFormByteForByte) {
+    const bool d = is_double<TypeParam>;
+    Vec<TypeParam> real({1.5, 0.1f, -2});  // 0.1f prints as 0.1 in 7 digits, 0.1 in 16
+    real->delta = 0.5;
+    if (d) real[1] = real_of<TypeParam>(0.1);
+    std::string ascii = "#VLX ASCII data from libvlx package\n#VLX points = 3\n#VLX complex = 0\n#VLX type = 8\n"
+                        "#VLX delta = 0.5\n1.5\n0.1\n-2\n";
+    if (!d) ascii[ascii.find('8')] = '4';
+    EXPECT_EQ(written(real.get(), VLX_FORMAT_ASCII), ascii);
+    EXPECT_EQ(written(real.get(), VLX_FORMAT_SUMMARY), "[3/0.5] 1.5 0.1 -2\n");
+    EXPECT_EQ(written(real.get(), VLX_FORMAT_GNUPLOT), "# gnuplot data from libvlx package\nset zeroaxis\n\nplot '-' "
+              "title \"Data\" with lines\n\n# X Y\n0 1.5\n0.5 0.1\n1 -2\ne\n\npause mouse key\n");
+    // The minimum, at the edge, decides the range.
+    EXPECT_EQ(written(real.get(), VLX_FORMAT_TRACE),
+              "LibvlxData\tTrue\nInputRange\t2\nInputZoom\tFalse\nTrcTtl\tLibvlx Data\nXDelta\t0.5\nY\n1.5\n0.1\n-2\n");
+    Vec<TypeParam> cx({1, 2, 3, -4}, true);
+    EXPECT_EQ(written(cx.get(), VLX_FORMAT_ASCII | VLX_FORMAT_NO_HEADER | 0x400), "1 2\n3 -4\n");
+    EXPECT_EQ(written(cx.get(), VLX_FORMAT_SUMMARY), "[2/1] 1,2 3,-4\n");
+    EXPECT_EQ(written(cx.get(), VLX_FORMAT_GNUPLOT | VLX_FORMAT_NO_DATA),
+              "# gnuplot data from libvlx package\nset zeroaxis\n\n"
+              "plot '-' using 1:(sqrt($2**2+$3**2)) title \"Magnitude\" with lines\n#plot '-' using 1:(atan2($3,$2)) "
+              "title \"Phase\" with lines\n#plot '-' using 1:2 title \"Real\" with lines\n#plot '-' using 1:3 title "
+              "\"Imag\" with lines\n#plot '-' using 2:3 title \"Real vs. Imag\" with lines\n#splot '-' title \"Data\" "
+              "with lines\n\n# X Yreal Yimag\n");
+    EXPECT_EQ(written(cx.get(), VLX_FORMAT_GNUPLOT | VLX_FORMAT_NO_HEADER), "0 1 2\n1 3 -4\n");
+    EXPECT_EQ(written(cx.get(), VLX_FORMAT_TRACE),
+              "LibvlxData\tTrue\nInputRange\t5\nInputZoom\tTrue\nTrcTtl\tLibvlx Data\nXDelta\t1\nY\n1\t2\n3\t-4\n");
+    const std::string bin = written(cx.get(), VLX_FORMAT_BINARY | VLX_FORMAT_NO_DATA);
+    std::string head("\xBE\x30\x03\xEB\x08\x04\0\0\x02\0\0\0\x01\0\0\0", 16);  // magic, type 1032, 2, 1
+    head[4] = d ? 8 : 4;
+    EXPECT_EQ(bin.substr(0, 16), head);
+    EXPECT_EQ(bin.size(), d ? 24u : 20u);
+    EXPECT_EQ(written(cx.get(), VLX_FORMAT_BINARY | VLX_FORMAT_NO_HEADER).size(), d ? 32u : 16u);
+    int32_t status = 0;
+    for (int32_t bad : {5, 0x1FF}) EXPECT_TRUE(written(cx.get(), bad, &status).empty() && status == -1);
+}
+
+TYPED_TEST(Writers, SummaryNumbersAndRanges) {
+    using T = real_of<TypeParam>;
+    Vec<TypeParam> v({T(9999), T(1234.5678), T(123456), T(1234567890), T(-1e12), T(NAN)});
+    EXPECT_EQ(written(v.get(), VLX_FORMAT_SUMMARY | VLX_FORMAT_NO_HEADER), "9999 1235 123456 1.235e+09 -1e+12 nan\n");
+    EXPECT_EQ(written(v.get(), VLX_FORMAT_SUMMARY | VLX_FORMAT_NO_DATA), "[6/1] \n");
+    EXPECT_EQ(written(v.get(), VLX_FORMAT_SUMMARY | VLX_FORMAT_NO_DATA | VLX_FORMAT_NO_HEADER), "\n");
+    EXPECT_EQ(written(v.get(), VLX_FORMAT_GNUPLOT | VLX_FORMAT_NO_DATA | VLX_FORMAT_NO_HEADER), "");
+    Vec<TypeParam> fresh, zeros({0, 0, 0});
+    EXPECT_EQ(written(fresh.get(), VLX_FORMAT_SUMMARY), "[0/1]\n");
+    for (auto* z : {fresh.get(), zeros.get()}) EXPECT_EQ(written(z, VLX_FORMAT_TRACE).substr(16, 13), "InputRange\t1\n");
+    std::vector<T> ramp;
+    std::string line;
+    for (int i = 0; i < 33; ++i) ramp.push_back(T(i)), line.append(i ? " " : "").append(std::to_string(i));
+    Vec<TypeParam> r33(ramp, false), r32(std::vector<T>(ramp.begin(), ramp.end() - 1), false);
+    EXPECT_EQ(written(r32.get(), VLX_FORMAT_SUMMARY | VLX_FORMAT_NO_HEADER), line.substr(0, line.size() - 3) + "\n");
+    EXPECT_EQ(written(r33.get(), VLX_FORMAT_SUMMARY), std::string("[33/1] ").append(line, 0, line.size() - 3) + " ...\n");
+    // The next of 1, 2, 4, 5, 10 in the decade; a rounding error above a step
+    // stays on it; at most the family's bound.
+    const T bound = is_double<TypeParam> ? T(1e100) : T(1e15f), up = T(1) + 2 * std::numeric_limits<T>::epsilon();
+    const std::vector<std::pair<T, T>> ranges = {{T(0), T(1)}, {T(-3), T(1)}, {T(1), T(1)}, {T(1.2), T(2)},
+                                                 {T(3), T(4)}, {T(4.5), T(5)}, {T(6), T(10)}, {T(2) * up, T(2)},
+                                                 {T(0.03), T(0.03) / T(3) * T(4)}, {bound * T(1.5), bound}};
+    for (const auto& [x, want] : ranges)
+        EXPECT_EQ(is_double<TypeParam> ? T(vlxf_auto_range(double(x))) : T(vlxff_auto_range(float(x))), want) << x;
+}
+
+TYPED_TEST(Writers, GnuplotDrawsTheScript) {
+    if (std::system("gnuplot --version > /dev/null 2>&1") != 0) GTEST_SKIP() << "gnuplot is not installed";
+    const std::string script = ::testing::TempDir() + "vlx_plot.gp", png = ::testing::TempDir() + "vlx_plot.png";
+    for (bool is_complex : {false, true}) {
+        Vec<TypeParam> v(random_values<real_of<TypeParam>>(200, 3), is_complex);
+        std::remove(png.c_str());
+        FILE* f = std::fopen(script.c_str(), "w");
+        ASSERT_EQ(t_fwrite2(v.get(), f, VLX_FORMAT_GNUPLOT), 0);
+        std::fclose(f);
+        // A gnuplot without mouse support stops at the closing pause, after
+        // the plot is out.
+        (void)std::system(("gnuplot -e \"set terminal png; set output '" + png + "'\" " + script + " 2>/dev/null").c_str());
+        char magic[4] = {};
+        std::ifstream(png, std::ios::binary).read(magic, 4);
+        EXPECT_EQ(std::string(magic + 1, 3), "PNG") << is_complex;
+    }
+}
+
+// Numbers are written and read in the C locale whatever the thread's or the
+// process's locale, with threads at work at once, and the caller's locale is
+// left as it was.
+TYPED_TEST(Writers, TextIsTheSameUnderADecimalComma) {
+    locale_t german = newlocale(LC_ALL_MASK, "de_DE.UTF-8", static_cast<locale_t>(nullptr));
+    if (german == static_cast<locale_t>(nullptr)) GTEST_SKIP() << "de_DE.UTF-8 is not available";
+    Vec<TypeParam> v(random_values<real_of<TypeParam>>(64, 9, -1e5, 1e5), true);
+    v->delta = real_of<TypeParam>(0.125);
+    std::vector<std::string> in_c;
+    for (int32_t fmt = 1; fmt <= 4; ++fmt) in_c.push_back(written(v.get(), fmt));
+    auto check = [&] {
+        ASSERT_STREQ(localeconv()->decimal_point, ",");
+        for (int32_t fmt = 1; fmt <= 4; ++fmt) EXPECT_EQ(written(v.get(), fmt), in_c[fmt - 1]) << fmt;
+        Vec<TypeParam> back;
+        EXPECT_EQ(read_from(back.get(), in_c[0]), 1);
+        EXPECT_TRUE(has_shape(back.get(), 32, 1, 0.125));
+        expect_same(back.values(), v.values(), true);
+        EXPECT_STREQ(localeconv()->decimal_point, ",");
+    };
+    auto in_thread = [&] { uselocale(german), check(), uselocale(LC_GLOBAL_LOCALE); };
+    std::thread first(in_thread), second(in_thread);
+    first.join(), second.join();
+    std::setlocale(LC_ALL, "de_DE.UTF-8");
+    check();
+    std::setlocale(LC_ALL, "C");
+    freelocale(german);
+}
