@@ -103,6 +103,12 @@ FAULTS = [
      "pp = {q.re + static_cast<T>(k * (k + 1)) * a[k], q.im};", "stats", "second derivative weight off by one"),
     ("interp-knot-edge", "src/stats/interp.cpp", "while (k < n - 1 && t >= xs[k]) ++k;",
      "while (k < n - 1 && t > xs[k]) ++k;", "stats", "a step query on a knot takes the segment below"),
+    # sample files
+    ("file-float-digits", "src/fileio/writers.cpp", 'static constexpr const char* line = "%.7g\\n";',
+     'static constexpr const char* line = "%.6g\\n";', "fileio", "float text lines written with a digit too few"),
+    ("file-swap32", "src/fileio/reader.cpp", "(x >> 24) | ((x >> 8) & 0xFF00u) | ((x << 8) & 0xFF0000u) | (x << 24)",
+     "(x >> 24) | ((x << 8) & 0xFF00u) | ((x >> 8) & 0xFF0000u) | (x << 24)", "fileio",
+     "byte swap of 32-bit words exchanges the middle bytes wrongly"),
     # binding of the vendor transform modules
     ("bind-scale-param", "src/core/binding.cpp", "constexpr int dfti_forward_scale = 4;",
      "constexpr int dfti_forward_scale = 5;", "binding", "forward scale set through the wrong parameter"),

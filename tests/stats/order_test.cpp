@@ -108,8 +108,7 @@ TYPED_TEST(Order, HistogramEdges) {
         Vec<TypeParam> dst;
         ASSERT_EQ(t_hist(src.get(), dst.get(), row.origin, row.width, row.bins), 0) << row.what;
         EXPECT_EQ(dst->complex, 0);
-        EXPECT_EQ(dst->delta, row.width) << row.what;
-        EXPECT_EQ(dst.values(), row.counts) << row.what;
+        EXPECT_TRUE(dst->delta == row.width && dst.values() == row.counts) << row.what;
     }
     // delta becomes the width also for an empty source; in place works
     Vec<TypeParam> empty;

@@ -188,8 +188,7 @@ TYPED_TEST(Poly, FixedCases) {
         Vec<TypeParam> src(row.coefficients, false), dst;
         ASSERT_EQ(t_proots(src.get(), dst.get()), row.status) << row.what;
         if (row.status) continue;
-        EXPECT_EQ(dst->complex, row.complex) << row.what;
-        EXPECT_TRUE(same_scalars(dst.values(), row.roots)) << row.what;
+        EXPECT_TRUE(dst->complex == row.complex && same_scalars(dst.values(), row.roots)) << row.what;
         // the same in place
         EXPECT_EQ(t_proots(src.get(), src.get()), 0);
         EXPECT_TRUE(same_scalars(src.values(), row.roots)) << row.what;
