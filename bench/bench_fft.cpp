@@ -1,11 +1,14 @@
 // Power-of-two complex transforms against FFTW, measured side by side.
 //
-// Without arguments: for N = 2^6 .. 2^20 and both precisions, repetitions of
+// Without arguments: for N = 2^8 .. 2^18 and both precisions, repetitions of
 // our transform and FFTW's (FFTW_MEASURE plan) alternate, so that the drift
 // of a shared machine affects both; the table gives median times per
 // transform and the median of the per-repetition ratios.  Each repetition is
 // a batch of forward + inverse round trips on the same buffer, refreshed from
 // the input at the same interval for both (FFTW's unscaled pair grows by N).
+// Then, the same way, vlxi_rfft against our complex transform (FFTW's r2c
+// against its c2c beside it) and the chirp path of vlxi_dft against
+// FFTW_ESTIMATE; --reps=K sets the repetitions (21).
 // With --accuracy: relative L2 errors of both against a long-double transform.
 // With --benchmark_* arguments: the Google Benchmark cases instead.
 #include "libvlx.h"
@@ -38,6 +41,8 @@ struct Ops<vlx_t> {
     static void destroy(vlx_t* v) { vlx_destroy(v); }
     static int alloc(vlx_t* v) { return vlx_alloc(v); }
     static int fft(vlx_t* v, int inverse) { return vlxi_fft(v, inverse); }
+    static int rfft(vlx_t* v) { return vlxi_rfft(v); }
+    static int dft(vlx_t* v, int inverse) { return vlxi_dft(v, inverse); }
     static const char* name() { return "double"; }
 };
 template <>
@@ -47,6 +52,8 @@ struct Ops<vlxf_t> {
     static void destroy(vlxf_t* v) { vlxf_destroy(v); }
     static int alloc(vlxf_t* v) { return vlxf_alloc(v); }
     static int fft(vlxf_t* v, int inverse) { return vlxfi_fft(v, inverse); }
+    static int rfft(vlxf_t* v) { return vlxfi_rfft(v); }
+    static int dft(vlxf_t* v, int inverse) { return vlxfi_dft(v, inverse); }
     static const char* name() { return "float"; }
 };
 
@@ -155,7 +162,7 @@ void interleaved_table(int reps) {
     using T [[maybe_unused]] = typename Ops<V>::T;
     std::printf("\ncomplex %s, seconds per transform (median of %d interleaved repetitions)\n", Ops<V>::name(), reps);
     std::printf("%8s %12s %12s %10s\n", "N", "libvlx", "FFTW", "ratio");
-    for (int m = 6; m <= 20; ++m) {
+    for (int m = 8; m <= 18; ++m) {
         const size_t n = size_t(1) << m;
         Ours<V> ours(n);
 #ifdef VLX_HAVE_FFTW
@@ -191,6 +198,136 @@ void interleaved_table(int reps) {
 #endif
         std::fflush(stdout);
     }
+}
+
+// One forward transform per call, each from a fresh copy of the input (the
+// copy is inside the timing for every engine): ours of n complex points, of
+// n reals (vlxi_rfft), and of any length (vlxi_dft); FFTW's c2c and r2c.
+template <class V>
+struct OursOnce {
+    using T = typename Ops<V>::T;
+    V v;
+    std::vector<T> x;
+    int kind;  // 0 complex fft, 1 rfft, 2 dft
+    size_t n;
+    OursOnce(size_t n_, int kind_) : x(input<T>(kind_ == 1 ? n_ : 2 * n_)), kind(kind_), n(n_) {
+        Ops<V>::init(&v);
+        v.points = static_cast<int32_t>(n);
+        v.complex = 1;
+        Ops<V>::alloc(&v);
+    }
+    ~OursOnce() { Ops<V>::destroy(&v); }
+    void call() {
+        v.points = static_cast<int32_t>(n);
+        v.complex = kind == 1 ? 0 : 1;
+        std::memcpy(v.data, x.data(), x.size() * sizeof(T));
+        if (kind == 0) Ops<V>::fft(&v, 0);
+        if (kind == 1) Ops<V>::rfft(&v);
+        if (kind == 2) Ops<V>::dft(&v, 0);
+    }
+};
+
+#ifdef VLX_HAVE_FFTW
+// kind 0 c2c in place, 1 r2c out of place; flags FFTW_MEASURE or FFTW_ESTIMATE.
+struct FftwOnce {
+    double* in;
+    fftw_complex* out;
+    fftw_plan plan;
+    std::vector<double> x;
+    FftwOnce(size_t n, int kind, unsigned flags) : x(input<double>(kind == 1 ? n : 2 * n)) {
+        in = fftw_alloc_real(2 * n);
+        out = fftw_alloc_complex(n / 2 + 1);
+        auto* c = reinterpret_cast<fftw_complex*>(in);
+        plan = kind == 1 ? fftw_plan_dft_r2c_1d(int(n), in, out, flags)
+                         : fftw_plan_dft_1d(int(n), c, c, FFTW_FORWARD, flags);
+    }
+    ~FftwOnce() {
+        fftw_destroy_plan(plan);
+        fftw_free(in);
+        fftw_free(out);
+    }
+    void call() {
+        std::memcpy(in, x.data(), x.size() * sizeof(double));
+        fftw_execute(plan);
+    }
+};
+#endif
+
+template <class E>
+double time_calls(E& e, int calls) {
+    const auto start = std::chrono::steady_clock::now();
+    for (int i = 0; i < calls; ++i) e.call();
+    const std::chrono::duration<double> d = std::chrono::steady_clock::now() - start;
+    return d.count() / calls;
+}
+
+// Median times of a and b, and the median of their per-repetition ratios,
+// alternating who goes first; batches of about 1 ms.
+template <class A, class B>
+void interleave(A& a, B& b, int reps, double out[3]) {
+    a.call();
+    b.call();
+    const int calls = std::max(1, int(1e-3 / std::max(time_calls(a, 4), 1e-9)));
+    std::vector<double> ta, tb, ratio;
+    for (int r = 0; r < reps; ++r) {
+        double x, y;
+        if (r % 2 == 0) {
+            x = time_calls(a, calls);
+            y = time_calls(b, calls);
+        } else {
+            y = time_calls(b, calls);
+            x = time_calls(a, calls);
+        }
+        ta.push_back(x);
+        tb.push_back(y);
+        ratio.push_back(x / y);
+    }
+    out[0] = median(ta);
+    out[1] = median(tb);
+    out[2] = median(ratio);
+}
+
+// vlxi_rfft against our complex transform of the same n; beside it FFTW's
+// r2c against its c2c (both FFTW_MEASURE), double precision.
+void real_table(int reps) {
+    std::printf("\nreal double, seconds per forward transform incl. input copy (median of %d interleaved)\n", reps);
+    std::printf("%8s %12s %12s %8s %12s %12s %8s\n", "N", "vlxi_rfft", "vlxi_fft", "ratio", "FFTW r2c", "FFTW c2c",
+                "ratio");
+    for (int m = 8; m <= 18; ++m) {
+        const size_t n = size_t(1) << m;
+        OursOnce<vlx_t> real(n, 1), cplx(n, 0);
+        double ours[3];
+        interleave(real, cplx, reps, ours);
+#ifdef VLX_HAVE_FFTW
+        FftwOnce r2c(n, 1, FFTW_MEASURE), c2c(n, 0, FFTW_MEASURE);
+        double theirs[3];
+        interleave(r2c, c2c, reps, theirs);
+        std::printf("%8zu %12.3e %12.3e %8.2f %12.3e %12.3e %8.2f\n", n, ours[0], ours[1], ours[2], theirs[0],
+                    theirs[1], theirs[2]);
+#else
+        std::printf("%8zu %12.3e %12.3e %8.2f\n", n, ours[0], ours[1], ours[2]);
+#endif
+        std::fflush(stdout);
+    }
+}
+
+// The chirp path of vlxi_dft against FFTW_ESTIMATE of the same length, double.
+void chirp_table(int reps) {
+#ifdef VLX_HAVE_FFTW
+    std::printf("\nvlxi_dft (chirp), double, seconds per forward transform incl. input copy (median of %d interleaved)\n",
+                reps);
+    std::printf("%8s %12s %12s %8s\n", "N", "vlxi_dft", "FFTW est.", "ratio");
+    for (size_t n : {size_t(1000), size_t(10007), size_t(100003)}) {
+        OursOnce<vlx_t> ours(n, 2);
+        FftwOnce peer(n, 0, FFTW_ESTIMATE);
+        double t[3];
+        interleave(ours, peer, reps, t);
+        std::printf("%8zu %12.3e %12.3e %8.2f\n", n, t[0], t[1], t[2]);
+        std::fflush(stdout);
+    }
+#else
+    (void)reps;
+#endif
 }
 
 using cld = std::complex<long double>;
@@ -304,5 +441,7 @@ int main(int argc, char** argv) {
     }
     interleaved_table<vlx_t>(reps);
     interleaved_table<vlxf_t>(reps);
+    real_table(reps);
+    chirp_table(reps);
     return 0;
 }

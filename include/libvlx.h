@@ -1149,6 +1149,13 @@ VLX_API int32_t vlxff_read_binary(vlxf_t* v, FILE* stream);
 VLX_API double vlxf_auto_range(double value);
 VLX_API float vlxff_auto_range(float value);
 
+/* --- transforms --- */
+
+/* Caps the vector lanes of the power-of-two transforms at lanes (0 scalar,
+ * 1 AVX, 2 AVX-512F; negative only asks); every level gives the same bits.
+ * Returns the level in effect, limited by the processor. */
+VLX_API int32_t vlx_transform_lanes(int32_t lanes);
+
 #ifdef __cplusplus
 }
 #endif

@@ -15,9 +15,14 @@ inline bool has_avx2() {
     static const bool avx2 = (__builtin_cpu_init(), __builtin_cpu_supports("avx2") != 0);
     return avx2;
 }
+inline bool has_avx512f() {
+    static const bool avx512f = (__builtin_cpu_init(), __builtin_cpu_supports("avx512f") != 0);
+    return avx512f;
+}
 #else
 inline bool has_avx() { return false; }
 inline bool has_avx2() { return false; }
+inline bool has_avx512f() { return false; }
 #endif
 
 }  // namespace vlx::cpu

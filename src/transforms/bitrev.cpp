@@ -1,9 +1,10 @@
 // Bit reversal of a vector from cached index lists, plain and scaled by 1/N.
 #include "core/frame.hpp"
+#include "transforms/fft_simd.hpp"
 #include "transforms/transforms.hpp"
 
-#include <algorithm>
 #include <cstdlib>
+#include <cstring>
 
 namespace vlx {
 namespace {
@@ -123,59 +124,191 @@ const uint32_t* fixed_list(int32_t m) {
     return find_or_build<V>(bitrev_state<V>.fixed, m, (size_t(1) << (m / 2 + 1)) + 2, build_fixed);
 }
 
-// From this many bytes of samples on, the list order misses the caches at
-// almost every exchange (see swap_pairs).
-constexpr size_t tiled_bytes = size_t(1) << 20;
-
-template <class T, bool Scaled>
-inline void exchange(T* x, size_t width, uint32_t i, uint32_t j, T f) {
-    T* p = x + width * i;
-    T* q = x + width * j;
-    for (size_t c = 0; c < width; ++c) {
+// Point i of W scalars exchanged with point j, each sample times f if Scaled.
+template <class T, size_t W, bool Scaled>
+inline void exchange(T* p, T* q, T f) {
+    for (size_t c = 0; c < W; ++c) {
         const T t = Scaled ? p[c] * f : p[c];
         p[c] = Scaled ? q[c] * f : q[c];
         q[c] = t;
     }
 }
 
-// Exchanges the points of every pair of the list, each sample times f if
-// Scaled.  The pair of high halves (a, b), a < b, exchanges column r(b) of
-// row a with column r(a) of row b; rows are a power of two apart, so the list
-// order would meet each cache line once per point, in conflicting sets.  The
-// walk goes instead by tiles: a whose r(a) fill one cache line, b likewise,
-// so a tile uses its lines in full.  Each pair is still read from the list
-// and visited exactly once (the tile of (b, a) skips it).
-template <class T, bool Scaled>
-void swap_pairs(T* x, const uint32_t* list, int32_t m, size_t width, T f) {
-    if ((width * sizeof(T)) << m < tiled_bytes) {
-        // small enough to stay in cache: the list in its own order
-        for (const uint32_t* p = list; *p != 0; p += 2) exchange<T, Scaled>(x, width, p[0], p[1], f);
-        return;
-    }
-    const int32_t h = m / 2;
-    const size_t r = size_t(1) << h;
-    const size_t words_per_b = m % 2 == 0 ? 2 : 4;
-    constexpr size_t max_tile = 16;
-    const size_t tile = std::min(r, std::min(max_tile, std::max<size_t>(1, 64 / (width * sizeof(T)))));
-    size_t as[max_tile], bs[max_tile];
-    for (size_t i = 0; i < r; i += tile) {
-        for (size_t t = 0; t < tile; ++t) as[t] = reverse_bits(uint32_t(i + t), h);
-        for (size_t j = 0; j < r; j += tile) {
-            for (size_t t = 0; t < tile; ++t) bs[t] = reverse_bits(uint32_t(j + t), h);
-            for (size_t ta = 0; ta < tile; ++ta) {
-                const size_t a = as[ta];
-                // the run of a: pairs (a, a+1), (a, a+2), ...
-                const uint32_t* run = list + words_per_b * (a * r - a * (a + 1) / 2);
-                for (size_t tb = 0; tb < tile; ++tb) {
-                    const size_t b = bs[tb];
-                    if (b <= a) continue;
-                    const uint32_t* e = run + words_per_b * (b - a - 1);
-                    exchange<T, Scaled>(x, width, e[0], e[1], f);
-                    if (words_per_b == 4) exchange<T, Scaled>(x, width, e[2], e[3], f);
+template <class T, size_t W, bool Scaled>
+inline void scale_point(T* p, T f) {
+    if (Scaled)
+        for (size_t c = 0; c < W; ++c) p[c] = p[c] * f;
+}
+
+// Small lengths: the pairs in list order, then the fixed points.
+template <class T, size_t W, bool Scaled>
+void by_lists(T* x, const uint32_t* swaps, const uint32_t* fixed, T f) {
+    for (const uint32_t* p = swaps; *p != 0; p += 2) exchange<T, W, Scaled>(x + W * p[0], x + W * p[1], f);
+    if (Scaled)
+        for (const uint32_t* p = fixed; *p != fixed_end; ++p) scale_point<T, W, Scaled>(x + W * *p, f);
+}
+
+// From 2^6 points on, the same exchanges by tiles.  With an index of m bits
+// read as (a, mid, b), a and b of 3 bits, the points of one mid form a tile of
+// 8 rows of 8 consecutive points, and the reversal carries tile mid onto tile
+// r(mid) with (a, b) going to (r(b), r(a)).  So a pair of tiles is exchanged
+// while its 16 rows stay in cache, instead of meeting each cache line once per
+// point; a tile that is its own image exchanges within itself and scales its
+// fixed points (b = r(a)).  Every point still moves once and is scaled once.
+template <class T, size_t W, bool Scaled>
+void by_tiles(T* x, int32_t m, T f) {
+    static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
+    const int32_t mid_bits = m - 6;
+    const size_t rows = size_t(1) << (m - 3);  // points from one row to the next
+    size_t down[8];                            // scalars to row r(b)
+    for (size_t b = 0; b < 8; ++b) down[b] = W * r3[b] * rows;
+    for (size_t mid = 0; mid < (size_t(1) << mid_bits); ++mid) {
+        const size_t image = reverse_bits(uint32_t(mid), mid_bits);
+        if (image < mid) continue;
+        T* tile = x + W * (mid << 3);
+        T* other = x + W * (image << 3);
+        for (size_t a = 0; a < 8; ++a) {
+            T* row = tile + W * a * rows;
+            T* column = other + W * r3[a];
+            if (image != mid) {
+                for (size_t b = 0; b < 8; ++b) exchange<T, W, Scaled>(row + W * b, column + down[b], f);
+            } else {
+                for (size_t b = 0; b < 8; ++b) {
+                    T* p = row + W * b;
+                    T* q = column + down[b];
+                    if (p < q)
+                        exchange<T, W, Scaled>(p, q, f);
+                    else if (p == q)
+                        scale_point<T, W, Scaled>(p, f);
                 }
             }
         }
     }
+}
+
+#ifdef VLX_FFT_AVX
+// The tile exchange on AVX-512F lanes, for points of 64 bits (complex floats,
+// real doubles) and 128 bits (complex doubles).  The image of a tile holds
+// at (R, C) the point (r(C), r(R)) of the tile: with the rows loaded in the
+// order r(C), it is their transpose with the columns stored in the order
+// r(R).  Moves only; each point is multiplied by f once, as in the scalar walk.
+#define VLX_TILE512 __attribute__((target("avx512f")))
+
+VLX_TILE512 inline __m512d pick(__m512d a, __m512i index, __m512d b) { return _mm512_permutex2var_pd(a, index, b); }
+
+VLX_TILE512 inline __m512i index8(long long i0, long long i1, long long i2, long long i3, long long i4, long long i5,
+                                   long long i6, long long i7) {
+    return _mm512_set_epi64(i7, i6, i5, i4, i3, i2, i1, i0);
+}
+
+template <class T>
+VLX_TILE512 inline __m512d scaled(__m512d v, T f) {
+    if constexpr (std::is_same_v<T, float>)
+        return _mm512_castps_pd(_mm512_mul_ps(_mm512_castpd_ps(v), _mm512_set1_ps(f)));
+    else
+        return _mm512_mul_pd(v, _mm512_set1_pd(f));
+}
+
+// 8 x 8 points of 64 bits, one row a register: src rows `from` apart (bytes),
+// the image written to dst with rows `to` apart.
+template <class T, bool Scaled>
+VLX_TILE512 void tile_image64(const char* src, size_t from, char* dst, size_t to, T f) {
+    static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
+    __m512d r[8], column[8];
+    for (size_t c = 0; c < 8; ++c) r[c] = _mm512_loadu_pd(src + r3[c] * from);
+    fft_simd::transpose8(r, column);
+    for (size_t row = 0; row < 8; ++row) {
+        const __m512d v = column[r3[row]];
+        _mm512_storeu_pd(dst + row * to, Scaled ? scaled(v, f) : v);
+    }
+}
+
+// 8 x 8 points of 128 bits, a row in two registers: as tile_image64, by
+// blocks of 4 x 4 points.
+template <bool Scaled>
+VLX_TILE512 void tile_image128(const char* src, size_t from, char* dst, size_t to, double f) {
+    static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
+    __m512d r[8][2];
+    for (size_t c = 0; c < 8; ++c) {
+        r[c][0] = _mm512_loadu_pd(src + r3[c] * from);
+        r[c][1] = _mm512_loadu_pd(src + r3[c] * from + 64);
+    }
+    const __m512i lo = index8(0, 1, 8, 9, 2, 3, 10, 11), hi = index8(4, 5, 12, 13, 6, 7, 14, 15);
+    const __m512i lo4 = index8(0, 1, 2, 3, 8, 9, 10, 11), hi4 = index8(4, 5, 6, 7, 12, 13, 14, 15);
+    // column[j][g]: points j of rows 4g .. 4g+3
+    __m512d column[8][2];
+    for (size_t g = 0; g < 2; ++g) {
+        for (size_t half = 0; half < 2; ++half) {
+            const __m512d* a0 = r[4 * g];
+            const __m512d t0 = pick(a0[half], lo, r[4 * g + 1][half]);
+            const __m512d t1 = pick(a0[half], hi, r[4 * g + 1][half]);
+            const __m512d t2 = pick(r[4 * g + 2][half], lo, r[4 * g + 3][half]);
+            const __m512d t3 = pick(r[4 * g + 2][half], hi, r[4 * g + 3][half]);
+            column[4 * half + 0][g] = pick(t0, lo4, t2);
+            column[4 * half + 1][g] = pick(t0, hi4, t2);
+            column[4 * half + 2][g] = pick(t1, lo4, t3);
+            column[4 * half + 3][g] = pick(t1, hi4, t3);
+        }
+    }
+    for (size_t row = 0; row < 8; ++row) {
+        for (size_t g = 0; g < 2; ++g) {
+            const __m512d v = column[r3[row]][g];
+            _mm512_storeu_pd(dst + row * to + 64 * g, Scaled ? scaled(v, f) : v);
+        }
+    }
+}
+
+template <class T, size_t W>
+constexpr bool tile_lanes = W * sizeof(T) == 8 || W * sizeof(T) == 16;
+
+template <class T, size_t W, bool Scaled>
+VLX_TILE512 void tile_image(const T* src, size_t from, T* dst, size_t to, T f) {
+    const auto* s = reinterpret_cast<const char*>(src);
+    auto* d = reinterpret_cast<char*>(dst);
+    if constexpr (W * sizeof(T) == 16)
+        tile_image128<Scaled>(s, from, d, to, double(f));
+    else
+        tile_image64<T, Scaled>(s, from, d, to, f);
+}
+
+// by_tiles on lanes: one tile of a pair is copied aside first, since each
+// must be read in full before the other's image lands on it.
+template <class T, size_t W, bool Scaled>
+VLX_TILE512 void by_tiles_lanes(T* x, int32_t m, T f) {
+    const int32_t mid_bits = m - 6;
+    const size_t row = (W * sizeof(T)) << (m - 3);  // bytes from one row to the next
+    const size_t tile_row = 8 * W * sizeof(T);
+    alignas(64) T buffer[64 * W];
+    for (size_t mid = 0; mid < (size_t(1) << mid_bits); ++mid) {
+        const size_t image = reverse_bits(uint32_t(mid), mid_bits);
+        if (image < mid) continue;
+        T* tile = x + W * (mid << 3);
+        T* other = x + W * (image << 3);
+        if (image == mid) {
+            tile_image<T, W, Scaled>(tile, row, tile, row, f);
+            continue;
+        }
+        auto* to = reinterpret_cast<char*>(buffer);
+        const auto* from = reinterpret_cast<const char*>(tile);
+        for (size_t i = 0; i < 8; ++i) std::memcpy(to + i * tile_row, from + i * row, tile_row);
+        tile_image<T, W, Scaled>(other, row, tile, row, f);
+        tile_image<T, W, Scaled>(buffer, tile_row, other, row, f);
+    }
+}
+#undef VLX_TILE512
+#endif
+
+template <class T, size_t W, bool Scaled>
+void reorder(T* x, int32_t m, const uint32_t* swaps, const uint32_t* fixed, T f) {
+#ifdef VLX_FFT_AVX
+    if constexpr (tile_lanes<T, W>) {
+        if (m >= 6 && fft_simd::lanes() == 2) return by_tiles_lanes<T, W, Scaled>(x, m, f);
+    }
+#endif
+    if (m >= 6)
+        by_tiles<T, W, Scaled>(x, m, f);
+    else
+        by_lists<T, W, Scaled>(x, swaps, fixed, f);
 }
 
 }  // namespace
@@ -190,9 +323,9 @@ int32_t bitrev(V* v) {
     reader.release_lock();
     if (swaps == nullptr) return -1;
     if (v->complex)
-        swap_pairs<T, false>(v->data, swaps, m, 2, T(1));
+        reorder<T, 2, false>(v->data, m, swaps, nullptr, T(1));
     else
-        swap_pairs<T, false>(v->data, swaps, m, 1, T(1));
+        reorder<T, 1, false>(v->data, m, swaps, nullptr, T(1));
     return 0;
 }
 
@@ -209,18 +342,10 @@ int32_t bitrev_scale(V* v) {
     const uint32_t* fixed = swaps != nullptr ? fixed_list<V>(m) : nullptr;
     reader.release_lock();
     if (fixed == nullptr) return -1;
-    T* x = v->data;
-    if (v->complex) {
-        swap_pairs<T, true>(x, swaps, m, 2, f);
-        for (const uint32_t* p = fixed; *p != fixed_end; ++p) {
-            T* a = x + 2 * size_t(*p);
-            a[0] = a[0] * f;
-            a[1] = a[1] * f;
-        }
-    } else {
-        swap_pairs<T, true>(x, swaps, m, 1, f);
-        for (const uint32_t* p = fixed; *p != fixed_end; ++p) x[*p] = x[*p] * f;
-    }
+    if (v->complex)
+        reorder<T, 2, true>(v->data, m, swaps, fixed, f);
+    else
+        reorder<T, 1, true>(v->data, m, swaps, fixed, f);
     return 0;
 }
 

@@ -17,6 +17,7 @@ template <class T>
 struct TwiddleRecord {
     T* table;
     int32_t size;  // scalars, 3N/2: the key
+    T* lanes;      // the same values per stage for the vector kernels, or null
 };
 
 template <VlxVector V>
@@ -33,7 +34,10 @@ int32_t fft_tables_free() {
     lib_lock(0);
     lib_active_wait();
     TwiddleState<V>& state = twiddle_state<V>;
-    for (int32_t i = 0; i < state.count; ++i) std::free(state.records[i].table);
+    for (int32_t i = 0; i < state.count; ++i) {
+        std::free(state.records[i].table);
+        std::free(state.records[i].lanes);
+    }
     std::free(state.records);
     state.records = nullptr;
     state.count = 0;
@@ -110,6 +114,26 @@ void fill_twiddles(real_t<V>* t, int32_t n) {
     }
 }
 
+// Copies of the table's triples per stage, in the order the vector kernels
+// load them (see fft_kernels.inc): the stage of quarter length q uses pair
+// k n/(4q) for its index k.
+template <class T>
+void fill_lanes(T* lanes, const T* t, size_t n) {
+    for (size_t q = n / 4; q >= 2; q /= 2) {
+        T* st = lanes + fft_simd::lane_offset(n, q);
+        const size_t stride = n / (4 * q);
+        for (size_t k = 0; k < q; ++k) {
+            const T* pair = t + 6 * k * stride;
+            st[2 * k] = st[2 * k + 1] = pair[0];
+            st[2 * q + 2 * k] = pair[1];
+            st[2 * q + 2 * k + 1] = pair[2];
+            st[4 * q + 2 * k] = st[4 * q + 2 * k + 1] = pair[3];
+            st[6 * q + 2 * k] = pair[4];
+            st[6 * q + 2 * k + 1] = pair[5];
+        }
+    }
+}
+
 // Rotation by the triple (c, a, b) of angle theta, three multiplications:
 // by exp(-j theta) forward, exp(+j theta) inverse.
 template <class T, bool Inverse>
@@ -162,70 +186,15 @@ inline void two_point(T* x) {
     x[3] = i - x[3];
 }
 
-#ifdef VLX_FFT_AVX
-using fft_simd::Avx;
-using fft_simd::Floats128;
-using fft_simd::have_avx;
-using fft_simd::rotate_simd;
-
-template <class S, bool Inverse>
-__attribute__((target("avx"))) void l_block_simd(typename S::scalar* x, size_t q, const typename S::scalar* tw,
-                                                  size_t stride) {
-    using T = typename S::scalar;
-    T* x1 = x + 2 * q;
-    T* x2 = x + 4 * q;
-    T* x3 = x + 6 * q;
-    const size_t step = 6 * stride;
-    for (size_t k = 0; k < q; k += S::width) {
-        const size_t j = 2 * k;
-        const auto a0 = S::load(x + j), a1 = S::load(x1 + j), a2 = S::load(x2 + j), a3 = S::load(x3 + j);
-        const auto u = S::sub(a0, a2);
-        const auto w = S::swap(S::sub(a1, a3));
-        S::store(x + j, S::add(a0, a2));
-        S::store(x1 + j, S::add(a1, a3));
-        const auto plus = S::add(u, w);   // (ur + wi, ui + wr)
-        const auto minus = S::sub(u, w);  // (ur - wi, ui - wr)
-        auto z1 = Inverse ? S::re_im(minus, plus) : S::re_im(plus, minus);
-        auto z3 = Inverse ? S::re_im(plus, minus) : S::re_im(minus, plus);
-        const T* pair = tw + k * step;
-        typename S::reg c1, ab1, c3, ab3;
-        S::template triples<0>(pair, step, c1, ab1);
-        S::template triples<3>(pair, step, c3, ab3);
-        const auto r1 = rotate_simd<S, Inverse>(z1, c1, ab1);
-        const auto r3 = rotate_simd<S, Inverse>(z3, c3, ab3);
-        // index 0 is stored unrotated
-        z1 = k == 0 ? S::first_from(z1, r1) : r1;
-        z3 = k == 0 ? S::first_from(z3, r3) : r3;
-        S::store(x2 + j, z1);
-        S::store(x3 + j, z3);
-    }
-}
-
-// Quarter length 2: one AVX vector of doubles, or 128 bits of floats.
-template <class T, bool Inverse>
-void l_block_of_two(T* x, const T* tw, size_t stride) {
-    if constexpr (std::is_same_v<T, float>)
-        l_block_simd<Floats128, Inverse>(x, 2, tw, stride);
-    else
-        l_block_simd<Avx<double>, Inverse>(x, 2, tw, stride);
-}
-
-#endif
-
 // Depth first: a block of len points, then its half and its two quarters.
 // Blocks touch disjoint points, so this order does exactly the arithmetic of
 // the stage-by-stage walk while keeping small blocks in cache.
-template <class T, bool Inverse, bool Vector>
+template <class T, bool Inverse>
 void split_radix(T* x, size_t len, const T* tw, size_t n) {
     if (len <= 8) {
         // the smallest blocks in line: no calls for the leaves
         if (len == 8) {
-#ifdef VLX_FFT_AVX
-            if (Vector)
-                l_block_of_two<T, Inverse>(x, tw, n / 8);
-            else
-#endif
-                l_block<T, Inverse>(x, 2, tw, n / 8);
+            l_block<T, Inverse>(x, 2, tw, n / 8);
             l_block<T, Inverse>(x, 1, tw, n / 4);
             two_point(x);
             two_point(x + 8);
@@ -238,26 +207,72 @@ void split_radix(T* x, size_t len, const T* tw, size_t n) {
         }
         return;
     }
-#ifdef VLX_FFT_AVX
-    if (Vector && len / 4 >= Avx<T>::width)
-        l_block_simd<Avx<T>, Inverse>(x, len / 4, tw, n / len);
-    else
-#endif
-        l_block<T, Inverse>(x, len / 4, tw, n / len);
-    split_radix<T, Inverse, Vector>(x, len / 2, tw, n);
-    split_radix<T, Inverse, Vector>(x + len, len / 4, tw, n);
-    split_radix<T, Inverse, Vector>(x + 3 * len / 2, len / 4, tw, n);
+    l_block<T, Inverse>(x, len / 4, tw, n / len);
+    split_radix<T, Inverse>(x, len / 2, tw, n);
+    split_radix<T, Inverse>(x + len, len / 4, tw, n);
+    split_radix<T, Inverse>(x + 3 * len / 2, len / 4, tw, n);
 }
 
-template <class T, bool Inverse>
-void run_butterflies(T* x, size_t n, const T* tw) {
 #ifdef VLX_FFT_AVX
-    if (have_avx()) {
-        split_radix<T, Inverse, true>(x, n, tw, n);
+// The same walk on vector lanes: each block of quarter length 2 or more goes
+// to the widest kernel that fits it, with the stage's unit-stride lane table.
+template <class T, bool Inverse, bool Wide>
+void split_radix_lanes(T* x, size_t len, const T* tw, const T* lanes, size_t n) {
+    using namespace fft_simd;
+    // subtrees of up to 32 points with four points a register: doubles on
+    // AVX-512F, floats on AVX (their block of quarter length 8 on AVX-512F
+    // where it is there)
+    if (len <= 32 && len >= 4 && (Wide || std::is_same_v<T, float>) && n >= 32) {
+        const T* st2 = lanes + lane_offset(n, 2);
+        const T* st4 = lanes + lane_offset(n, 4);
+        const T* st8 = lanes + lane_offset(n, 8);
+        if constexpr (std::is_same_v<T, float> && Wide)
+            return lanes512::leaf_lanes<Quad<float>, Avx512<float>, Inverse>(x, len, st2, st4, st8);
+        else if constexpr (std::is_same_v<T, float>)
+            return lanes256::leaf_lanes<Quad<float>, Quad<float>, Inverse>(x, len, st2, st4, st8);
+        else if constexpr (Wide)
+            return lanes512::leaf_lanes<Quad<double>, Quad<double>, Inverse>(x, len, st2, st4, st8);
+    }
+    if (len <= 8) {
+        if (len == 8) {
+            const T* st = lanes + lane_offset(n, 2);
+            if constexpr (std::is_same_v<T, float>)
+                lanes256::l_block_lanes<Floats128, Inverse>(x, 2, st);
+            else
+                lanes256::l_block_lanes<Avx<double>, Inverse>(x, 2, st);
+            l_block<T, Inverse>(x, 1, tw, n / 4);
+            two_point(x);
+            two_point(x + 8);
+            two_point(x + 12);
+        } else {
+            split_radix<T, Inverse>(x, len, tw, n);
+        }
         return;
     }
+    const size_t q = len / 4;
+    const T* st = lanes + lane_offset(n, q);
+    if (Wide && q >= Avx512<T>::width)
+        lanes512::l_block_lanes<Avx512<T>, Inverse>(x, q, st);
+    else if (q >= Avx<T>::width)
+        lanes256::l_block_lanes<Avx<T>, Inverse>(x, q, st);
+    else if constexpr (std::is_same_v<T, float>)
+        lanes256::l_block_lanes<Floats128, Inverse>(x, q, st);
+    split_radix_lanes<T, Inverse, Wide>(x, len / 2, tw, lanes, n);
+    split_radix_lanes<T, Inverse, Wide>(x + len, len / 4, tw, lanes, n);
+    split_radix_lanes<T, Inverse, Wide>(x + 3 * len / 2, len / 4, tw, lanes, n);
+}
 #endif
-    split_radix<T, Inverse, false>(x, n, tw, n);
+
+template <class T, bool Inverse>
+void run_butterflies(T* x, size_t n, const T* tw, const T* lanes) {
+#ifdef VLX_FFT_AVX
+    const int32_t level = lanes != nullptr ? fft_simd::lanes() : 0;
+    if (level == 2) return split_radix_lanes<T, Inverse, true>(x, n, tw, lanes, n);
+    if (level == 1) return split_radix_lanes<T, Inverse, false>(x, n, tw, lanes, n);
+#else
+    (void)lanes;
+#endif
+    split_radix<T, Inverse>(x, n, tw, n);
 }
 
 template <VlxVector V, bool Inverse>
@@ -268,10 +283,11 @@ int32_t native_fft(V* v) {
     {
         TableReader reader;
         const T* tw = nullptr;
-        const int32_t status = fft_table<V>(n, &tw);
+        const T* lanes = nullptr;
+        const int32_t status = fft_table<V>(n, &tw, &lanes);
         reader.release_lock();
         if (status < 0) return status;
-        run_butterflies<T, Inverse>(v->data, size_t(n), tw);
+        run_butterflies<T, Inverse>(v->data, size_t(n), tw, lanes);
     }
     // The reordering takes lock 0 for its lists: the counter must be down first.
     const int32_t status = Inverse ? bitrev(v) : bitrev_scale(v);
@@ -281,7 +297,7 @@ int32_t native_fft(V* v) {
 }  // namespace
 
 template <VlxVector V>
-int32_t fft_table(int32_t n, const real_t<V>** table_out) {
+int32_t fft_table(int32_t n, const real_t<V>** table_out, const real_t<V>** lanes_out) {
     using T = real_t<V>;
     if (n < 4) return -1;  // pair 0 alone needs length 4
     TwiddleState<V>& state = twiddle_state<V>;
@@ -289,6 +305,7 @@ int32_t fft_table(int32_t n, const real_t<V>** table_out) {
     for (int32_t i = 0; i < state.count; ++i) {
         if (state.records[i].size == size) {
             *table_out = state.records[i].table;
+            if (lanes_out != nullptr) *lanes_out = state.records[i].lanes;
             return 0;
         }
     }
@@ -299,10 +316,17 @@ int32_t fft_table(int32_t n, const real_t<V>** table_out) {
     auto* table = static_cast<T*>(std::malloc(size_t(size) * sizeof(T)));
     if (table == nullptr) return -1;
     fill_twiddles<V>(table, n);
-    state.records[state.count] = {table, size};
+    // Without room for the lane copy the scalar path runs, with the same result.
+    T* lanes = nullptr;
+    if (n >= 8) {
+        lanes = static_cast<T*>(std::malloc(fft_simd::lane_table_size(size_t(n)) * sizeof(T)));
+        if (lanes != nullptr) fill_lanes(lanes, table, size_t(n));
+    }
+    state.records[state.count] = {table, size, lanes};
     ++state.count;
     register_teardown<V>(TeardownStep::twiddle_tables, &fft_tables_free<V>);
     *table_out = table;
+    if (lanes_out != nullptr) *lanes_out = lanes;
     return 0;
 }
 
@@ -335,7 +359,7 @@ int32_t fft(V* v, int32_t inverse) {
 }
 
 #define VLX_INSTANTIATE(V)                                                   \
-    template int32_t fft_table<V>(int32_t, const real_t<V>**);               \
+    template int32_t fft_table<V>(int32_t, const real_t<V>**, const real_t<V>**);             \
     template int32_t fft_forward<V>(V*);                                     \
     template int32_t fft_inverse<V>(V*);                                     \
     template int32_t fft<V>(V*, int32_t);
@@ -348,4 +372,8 @@ VLX_INSTANTIATE(vlxf_t)
 extern "C" {
 VLX_API int32_t vlxi_fft(vlx_t* v, int32_t inverse) { return vlx::fft(v, inverse); }
 VLX_API int32_t vlxfi_fft(vlxf_t* v, int32_t inverse) { return vlx::fft(v, inverse); }
+VLX_API int32_t vlx_transform_lanes(int32_t lanes) {
+    if (lanes >= 0) vlx::fft_simd::lane_cap.store(lanes, std::memory_order_relaxed);
+    return vlx::fft_simd::lanes();
+}
 }

@@ -32,8 +32,10 @@ template <VlxVector V> int32_t dft_fast_transform(V* v, int32_t inverse, int32_t
 
 // Twiddle table of length n (3n/2 scalars: n/4 pairs of rotation triples),
 // found or built; the caller holds lock 0 and keeps the active counter raised
-// while it reads the table.  0, or -1 if memory ran out.
-template <VlxVector V> int32_t fft_table(int32_t n, const real_t<V>** table_out);
+// while it reads the table.  0, or -1 if memory ran out.  lanes_out, if
+// given, receives the per-stage copy for the vector kernels, or null.
+template <VlxVector V>
+int32_t fft_table(int32_t n, const real_t<V>** table_out, const real_t<V>** lanes_out = nullptr);
 // Native engines, n >= 4: the complex transform in both directions (forward
 // carries 1/N) and the real transform to the half spectrum.
 template <VlxVector V> int32_t fft_forward(V* v);
