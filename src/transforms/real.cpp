@@ -69,26 +69,36 @@ inline void real_element(real_t<V>* e, int64_t h, int64_t k, const real_t<V>* pa
     mirror2[1] = dr - e2i;
 }
 
+// The general elements of a block of quarter length h (pair stride of k is
+// `stride`; st the lane copy of the stage, level the lanes to use).
+template <VlxVector V>
+inline void real_elements(real_t<V>* e, int64_t h, const real_t<V>* tw, int64_t stride, const real_t<V>* st,
+                          int32_t level) {
+    using T = real_t<V>;
+#ifdef VLX_FFT_AVX
+    using namespace fft_simd;
+    if (level == 2 && h / 2 >= int64_t(Avx512<T>::width)) return lanes512::real_elements_lanes<Avx512<T>>(e, h, st);
+    if (level >= 1 && h / 2 >= int64_t(Avx<T>::width)) return lanes256::real_elements_lanes<Avx<T>>(e, h, st);
+    if constexpr (std::is_same_v<T, float>) {
+        if (level >= 1 && h == 4) return lanes256::real_elements_lanes<Floats128>(e, h, st);
+    }
+#else
+    (void)st;
+    (void)level;
+#endif
+    for (int64_t k = 1; k < h / 2; ++k) real_element<V>(e, h, k, tw + 6 * k * stride);
+}
+
 // One block of n = 4h points at point p: from the half spectra of its even
 // part (p .. p+h), and of its two quarter parts (p+2h .. p+2h+h/2 and
 // p+3h .. p+3h+h/2) to its own half spectrum (p .. p+2h).
 template <VlxVector V>
 void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t stride, const real_t<V>* st,
                 int32_t level) {
-    using T = real_t<V>;
-    T* e = x + 2 * p;
+    real_t<V>* e = x + 2 * p;
+    // the edges after the vectors, which then load no point just stored
+    real_elements<V>(e, h, tw, stride, st, level);
     real_edges<V>(e, h);
-    int64_t k = 1;
-#ifdef VLX_FFT_AVX
-    using namespace fft_simd;
-    // (no call where a kernel would find less than one vector of elements)
-    if (level == 2 && h / 2 > int64_t(Avx512<T>::width)) k = lanes512::real_elements_lanes<Avx512<T>>(e, h, st, k);
-    if (level >= 1 && h / 2 - k >= int64_t(Avx<T>::width)) k = lanes256::real_elements_lanes<Avx<T>>(e, h, st, k);
-#else
-    (void)st;
-    (void)level;
-#endif
-    for (; k < h / 2; ++k) real_element<V>(e, h, k, tw + 6 * k * stride);
 }
 
 // The subtrees of 8 points or fewer of a block, whole: the two-point
@@ -183,28 +193,33 @@ inline const LeafPlan& leaf_plan(int64_t len) { return leaf_plans[log2_of(int32_
 // The leaves of the plan; a subtree of 16 also runs its block of h = 4 (one
 // general element, pair stride of it), with its leaves last to first.
 template <VlxVector V>
-inline void real_leaf16(real_t<V>* x, int64_t p, const real_t<V>* tw, int64_t n) {
+inline void real_leaf16(real_t<V>* x, int64_t p, const real_t<V>* tw, int64_t n, const real_t<V>* st4,
+                        int32_t level) {
     real_leaf<V>(x, p + 12, 4);
     real_leaf<V>(x, p + 8, 4);
     real_leaf<V>(x, p, 8);
     real_edges<V>(x + 2 * p, 4);
-    real_element<V>(x + 2 * p, 4, 1, tw + 6 * (n / 16));
+    real_elements<V>(x + 2 * p, 4, tw, n / 16, st4, level * 0);
 }
 
 template <VlxVector V>
-void real_leaves(real_t<V>* x, int64_t p0, int64_t len, const real_t<V>* tw, int64_t n) {
+void real_leaves(real_t<V>* x, int64_t p0, int64_t len, const real_t<V>* tw, int64_t n, const real_t<V>* lanes,
+                 int32_t level) {
     const LeafPlan& plan = leaf_plan(len);
+    // lane copies of the stages h = 4 and 8 (there whenever a subtree of 16 or 32 is)
+    const real_t<V>* st4 = lanes != nullptr && n >= 16 ? lanes + fft_simd::lane_offset(size_t(n), 4) : nullptr;
+    const real_t<V>* st8 = lanes != nullptr && n >= 32 ? lanes + fft_simd::lane_offset(size_t(n), 8) : nullptr;
     for (int32_t i = 0; i < plan.count; ++i) {
         const uint16_t a = plan.at[i];
         const int64_t p = p0 + (a & leaf_at);
         if ((a & leaf32) == leaf32) {
             real_leaf<V>(x, p + 24, 8);
             real_leaf<V>(x, p + 16, 8);
-            real_leaf16<V>(x, p, tw, n);
+            real_leaf16<V>(x, p, tw, n, st4, level);
             real_edges<V>(x + 2 * p, 8);
-            for (int64_t k = 1; k < 4; ++k) real_element<V>(x + 2 * p, 8, k, tw + 6 * k * (n / 32));
+            real_elements<V>(x + 2 * p, 8, tw, n / 32, st8, 0);
         } else if ((a & leaf16) != 0) {
-            real_leaf16<V>(x, p, tw, n);
+            real_leaf16<V>(x, p, tw, n, st4, level);
         } else {
             real_leaf<V>(x, p, (a & leaf8) != 0 ? 8 : 4);
         }
@@ -219,7 +234,7 @@ template <VlxVector V>
 void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                  int32_t level) {
     using T = real_t<V>;
-    real_leaves<V>(x, p0, len, tw, n);
+    real_leaves<V>(x, p0, len, tw, n, lanes, lanes != nullptr ? level : 0);
     for (int64_t h = 16; 4 * h <= len; h *= 2) {
         const T* st = lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
         for (int64_t pos = 0, spacing = 8, c = (len / (4 * h) + 1) / 2; c > 0;
