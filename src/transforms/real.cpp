@@ -160,18 +160,17 @@ inline void real_leaf(real_t<V>* x, int64_t p, int64_t len) {
 }
 
 // Where the leaves of a block of 2^j points lie (j = 2 .. 9), last to first:
-// the offset, plus leaf8 for a leaf of 8 points, leaf16 or leaf32 for a
-// subtree of 16 or 32 (its leaves and blocks of h = 4, 8), else a leaf of 4.  Worked out once, at
-// compile time, so that the leaves need no recursion.
-constexpr uint16_t leaf8 = 0x8000, leaf16 = 0x4000, leaf32 = 0xC000, leaf_at = 0x3FFF;
+// the offset, plus leaf8 for a leaf of 8 points, else a leaf of 4.  Worked
+// out once, at compile time, so that the leaves need no recursion.
+constexpr uint16_t leaf8 = 0x8000, leaf_at = 0x3FFF;
 struct LeafPlan {
     uint16_t at[96];  // 85 for 512 points
     int32_t count;
 };
 
 constexpr void plan_leaves(LeafPlan& plan, int32_t p, int32_t len) {
-    if (len <= 32) {
-        plan.at[plan.count++] = uint16_t(p | (len == 32 ? leaf32 : len == 16 ? leaf16 : len == 8 ? leaf8 : 0));
+    if (len <= 8) {
+        plan.at[plan.count++] = uint16_t(p | (len == 8 ? leaf8 : 0));
         return;
     }
     plan_leaves(plan, p + 3 * len / 4, len / 4);
@@ -190,52 +189,20 @@ inline constexpr LeafPlan leaf_plans[8] = {make_plan(4),  make_plan(8),  make_pl
 
 inline const LeafPlan& leaf_plan(int64_t len) { return leaf_plans[log2_of(int32_t(len)) - 2]; }
 
-// The leaves of the plan; a subtree of 16 also runs its block of h = 4 (one
-// general element, pair stride of it), with its leaves last to first.
-template <VlxVector V>
-inline void real_leaf16(real_t<V>* x, int64_t p, const real_t<V>* tw, int64_t n, const real_t<V>* st4,
-                        int32_t level) {
-    real_leaf<V>(x, p + 12, 4);
-    real_leaf<V>(x, p + 8, 4);
-    real_leaf<V>(x, p, 8);
-    real_edges<V>(x + 2 * p, 4);
-    real_elements<V>(x + 2 * p, 4, tw, n / 16, st4, level * 0);
-}
-
-template <VlxVector V>
-void real_leaves(real_t<V>* x, int64_t p0, int64_t len, const real_t<V>* tw, int64_t n, const real_t<V>* lanes,
-                 int32_t level) {
-    const LeafPlan& plan = leaf_plan(len);
-    // lane copies of the stages h = 4 and 8 (there whenever a subtree of 16 or 32 is)
-    const real_t<V>* st4 = lanes != nullptr && n >= 16 ? lanes + fft_simd::lane_offset(size_t(n), 4) : nullptr;
-    const real_t<V>* st8 = lanes != nullptr && n >= 32 ? lanes + fft_simd::lane_offset(size_t(n), 8) : nullptr;
-    for (int32_t i = 0; i < plan.count; ++i) {
-        const uint16_t a = plan.at[i];
-        const int64_t p = p0 + (a & leaf_at);
-        if ((a & leaf32) == leaf32) {
-            real_leaf<V>(x, p + 24, 8);
-            real_leaf<V>(x, p + 16, 8);
-            real_leaf16<V>(x, p, tw, n, st4, level);
-            real_edges<V>(x + 2 * p, 8);
-            real_elements<V>(x + 2 * p, 8, tw, n / 32, st8, 0);
-        } else if ((a & leaf16) != 0) {
-            real_leaf16<V>(x, p, tw, n, st4, level);
-        } else {
-            real_leaf<V>(x, p, (a & leaf8) != 0 ? 8 : 4);
-        }
-    }
-}
-
-// A block of len points with everything below it: the leaves, then the
-// stages from h = 16 up as the levels walk them within the block (its tree is
+// A block of len points with everything below it: all its leaves, then the
+// stages from h = 4 up as the levels walk them within the block (its tree is
 // that of a transform of len points).  Each stage's stores are then long done
 // when the next stage loads them as vectors.
 template <VlxVector V>
 void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                  int32_t level) {
     using T = real_t<V>;
-    real_leaves<V>(x, p0, len, tw, n, lanes, lanes != nullptr ? level : 0);
-    for (int64_t h = 16; 4 * h <= len; h *= 2) {
+    const LeafPlan& plan = leaf_plan(len);
+    for (int32_t i = 0; i < plan.count; ++i) {
+        const uint16_t a = plan.at[i];
+        real_leaf<V>(x, p0 + (a & leaf_at), (a & leaf8) != 0 ? 8 : 4);
+    }
+    for (int64_t h = 4; 4 * h <= len; h *= 2) {
         const T* st = lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
         for (int64_t pos = 0, spacing = 8, c = (len / (4 * h) + 1) / 2; c > 0;
              pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
