@@ -77,6 +77,39 @@ void real_stage(real_t<V>* x, int64_t p0, int64_t len, int64_t h, int64_t n, con
     }
 }
 
+// A leaf of 8 points (see real_leaf) with k as for leaf16_core: T a scalar
+// or a vector of leaves.  All samples are read before a point is written.
+template <class T>
+__attribute__((always_inline)) inline void leaf8_core(const T* in, T* e, const T* k) {
+    const T r = k[0], nr = k[1], zero = k[8];
+    const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
+    const T r4 = in[4], r5 = in[5], r6 = in[6], r7 = in[7];
+    const T a0 = r0 + r1, a1 = r0 - r1;  // two-point butterflies at 0, 4, 6
+    const T b0 = r4 + r5, b1 = r4 - r5;
+    const T c0 = r6 + r7, c1 = r6 - r7;
+    const T t = r3 + r2;  // block of h = 1
+    const T x0 = a0 + t, i1 = r3 - r2;
+    const T t2 = c0 + b0;  // block of h = 2
+    const T u = nr * c1;
+    const T v = r * b1;
+    e[0] = x0 + t2;
+    e[1] = zero;
+    e[2] = a1 + (u + v);
+    e[3] = (u - v) + i1;
+    e[4] = a0 - t;
+    e[5] = c0 - b0;
+    e[6] = a1 - (u + v);
+    e[7] = (u - v) - i1;
+    e[8] = x0 - t2;
+    e[9] = zero;
+    e[10] = b1;
+    e[11] = zero;
+    e[12] = c0;
+    e[13] = zero;
+    e[14] = c1;
+    e[15] = zero;
+}
+
 // The subtrees of 8 points or fewer of a block, whole: the two-point
 // butterflies on real parts and the blocks of h = 1 and 2 (table-free), in
 // the order the stages give them, with the values in registers.  The real
@@ -90,30 +123,9 @@ inline void real_leaf(real_t<V>* x, int64_t p, int64_t len) {
     const T* in = x + p;
     T* e = x + 2 * p;
     if (len == 8) {
-        const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
-        const T r4 = in[4], r5 = in[5], r6 = in[6], r7 = in[7];
-        const T a0 = r0 + r1, a1 = r0 - r1;  // two-point butterflies at 0, 4, 6
-        const T b0 = r4 + r5, b1 = r4 - r5;
-        const T c0 = r6 + r7, c1 = r6 - r7;
-        const T t = r3 + r2;  // block of h = 1
-        const T x0 = a0 + t, i1 = r3 - r2;
-        const T t2 = c0 + b0;  // block of h = 2
-        const T r = fft_sqrt_half<V>;
-        const T u = -r * c1;
-        const T v = r * b1;
-        e[0] = x0 + t2;
-        e[1] = 0;
-        e[2] = a1 + (u + v);
-        e[3] = (u - v) + i1;
-        e[4] = a0 - t;
-        e[5] = c0 - b0;
-        e[6] = a1 - (u + v);
-        e[7] = (u - v) - i1;
-        e[8] = x0 - t2;
-        e[10] = b1;
-        e[12] = c0;
-        e[14] = c1;
-        e[9] = e[11] = e[13] = e[15] = 0;
+        T k[9];
+        k[0] = fft_sqrt_half<V>, k[1] = -k[0], k[8] = T(0);
+        leaf8_core(in, e, k);
     } else if (len == 4) {
         const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
         const T a0 = r0 + r1;
@@ -253,6 +265,23 @@ __attribute__((target("avx512f"))) void real_leaf16_x8(double* x, const int64_t*
         for (int i = 0; i < 8; ++i) _mm512_storeu_pd(x + 2 * at[i] + 8 * g, back[i]);
     }
 }
+
+// Eight leaves of 8 points at once, likewise.
+__attribute__((target("avx512f"))) void real_leaf8_x8(double* x, const int64_t* at, const double* k) {
+    __m512d rows[8], cols[8];
+    for (int i = 0; i < 8; ++i) rows[i] = _mm512_loadu_pd(x + at[i]);
+    fft_simd::transpose8(rows, cols);
+    lanes8d in[8], out[16], kv[9];
+    for (int i = 0; i < 8; ++i) in[i] = lanes8d(cols[i]);
+    for (int i = 0; i < 9; ++i) kv[i] = lanes8d(_mm512_set1_pd(k[i]));
+    leaf8_core(in, out, kv);
+    for (int g = 0; g < 2; ++g) {
+        __m512d part[8], back[8];
+        for (int i = 0; i < 8; ++i) part[i] = __m512d(out[8 * g + i]);
+        fft_simd::transpose8(part, back);
+        for (int i = 0; i < 8; ++i) _mm512_storeu_pd(x + 2 * at[i] + 8 * g, back[i]);
+    }
+}
 #endif
 
 // Where the leaves of a block of 2^j points lie (j = 2 .. 9), last to first:
@@ -297,34 +326,38 @@ void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<
     const LeafPlan& plan = leaf_plan(len);
     T k[9];
     leaf16_constants(k, fft_sqrt_half<V>, tw + 6 * (n / 16));
-    int32_t first = 0;
+    bool batched[96] = {};
 #ifdef VLX_FFT_AVX
-    // Past the first block a leaf writes beyond the block's samples (from
-    // 2 p0 >= p0 + len on), so its subtrees of 16 may go eight at a time.
+    // A leaf at p writes from 2p on: where that is past the block's samples
+    // (2p >= p0 + len), its order does not matter, so such subtrees of 16 and
+    // leaves of 8 go eight at a time, before the others.
     if constexpr (std::is_same_v<T, double>) {
-        if (level == 2 && p0 >= len) {
-            int64_t at[8];
-            int32_t count = 0;
+        if (level == 2) {
+            int64_t at16[8], at8[8];
+            int32_t count16 = 0, count8 = 0;
             for (int32_t i = 0; i < plan.count; ++i) {
                 const uint16_t a = plan.at[i];
-                if ((a & leaf16) == 0) continue;
-                at[count++] = p0 + (a & leaf_at);
-                if (count == 8) {
-                    real_leaf16_x8(x, at, k);
-                    count = 0;
+                const int64_t p = p0 + (a & leaf_at);
+                if (2 * p < p0 + len) break;  // and so for the rest: last to first
+                if ((a & leaf16) != 0) {
+                    at16[count16++] = p;
+                    if (count16 == 8) real_leaf16_x8(x, at16, k), count16 = 0;
+                } else if ((a & leaf8) != 0) {
+                    at8[count8++] = p;
+                    if (count8 == 8) real_leaf8_x8(x, at8, k), count8 = 0;
+                } else {
+                    continue;
                 }
+                batched[i] = true;
             }
-            for (int32_t i = 0; i < count; ++i) real_leaf16<V>(x, at[i], k);
-            for (int32_t i = 0; i < plan.count; ++i) {
-                const uint16_t a = plan.at[i];
-                if ((a & leaf16) == 0) real_leaf<V>(x, p0 + (a & leaf_at), (a & leaf8) != 0 ? 8 : 4);
-            }
-            first = plan.count;
+            for (int32_t i = 0; i < count16; ++i) real_leaf16<V>(x, at16[i], k);
+            for (int32_t i = 0; i < count8; ++i) real_leaf<V>(x, at8[i], 8);
         }
     }
 #endif
-    for (int32_t i = first; i < plan.count; ++i) {
+    for (int32_t i = 0; i < plan.count; ++i) {
         const uint16_t a = plan.at[i];
+        if (batched[i]) continue;
         const int64_t p = p0 + (a & leaf_at);
         if ((a & leaf16) != 0)
             real_leaf16<V>(x, p, k);
