@@ -350,8 +350,16 @@ void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<
                 }
                 batched[i] = true;
             }
-            for (int32_t i = 0; i < count16; ++i) real_leaf16<V>(x, at16[i], k);
-            for (int32_t i = 0; i < count8; ++i) real_leaf<V>(x, at8[i], 8);
+            // the rest with lanes repeating a subtree, which store the same
+            // points twice with the same values
+            if (count16 > 0) {
+                for (int32_t i = count16; i < 8; ++i) at16[i] = at16[0];
+                real_leaf16_x8(x, at16, k);
+            }
+            if (count8 > 0) {
+                for (int32_t i = count8; i < 8; ++i) at8[i] = at8[0];
+                real_leaf8_x8(x, at8, k);
+            }
         }
     }
 #endif
