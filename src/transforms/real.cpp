@@ -77,39 +77,6 @@ void real_stage(real_t<V>* x, int64_t p0, int64_t len, int64_t h, int64_t n, con
     }
 }
 
-// A leaf of 8 points (see real_leaf) with k as for leaf16_core: T a scalar
-// or a vector of leaves.  All samples are read before a point is written.
-template <class T>
-__attribute__((always_inline)) inline void leaf8_core(const T* in, T* e, const T* k) {
-    const T r = k[0], nr = k[1], zero = k[8];
-    const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
-    const T r4 = in[4], r5 = in[5], r6 = in[6], r7 = in[7];
-    const T a0 = r0 + r1, a1 = r0 - r1;  // two-point butterflies at 0, 4, 6
-    const T b0 = r4 + r5, b1 = r4 - r5;
-    const T c0 = r6 + r7, c1 = r6 - r7;
-    const T t = r3 + r2;  // block of h = 1
-    const T x0 = a0 + t, i1 = r3 - r2;
-    const T t2 = c0 + b0;  // block of h = 2
-    const T u = nr * c1;
-    const T v = r * b1;
-    e[0] = x0 + t2;
-    e[1] = zero;
-    e[2] = a1 + (u + v);
-    e[3] = (u - v) + i1;
-    e[4] = a0 - t;
-    e[5] = c0 - b0;
-    e[6] = a1 - (u + v);
-    e[7] = (u - v) - i1;
-    e[8] = x0 - t2;
-    e[9] = zero;
-    e[10] = b1;
-    e[11] = zero;
-    e[12] = c0;
-    e[13] = zero;
-    e[14] = c1;
-    e[15] = zero;
-}
-
 // The subtrees of 8 points or fewer of a block, whole: the two-point
 // butterflies on real parts and the blocks of h = 1 and 2 (table-free), in
 // the order the stages give them, with the values in registers.  The real
@@ -123,9 +90,30 @@ inline void real_leaf(real_t<V>* x, int64_t p, int64_t len) {
     const T* in = x + p;
     T* e = x + 2 * p;
     if (len == 8) {
-        T k[9];
-        k[0] = fft_sqrt_half<V>, k[1] = -k[0], k[8] = T(0);
-        leaf8_core(in, e, k);
+        const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
+        const T r4 = in[4], r5 = in[5], r6 = in[6], r7 = in[7];
+        const T a0 = r0 + r1, a1 = r0 - r1;  // two-point butterflies at 0, 4, 6
+        const T b0 = r4 + r5, b1 = r4 - r5;
+        const T c0 = r6 + r7, c1 = r6 - r7;
+        const T t = r3 + r2;  // block of h = 1
+        const T x0 = a0 + t, i1 = r3 - r2;
+        const T t2 = c0 + b0;  // block of h = 2
+        const T r = fft_sqrt_half<V>;
+        const T u = -r * c1;
+        const T v = r * b1;
+        e[0] = x0 + t2;
+        e[1] = 0;
+        e[2] = a1 + (u + v);
+        e[3] = (u - v) + i1;
+        e[4] = a0 - t;
+        e[5] = c0 - b0;
+        e[6] = a1 - (u + v);
+        e[7] = (u - v) - i1;
+        e[8] = x0 - t2;
+        e[10] = b1;
+        e[12] = c0;
+        e[14] = c1;
+        e[9] = e[11] = e[13] = e[15] = 0;
     } else if (len == 4) {
         const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
         const T a0 = r0 + r1;
@@ -149,14 +137,14 @@ inline void real_leaf(real_t<V>* x, int64_t p, int64_t len) {
 
 // A subtree of 16 points whole, in registers: the leaves of 8 and 4 and 4 as
 // real_leaf gives them, then the block of h = 4 on them (its first and pi/4
-// elements and its one general element).  Its points 9 .. 15 keep what the
-// leaves left there.  T is a scalar, or a vector of the lanes holding one
-// subtree each; k holds r, -r, the pair of the element and 0.  All samples
-// are read before the first point is written.
-template <class T>
-__attribute__((always_inline)) inline void leaf16_core(const T* in, T* e, const T* k) {
-    const T r = k[0], nr = k[1], zero = k[8];
-    const T* pair16 = k + 2;
+// elements and its one general element, with pair pair16).  Its points 9 ..
+// 15 keep what the leaves left there.
+template <VlxVector V>
+inline void real_leaf16(real_t<V>* x, int64_t p, const real_t<V>* pair16) {
+    using T = real_t<V>;
+    const T* in = x + p;
+    T* e = x + 2 * p;
+    const T r = fft_sqrt_half<V>;
     // leaf of 8 at 0: points P0 .. P7
     const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
     const T r4 = in[4], r5 = in[5], r6 = in[6], r7 = in[7];
@@ -166,7 +154,7 @@ __attribute__((always_inline)) inline void leaf16_core(const T* in, T* e, const 
     const T t = r3 + r2;
     const T x0 = a0 + t, i1 = r3 - r2;
     const T t2 = c0 + b0;
-    const T u8 = nr * c1;
+    const T u8 = -r * c1;
     const T v8 = r * b1;
     const T p0r = x0 + t2;
     const T p1r = a1 + (u8 + v8), p1i = (u8 - v8) + i1;
@@ -184,7 +172,7 @@ __attribute__((always_inline)) inline void leaf16_core(const T* in, T* e, const 
     const T tt = s0r + q0r;
     const T e0r = p0r + tt, e8r = p0r - tt, e4i = s0r - q0r;
     // pi/4 element
-    const T u = nr * s2r;
+    const T u = -r * s2r;
     const T v = r * q2r;
     const T e2r = p2r + (u + v), e2i = (u - v) + p2i;
     const T e6r = p2r - (u + v), e6i = (u - v) - p2i;
@@ -196,7 +184,7 @@ __attribute__((always_inline)) inline void leaf16_core(const T* in, T* e, const 
     const T sr = w1r + w3r, si = w1i + w3i;
     const T dr = w3r - w1r, di = w3i - w1i;
     e[0] = e0r;
-    e[1] = zero;
+    e[1] = 0;
     e[2] = p1r + sr;
     e[3] = p1i + si;
     e[4] = e2r;
@@ -212,77 +200,22 @@ __attribute__((always_inline)) inline void leaf16_core(const T* in, T* e, const 
     e[14] = p1r - sr;
     e[15] = si - p1i;
     e[16] = e8r;
-    e[17] = zero;
+    e[17] = 0;
     e[18] = q1r;
     e[19] = q1i;
     e[20] = q2r;
-    e[21] = zero;
+    e[21] = 0;
     e[22] = q3;
-    e[23] = zero;
+    e[23] = 0;
     e[24] = s0r;
-    e[25] = zero;
+    e[25] = 0;
     e[26] = s1r;
     e[27] = s1i;
     e[28] = s2r;
-    e[29] = zero;
+    e[29] = 0;
     e[30] = s3;
-    e[31] = zero;
+    e[31] = 0;
 }
-
-template <class T>
-inline void leaf16_constants(T* k, T r, const T* pair16) {
-    k[0] = r;
-    k[1] = -r;
-    for (int i = 0; i < 6; ++i) k[2 + i] = pair16[i];
-    k[8] = T(0);
-}
-
-template <VlxVector V>
-inline void real_leaf16(real_t<V>* x, int64_t p, const real_t<V>* k) {
-    leaf16_core(x + p, x + 2 * p, k);
-}
-
-#ifdef VLX_FFT_AVX
-// Eight subtrees of 16 points at once on AVX-512F, one a lane (doubles): the
-// samples go in by two 8 x 8 transposes and the points come out by four.
-// Each lane does the scalar subtree's operations in the same order.
-using lanes8d = double __attribute__((vector_size(64)));
-
-__attribute__((target("avx512f"))) void real_leaf16_x8(double* x, const int64_t* at, const double* k) {
-    __m512d rows[8], cols[16];
-    for (int half = 0; half < 2; ++half) {
-        for (int i = 0; i < 8; ++i) rows[i] = _mm512_loadu_pd(x + at[i] + 8 * half);
-        fft_simd::transpose8(rows, cols + 8 * half);
-    }
-    lanes8d in[16], out[32], kv[9];
-    for (int i = 0; i < 16; ++i) in[i] = lanes8d(cols[i]);
-    for (int i = 0; i < 9; ++i) kv[i] = lanes8d(_mm512_set1_pd(k[i]));
-    leaf16_core(in, out, kv);
-    for (int g = 0; g < 4; ++g) {
-        __m512d part[8], back[8];
-        for (int i = 0; i < 8; ++i) part[i] = __m512d(out[8 * g + i]);
-        fft_simd::transpose8(part, back);
-        for (int i = 0; i < 8; ++i) _mm512_storeu_pd(x + 2 * at[i] + 8 * g, back[i]);
-    }
-}
-
-// Eight leaves of 8 points at once, likewise.
-__attribute__((target("avx512f"))) void real_leaf8_x8(double* x, const int64_t* at, const double* k) {
-    __m512d rows[8], cols[8];
-    for (int i = 0; i < 8; ++i) rows[i] = _mm512_loadu_pd(x + at[i]);
-    fft_simd::transpose8(rows, cols);
-    lanes8d in[8], out[16], kv[9];
-    for (int i = 0; i < 8; ++i) in[i] = lanes8d(cols[i]);
-    for (int i = 0; i < 9; ++i) kv[i] = lanes8d(_mm512_set1_pd(k[i]));
-    leaf8_core(in, out, kv);
-    for (int g = 0; g < 2; ++g) {
-        __m512d part[8], back[8];
-        for (int i = 0; i < 8; ++i) part[i] = __m512d(out[8 * g + i]);
-        fft_simd::transpose8(part, back);
-        for (int i = 0; i < 8; ++i) _mm512_storeu_pd(x + 2 * at[i] + 8 * g, back[i]);
-    }
-}
-#endif
 
 // Where the leaves of a block of 2^j points lie (j = 2 .. 9), last to first:
 // the offset, plus leaf8 for a leaf of 8 points, leaf16 for a subtree of 16,
@@ -324,51 +257,12 @@ void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<
                  int32_t level) {
     using T = real_t<V>;
     const LeafPlan& plan = leaf_plan(len);
-    T k[9];
-    leaf16_constants(k, fft_sqrt_half<V>, tw + 6 * (n / 16));
-    bool batched[96] = {};
-#ifdef VLX_FFT_AVX
-    // A leaf at p writes from 2p on: where that is past the block's samples
-    // (2p >= p0 + len), its order does not matter, so such subtrees of 16 and
-    // leaves of 8 go eight at a time, before the others.
-    if constexpr (std::is_same_v<T, double>) {
-        if (level == 2) {
-            int64_t at16[8], at8[8];
-            int32_t count16 = 0, count8 = 0;
-            for (int32_t i = 0; i < plan.count; ++i) {
-                const uint16_t a = plan.at[i];
-                const int64_t p = p0 + (a & leaf_at);
-                if (2 * p < p0 + len) break;  // and so for the rest: last to first
-                if ((a & leaf16) != 0) {
-                    at16[count16++] = p;
-                    if (count16 == 8) real_leaf16_x8(x, at16, k), count16 = 0;
-                } else if ((a & leaf8) != 0) {
-                    at8[count8++] = p;
-                    if (count8 == 8) real_leaf8_x8(x, at8, k), count8 = 0;
-                } else {
-                    continue;
-                }
-                batched[i] = true;
-            }
-            // the rest with lanes repeating a subtree, which store the same
-            // points twice with the same values
-            if (count16 > 0) {
-                for (int32_t i = count16; i < 8; ++i) at16[i] = at16[0];
-                real_leaf16_x8(x, at16, k);
-            }
-            if (count8 > 0) {
-                for (int32_t i = count8; i < 8; ++i) at8[i] = at8[0];
-                real_leaf8_x8(x, at8, k);
-            }
-        }
-    }
-#endif
+    const T* pair16 = tw + 6 * (n / 16);
     for (int32_t i = 0; i < plan.count; ++i) {
         const uint16_t a = plan.at[i];
-        if (batched[i]) continue;
         const int64_t p = p0 + (a & leaf_at);
         if ((a & leaf16) != 0)
-            real_leaf16<V>(x, p, k);
+            real_leaf16<V>(x, p, pair16);
         else
             real_leaf<V>(x, p, (a & leaf8) != 0 ? 8 : 4);
     }
