@@ -58,9 +58,6 @@ void real_stage(real_t<V>* x, int64_t p0, int64_t len, int64_t h, int64_t n, con
             return lanes512::real_stage_lanes<Avx512<T>>(x, p0, len, h, st, r);
         if (level >= 1 && h / 2 >= int64_t(Avx<T>::width))
             return lanes256::real_stage_lanes<Avx<T>>(x, p0, len, h, st, r);
-        if constexpr (std::is_same_v<T, float>) {
-            if (level >= 1 && h == 4) return lanes256::real_stage_lanes<Floats128>(x, p0, len, h, st, r);
-        }
     }
 #else
     (void)st;
