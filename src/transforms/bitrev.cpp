@@ -258,25 +258,6 @@ VLX_TILE512 void tile_image128(const char* src, size_t from, char* dst, size_t t
     }
 }
 
-// A pair of distinct tiles of 64-bit points exchanged whole in registers:
-// both are read before either image is stored.
-template <class T, bool Scaled>
-VLX_TILE512 void tile_pair64(char* a, char* b, size_t row, T f) {
-    static constexpr size_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
-    __m512d ra[8], rb[8], ca[8], cb[8];
-    for (size_t c = 0; c < 8; ++c) {
-        ra[c] = _mm512_loadu_pd(a + r3[c] * row);
-        rb[c] = _mm512_loadu_pd(b + r3[c] * row);
-    }
-    fft_simd::transpose8(ra, ca);
-    fft_simd::transpose8(rb, cb);
-    for (size_t i = 0; i < 8; ++i) {
-        const __m512d va = ca[r3[i]], vb = cb[r3[i]];
-        _mm512_storeu_pd(b + i * row, Scaled ? scaled(va, f) : va);
-        _mm512_storeu_pd(a + i * row, Scaled ? scaled(vb, f) : vb);
-    }
-}
-
 template <class T, size_t W>
 constexpr bool tile_lanes = W * sizeof(T) == 8 || W * sizeof(T) == 16;
 
@@ -305,10 +286,6 @@ VLX_TILE512 void by_tiles_lanes(T* x, int32_t m, T f) {
         T* other = x + W * (image << 3);
         if (image == mid) {
             tile_image<T, W, Scaled>(tile, row, tile, row, f);
-            continue;
-        }
-        if constexpr (W * sizeof(T) == 8) {
-            tile_pair64<T, Scaled>(reinterpret_cast<char*>(tile), reinterpret_cast<char*>(other), row, f);
             continue;
         }
         auto* to = reinterpret_cast<char*>(buffer);

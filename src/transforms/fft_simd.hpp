@@ -36,38 +36,6 @@ inline int32_t lanes() {
     return cap < have ? cap : have;
 }
 
-// The elements of a real-transform block (quarter length h, at e) that need
-// no table: the first, and for h >= 2 the pi/4 element (r = sqrt(1/2)), which
-// uses only the real parts of the quarter parts' Nyquist bins.  They touch
-// points of their own, so they run apart from the others.
-template <class T>
-inline void real_edges(T* e, int64_t h, T r) {
-    T* o1 = e + 4 * h;
-    T* o3 = e + 6 * h;
-    const T x0 = e[0], x2 = o1[0], x3 = o3[0];
-    const T t = x3 + x2;
-    e[0] = x0 + t;
-    o1[0] = x0 - t;
-    e[2 * h + 1] = x3 - x2;
-    if (h >= 2) {
-        const int64_t j = h;  // scalar index of point h/2
-        const T u = -r * o3[j];
-        const T v = r * o1[j];
-        const T er = e[j], ei = e[j + 1];
-        e[j] = er + (u + v);
-        e[j + 1] = (u - v) + ei;
-        T* mirror = e + 2 * h + j;
-        mirror[0] = er - (u + v);
-        mirror[1] = (u - v) - ei;
-    }
-}
-
-// Offset of the lane copy of the stage of quarter length q (q >= 2) in the
-// lane table of length n: the stages from q = n/4 down, 8q scalars each.
-inline size_t lane_offset(size_t n, size_t q) { return 8 * (n / 2 - 2 * q); }
-// Scalars of the lane table of length n (n >= 8).
-inline size_t lane_table_size(size_t n) { return 4 * n - 16; }
-
 }  // namespace fft_simd
 }  // namespace vlx
 
@@ -299,3 +267,10 @@ namespace lanes512 {
 }  // namespace vlx::fft_simd
 #endif
 
+namespace vlx::fft_simd {
+// Offset of the lane copy of the stage of quarter length q (q >= 2) in the
+// lane table of length n: the stages from q = n/4 down, 8q scalars each.
+inline size_t lane_offset(size_t n, size_t q) { return 8 * (n / 2 - 2 * q); }
+// Scalars of the lane table of length n (n >= 8).
+inline size_t lane_table_size(size_t n) { return 4 * n - 16; }
+}  // namespace vlx::fft_simd

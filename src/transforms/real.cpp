@@ -12,6 +12,33 @@
 namespace vlx {
 namespace {
 
+// The elements of a block that need no table: the first, and for h >= 2 the
+// pi/4 element, which uses only the real parts of the quarter parts' Nyquist
+// bins.  They touch points of their own, so they run apart from the others.
+template <VlxVector V>
+inline void real_edges(real_t<V>* e, int64_t h) {
+    using T = real_t<V>;
+    T* o1 = e + 4 * h;
+    T* o3 = e + 6 * h;
+    const T x0 = e[0], x2 = o1[0], x3 = o3[0];
+    const T t = x3 + x2;
+    e[0] = x0 + t;
+    o1[0] = x0 - t;
+    e[2 * h + 1] = x3 - x2;
+    if (h >= 2) {
+        const int64_t j = h;  // scalar index of point h/2
+        const T r = fft_sqrt_half<V>;
+        const T u = -r * o3[j];
+        const T v = r * o1[j];
+        const T er = e[j], ei = e[j + 1];
+        e[j] = er + (u + v);
+        e[j + 1] = (u - v) + ei;
+        T* mirror = e + 2 * h + j;
+        mirror[0] = er - (u + v);
+        mirror[1] = (u - v) - ei;
+    }
+}
+
 // The general element k of a block (0 < k < h/2) with the table pair of k.
 template <VlxVector V>
 inline void real_element(real_t<V>* e, int64_t h, int64_t k, const real_t<V>* pair) {
@@ -42,36 +69,26 @@ inline void real_element(real_t<V>* e, int64_t h, int64_t k, const real_t<V>* pa
     mirror2[1] = dr - e2i;
 }
 
-// The blocks of quarter length h of a block of len points at p0, as the
-// levels walk them (its tree is that of a transform of len points), each
-// with its general elements and then its first element; lanes as `level`
-// allows (st: the lane copy of the stage), else scalar.
+// One block of n = 4h points at point p: from the half spectra of its even
+// part (p .. p+h), and of its two quarter parts (p+2h .. p+2h+h/2 and
+// p+3h .. p+3h+h/2) to its own half spectrum (p .. p+2h).
 template <VlxVector V>
-void real_stage(real_t<V>* x, int64_t p0, int64_t len, int64_t h, int64_t n, const real_t<V>* tw,
-                const real_t<V>* st, int32_t level) {
+void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t stride, const real_t<V>* st,
+                int32_t level) {
     using T = real_t<V>;
-    const T r = fft_sqrt_half<V>;
+    T* e = x + 2 * p;
+    real_edges<V>(e, h);
+    int64_t k = 1;
 #ifdef VLX_FFT_AVX
     using namespace fft_simd;
-    if (st != nullptr) {
-        if (level == 2 && h / 2 >= int64_t(Avx512<T>::width))
-            return lanes512::real_stage_lanes<Avx512<T>>(x, p0, len, h, st, r);
-        if (level >= 1 && h / 2 >= int64_t(Avx<T>::width))
-            return lanes256::real_stage_lanes<Avx<T>>(x, p0, len, h, st, r);
-    }
+    // (no call where a kernel would find less than one vector of elements)
+    if (level == 2 && h / 2 > int64_t(Avx512<T>::width)) k = lanes512::real_elements_lanes<Avx512<T>>(e, h, st, k);
+    if (level >= 1 && h / 2 - k >= int64_t(Avx<T>::width)) k = lanes256::real_elements_lanes<Avx<T>>(e, h, st, k);
 #else
     (void)st;
     (void)level;
 #endif
-    const int64_t stride = n / (4 * h);
-    for (int64_t pos = 0, spacing = 8, c = (len / (4 * h) + 1) / 2; c > 0;
-         pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
-        for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) {
-            T* e = x + 2 * (p0 + p * h);
-            for (int64_t k = 1; k < h / 2; ++k) real_element<V>(e, h, k, tw + 6 * k * stride);
-            fft_simd::real_edges(e, h, r);
-        }
-    }
+    for (; k < h / 2; ++k) real_element<V>(e, h, k, tw + 6 * k * stride);
 }
 
 // The subtrees of 8 points or fewer of a block, whole: the two-point
@@ -132,101 +149,19 @@ inline void real_leaf(real_t<V>* x, int64_t p, int64_t len) {
     }
 }
 
-// A subtree of 16 points whole, in registers: the leaves of 8 and 4 and 4 as
-// real_leaf gives them, then the block of h = 4 on them (its first and pi/4
-// elements and its one general element, with pair pair16).  Its points 9 ..
-// 15 keep what the leaves left there.
-template <VlxVector V>
-inline void real_leaf16(real_t<V>* x, int64_t p, const real_t<V>* pair16) {
-    using T = real_t<V>;
-    const T* in = x + p;
-    T* e = x + 2 * p;
-    const T r = fft_sqrt_half<V>;
-    // leaf of 8 at 0: points P0 .. P7
-    const T r0 = in[0], r1 = in[1], r2 = in[2], r3 = in[3];
-    const T r4 = in[4], r5 = in[5], r6 = in[6], r7 = in[7];
-    const T a0 = r0 + r1, a1 = r0 - r1;
-    const T b0 = r4 + r5, b1 = r4 - r5;
-    const T c0 = r6 + r7, c1 = r6 - r7;
-    const T t = r3 + r2;
-    const T x0 = a0 + t, i1 = r3 - r2;
-    const T t2 = c0 + b0;
-    const T u8 = -r * c1;
-    const T v8 = r * b1;
-    const T p0r = x0 + t2;
-    const T p1r = a1 + (u8 + v8), p1i = (u8 - v8) + i1;
-    const T p2r = a0 - t, p2i = c0 - b0;
-    const T p3r = a1 - (u8 + v8), p3i = (u8 - v8) - i1;
-    const T p4r = x0 - t2;
-    // leaves of 4 at 8 and 12: points Q0 .. Q3 and R0 .. R3
-    const T q0 = in[8], q1 = in[9], q2 = in[10], q3 = in[11];
-    const T qa = q0 + q1, qt = q3 + q2;
-    const T q0r = qa + qt, q1r = q0 - q1, q1i = q3 - q2, q2r = qa - qt;
-    const T s0 = in[12], s1 = in[13], s2 = in[14], s3 = in[15];
-    const T sa = s0 + s1, st = s3 + s2;
-    const T s0r = sa + st, s1r = s0 - s1, s1i = s3 - s2, s2r = sa - st;
-    // the block of h = 4: first element
-    const T tt = s0r + q0r;
-    const T e0r = p0r + tt, e8r = p0r - tt, e4i = s0r - q0r;
-    // pi/4 element
-    const T u = -r * s2r;
-    const T v = r * q2r;
-    const T e2r = p2r + (u + v), e2i = (u - v) + p2i;
-    const T e6r = p2r - (u + v), e6i = (u - v) - p2i;
-    // general element k = 1
-    T m = (q1r + q1i) * pair16[0];
-    const T w1r = m + pair16[2] * q1i, w1i = m + pair16[1] * q1r;
-    m = (s1r + s1i) * pair16[3];
-    const T w3r = m + pair16[5] * s1i, w3i = m + pair16[4] * s1r;
-    const T sr = w1r + w3r, si = w1i + w3i;
-    const T dr = w3r - w1r, di = w3i - w1i;
-    e[0] = e0r;
-    e[1] = 0;
-    e[2] = p1r + sr;
-    e[3] = p1i + si;
-    e[4] = e2r;
-    e[5] = e2i;
-    e[6] = p3r + di;
-    e[7] = dr + p3i;
-    e[8] = p4r;
-    e[9] = e4i;
-    e[10] = p3r - di;
-    e[11] = dr - p3i;
-    e[12] = e6r;
-    e[13] = e6i;
-    e[14] = p1r - sr;
-    e[15] = si - p1i;
-    e[16] = e8r;
-    e[17] = 0;
-    e[18] = q1r;
-    e[19] = q1i;
-    e[20] = q2r;
-    e[21] = 0;
-    e[22] = q3;
-    e[23] = 0;
-    e[24] = s0r;
-    e[25] = 0;
-    e[26] = s1r;
-    e[27] = s1i;
-    e[28] = s2r;
-    e[29] = 0;
-    e[30] = s3;
-    e[31] = 0;
-}
-
 // Where the leaves of a block of 2^j points lie (j = 2 .. 9), last to first:
-// the offset, plus leaf8 for a leaf of 8 points, leaf16 for a subtree of 16,
-// else a leaf of 4.  Worked out once, at compile time, so that the leaves
-// need no recursion.
-constexpr uint16_t leaf8 = 0x8000, leaf16 = 0x4000, leaf_at = 0x3FFF;
+// the offset, plus leaf8 for a leaf of 8 points, leaf16 or leaf32 for a
+// subtree of 16 or 32 (its leaves and blocks of h = 4, 8), else a leaf of 4.  Worked out once, at
+// compile time, so that the leaves need no recursion.
+constexpr uint16_t leaf8 = 0x8000, leaf16 = 0x4000, leaf32 = 0xC000, leaf_at = 0x3FFF;
 struct LeafPlan {
     uint16_t at[96];  // 85 for 512 points
     int32_t count;
 };
 
 constexpr void plan_leaves(LeafPlan& plan, int32_t p, int32_t len) {
-    if (len <= 16) {
-        plan.at[plan.count++] = uint16_t(p | (len == 16 ? leaf16 : len == 8 ? leaf8 : 0));
+    if (len <= 32) {
+        plan.at[plan.count++] = uint16_t(p | (len == 32 ? leaf32 : len == 16 ? leaf16 : len == 8 ? leaf8 : 0));
         return;
     }
     plan_leaves(plan, p + 3 * len / 4, len / 4);
@@ -245,27 +180,53 @@ inline constexpr LeafPlan leaf_plans[8] = {make_plan(4),  make_plan(8),  make_pl
 
 inline const LeafPlan& leaf_plan(int64_t len) { return leaf_plans[log2_of(int32_t(len)) - 2]; }
 
-// A block of len points with everything below it: all its leaves, then the
-// stages from h = 8 up as the levels walk them within the block (its tree is
+// The leaves of the plan; a subtree of 16 also runs its block of h = 4 (one
+// general element, pair stride of it), with its leaves last to first.
+template <VlxVector V>
+inline void real_leaf16(real_t<V>* x, int64_t p, const real_t<V>* tw, int64_t n) {
+    real_leaf<V>(x, p + 12, 4);
+    real_leaf<V>(x, p + 8, 4);
+    real_leaf<V>(x, p, 8);
+    real_edges<V>(x + 2 * p, 4);
+    real_element<V>(x + 2 * p, 4, 1, tw + 6 * (n / 16));
+}
+
+template <VlxVector V>
+void real_leaves(real_t<V>* x, int64_t p0, int64_t len, const real_t<V>* tw, int64_t n) {
+    const LeafPlan& plan = leaf_plan(len);
+    for (int32_t i = 0; i < plan.count; ++i) {
+        const uint16_t a = plan.at[i];
+        const int64_t p = p0 + (a & leaf_at);
+        if ((a & leaf32) == leaf32) {
+            real_leaf<V>(x, p + 24, 8);
+            real_leaf<V>(x, p + 16, 8);
+            real_leaf16<V>(x, p, tw, n);
+            real_edges<V>(x + 2 * p, 8);
+            for (int64_t k = 1; k < 4; ++k) real_element<V>(x + 2 * p, 8, k, tw + 6 * k * (n / 32));
+        } else if ((a & leaf16) != 0) {
+            real_leaf16<V>(x, p, tw, n);
+        } else {
+            real_leaf<V>(x, p, (a & leaf8) != 0 ? 8 : 4);
+        }
+    }
+}
+
+// A block of len points with everything below it: the leaves, then the
+// stages from h = 16 up as the levels walk them within the block (its tree is
 // that of a transform of len points).  Each stage's stores are then long done
 // when the next stage loads them as vectors.
 template <VlxVector V>
 void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                  int32_t level) {
     using T = real_t<V>;
-    const LeafPlan& plan = leaf_plan(len);
-    const T* pair16 = tw + 6 * (n / 16);
-    for (int32_t i = 0; i < plan.count; ++i) {
-        const uint16_t a = plan.at[i];
-        const int64_t p = p0 + (a & leaf_at);
-        if ((a & leaf16) != 0)
-            real_leaf16<V>(x, p, pair16);
-        else
-            real_leaf<V>(x, p, (a & leaf8) != 0 ? 8 : 4);
-    }
-    for (int64_t h = 8; 4 * h <= len; h *= 2) {
+    real_leaves<V>(x, p0, len, tw, n);
+    for (int64_t h = 16; 4 * h <= len; h *= 2) {
         const T* st = lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
-        real_stage<V>(x, p0, len, h, n, tw, st, level);
+        for (int64_t pos = 0, spacing = 8, c = (len / (4 * h) + 1) / 2; c > 0;
+             pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
+            for (int64_t i = 0, p = pos; i < c; ++i, p += spacing)
+                real_block<V>(x, p0 + p * h, h, tw, n / (4 * h), st, st != nullptr ? level : 0);
+        }
     }
 }
 
@@ -282,8 +243,8 @@ void real_tree(real_t<V>* x, int64_t p, int64_t len, int64_t n, const real_t<V>*
     real_tree<V>(x, p + len / 2, len / 4, n, tw, lanes, level);
     real_tree<V>(x, p, len / 2, n, tw, lanes, level);
     const int64_t h = len / 4;
-    real_stage<V>(x, p, len, h, n, tw, lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr,
-                  level);
+    real_block<V>(x, p, h, tw, n / len, lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr,
+                  lanes != nullptr ? level : 0);
 }
 
 // Real samples to complex points with zero imaginary parts, from the last.
