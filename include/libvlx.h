@@ -268,25 +268,6 @@ VLX_API int32_t vlxfi_analytic(vlxf_t* v);
 VLX_API int32_t vlxi_hilbert(vlx_t* v);
 VLX_API int32_t vlxfi_hilbert(vlxf_t* v);
 
-
-/* ======================================================================== */
-/* Generators and filter design: FIR design                                 */
-/* ======================================================================== */
-
-/* Impulse response of type into v, whose points the caller sets (complex v:
- * the same taps, imaginary parts 0); frequencies in cycles per sample.
- * 0 band pass (arg1 centre, arg2 width), 1 band stop (same, odd points),
- * 2 high pass (arg1 cut, odd points), 3 low pass (arg1 cut), 4 window-shaped
- * smoother (arg1 shape, 0 default), 5 low pass with delay arg2 samples,
- * 6 differentiator, 7 Gaussian (arg1 bandwidth), 8 Hilbert transformer
- * (arg1 band edge), 9 sinhc smoother (arg1 shape), 10 ramp |f|.  4, 5, 7, 9
- * sum to 1; the others are unwindowed.  0, or -1 (type above 10, no memory). */
-VLX_API int32_t vlxc_fir(vlx_t* v, int32_t type, double arg1, double arg2);
-VLX_API int32_t vlxfc_fir(vlxf_t* v, int32_t type, float arg1, float arg2);
-/* Fixed half-filter set 100 to 104 into v (12, 20, 5, 38 or 61 points). */
-VLX_API int32_t vlxc_fir2(vlx_t* v, int32_t set);
-VLX_API int32_t vlxfc_fir2(vlxf_t* v, int32_t set);
-
 /* ======================================================================== */
 /* Windows                                                                  */
 /* ======================================================================== */
@@ -426,6 +407,306 @@ VLX_API int32_t vlxf_window_enbw(float* out, int32_t id, int32_t points);
  * for a window of width points (width <= 0: 1e100, float 1e15). */
 VLX_API int32_t vlx_window_metric(double* out, int32_t selector, int32_t id, int32_t points, double width);
 VLX_API int32_t vlxf_window_metric(float* out, int32_t selector, int32_t id, int32_t points, float width);
+
+/* ======================================================================== */
+/* Generators and resampling tables                                         */
+/* ======================================================================== */
+/* The generators fill a vector whose points, delta and complex flag the caller
+ * has set; sample k stands at x = k*delta, so frequencies are in cycles per
+ * unit of x.  points and delta are left as they are. */
+
+/* v[k] = offset + k*delta*slope, by adding delta*slope sample after sample;
+ * a complex v gets zero imaginary parts.  0, or -1 if storage fails. */
+VLX_API int32_t vlxc_line(vlx_t* v, double slope, double offset);
+VLX_API int32_t vlxfc_line(vlxf_t* v, float slope, float offset);
+/* v[k] = cos(2*pi*freq*k*delta + phase), phase in radians, by a rotation
+ * restarted exactly every 256 samples; a complex v gets zero imaginary parts. */
+VLX_API int32_t vlxc_cos(vlx_t* v, double freq, double phase);
+VLX_API int32_t vlxfc_cos(vlxf_t* v, float freq, float phase);
+/* v[k] = exp(j*(2*pi*freq*k*delta + phase)) in a complex v; a real v gets
+ * the cosine (vlxc_cos).  0, or -1 if storage fails. */
+VLX_API int32_t vlxc_cexp(vlx_t* v, double freq, double phase);
+VLX_API int32_t vlxfc_cexp(vlxf_t* v, float freq, float phase);
+
+/* Fills v (points and complex preset) with noise of a kind: 0 uniform in
+ * [-1, 1) (complex: in the unit disc), 1 Gaussian of variance 1 (complex:
+ * each part), 2 exponential of mean 1, 3 Laplace (2 and 3 real only).  Draws
+ * on the C library's rand(), seeded once per family from the machine; each
+ * rand() value counts by its low 15 bits (rand() & 0x7FFF), so a uniform
+ * draw takes 4 calls (60 bits; float: 2 calls, 30 bits).  Holds lock 1 for
+ * the whole fill.  -1 for another kind, kinds 2 and 3 on a complex v (after
+ * sizing it), or if storage fails. */
+VLX_API int32_t vlxc_rand(vlx_t* v, int32_t kind);
+VLX_API int32_t vlxfc_rand(vlxf_t* v, int32_t kind);
+/* Random permutation of the samples in place (complex pairs stay together),
+ * by a Fisher-Yates walk on 31-bit draws of the same generator.  Returns 0. */
+VLX_API int32_t vlxi_shuffle(vlx_t* v);
+VLX_API int32_t vlxfi_shuffle(vlxf_t* v);
+
+/* A resampling table is a real vector of n = T*P + 2 points (n even): T, the
+ * taps per phase, in data[0], then T*P + 1 samples of one low-pass kernel
+ * over P phases, symmetric about the middle entry data[1 + (n-2)/2].  The
+ * caller presets n (and so P); a design is a real vector of T and shape
+ * coefficients.  n below 2 or a design of fewer than 2 scalars: 0, v zero
+ * with data[0] = T where both have a first scalar. */
+
+/* Expands built-in design 0 to 4 (T = 8, 13, 8, 10, 13) into v, a kernel
+ * that peaks in the middle.  0; -1 for another design, an odd n or if
+ * storage fails. */
+VLX_API int32_t vlxc_rsmp(vlx_t* v, int32_t design);
+VLX_API int32_t vlxfc_rsmp(vlxf_t* v, int32_t design);
+/* Expands design d = (T, a0, a1, ...) as the cosine sum a0 + a1*cos(theta) +
+ * a2*cos(2*theta) + ..., theta from 0 at the middle to pi at the ends.  -1
+ * for an odd n, a complex d or if storage fails.  A complex v gets the
+ * table as real parts. */
+VLX_API int32_t vlxc_rsmp_cos(vlx_t* v, const vlx_t* d);
+VLX_API int32_t vlxfc_rsmp_cos(vlxf_t* v, const vlxf_t* d);
+/* As vlxc_rsmp_cos, with the shape a polynomial a0 + a1*c + a2*c^2 + ... in
+ * c = cos(theta). */
+VLX_API int32_t vlxc_rsmp_pcos(vlx_t* v, const vlx_t* d);
+VLX_API int32_t vlxfc_rsmp_pcos(vlxf_t* v, const vlxf_t* d);
+
+/* ======================================================================== */
+/* Generators and filter design: FIR design                                 */
+/* ======================================================================== */
+
+/* Impulse response of type into v, whose points the caller sets (complex v:
+ * the same taps, imaginary parts 0); frequencies in cycles per sample.
+ * 0 band pass (arg1 centre, arg2 width), 1 band stop (same, odd points),
+ * 2 high pass (arg1 cut, odd points), 3 low pass (arg1 cut), 4 window-shaped
+ * smoother (arg1 shape, 0 default), 5 low pass with delay arg2 samples,
+ * 6 differentiator, 7 Gaussian (arg1 bandwidth), 8 Hilbert transformer
+ * (arg1 band edge), 9 sinhc smoother (arg1 shape), 10 ramp |f|.  4, 5, 7, 9
+ * sum to 1; the others are unwindowed.  0, or -1 (type above 10, no memory). */
+VLX_API int32_t vlxc_fir(vlx_t* v, int32_t type, double arg1, double arg2);
+VLX_API int32_t vlxfc_fir(vlxf_t* v, int32_t type, float arg1, float arg2);
+/* Fixed half-filter set 100 to 104 into v (12, 20, 5, 38 or 61 points). */
+VLX_API int32_t vlxc_fir2(vlx_t* v, int32_t set);
+VLX_API int32_t vlxfc_fir2(vlxf_t* v, int32_t set);
+
+/* ======================================================================== */
+/* Filters: staging and decimation                                          */
+/* ======================================================================== */
+/* A filter's history `hist` is an optional vector owned by the caller that
+ * carries the stream from block to block; NULL or empty starts from silence.
+ * Output has as many points as input, except in rate changers. */
+
+/* Staging flags of vlx_stage_io. */
+#define VLX_STAGE_ALIAS       1 /* route a destination sharing the source's data through a temporary */
+#define VLX_STAGE_KEEP_POINTS 2 /* the caller has set out->points already */
+
+/* Keeps every factor-th sample (factor < 1 taken as 1) after the skip count carried in
+ * hist->data[0] (hist may be NULL), so blocks fed in turn give what one long call gives.
+ * out may be in; out->delta = factor * in->delta. */
+VLX_API int32_t vlxd_deci(vlx_t* in, vlx_t* out, int32_t factor, vlx_t* hist);
+VLX_API int32_t vlxfd_deci(vlxf_t* in, vlxf_t* out, int32_t factor, vlxf_t* hist);
+
+/* ======================================================================== */
+/* Filters: FIR, symmetric FIR, hwfilt, resampler                           */
+/* ======================================================================== */
+/* Filters keep their delay and give as many points as the input; out may be
+ * in.  hist (may be NULL) carries the last inputs so that blocks fed in turn
+ * continue one stream.  Each returns 0, or -1 on failure. */
+
+/* FIR filter: out[k] = sum of filter[i] * in[k - i] over the filter->points taps, real or complex
+ * source and taps; hist holds the last filter->points - 1 inputs.  Long real filters run a fast
+ * convolution with the filter's spectrum cached.  An empty filter copies in. */
+VLX_API int32_t vlxd_fir(vlx_t* in, vlx_t* out, vlx_t* filter, vlx_t* hist);
+VLX_API int32_t vlxfd_fir(vlxf_t* in, vlxf_t* out, vlxf_t* filter, vlxf_t* hist);
+/* Linear-phase FIR from the first half of its taps: 2m taps, or 2m - 1 with odd non-zero
+ * (filter's last tap the centre); anti non-zero negates the mirrored half.  hist: N - 1 inputs. */
+VLX_API int32_t vlxd_sfir(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd, int32_t anti, vlx_t* hist);
+VLX_API int32_t vlxfd_sfir(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, vlxf_t* hist);
+/* vlxd_sfir then vlxd_deci by factor (below 1 taken as 1); hist holds the N - 1 inputs and, at
+ * point N - 1, the skip count.  out->delta = factor * in->delta. */
+VLX_API int32_t vlxd_sfir_deci(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd, int32_t anti, int32_t factor, vlx_t* hist);
+VLX_API int32_t vlxfd_sfir_deci(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, int32_t factor, vlxf_t* hist);
+/* Fixed low-pass of four power-of-two sections (id 0 only; zeros at 1/3 and 1/2 of the rate,
+ * gain 1 at 0); hist: 12 points of section state.  -1 for another id. */
+VLX_API int32_t vlxd_hwfilt(vlx_t* in, vlx_t* out, int32_t id, vlx_t* hist);
+VLX_API int32_t vlxfd_hwfilt(vlxf_t* in, vlxf_t* out, int32_t id, vlxf_t* hist);
+/* vlxd_hwfilt in place, from silence, with no history kept. */
+VLX_API int32_t vlxi_hwfilt(vlx_t* v, int32_t id);
+VLX_API int32_t vlxfi_hwfilt(vlxf_t* v, int32_t id);
+/* Resamples by ratio (input samples per output, >= 0) with a polyphase table coef (T in
+ * data[0], T * P + 1 entries); method 0 nearest lower phase (real only), 1 interpolated.
+ * out->points preset to the most outputs wanted, set to those made; out->delta = in->delta * ratio;
+ * hist: T + 2 points (window, mu, T + position reached).  coef under 2 points copies in. */
+VLX_API int32_t vlxd_rsmp(vlx_t* in, vlx_t* out, int32_t method, vlx_t* coef, double ratio, vlx_t* hist);
+VLX_API int32_t vlxfd_rsmp(vlxf_t* in, vlxf_t* out, int32_t method, vlxf_t* coef, float ratio, vlxf_t* hist);
+/* vlxd_rsmp with built-in table design 0 to 4 (vlxc_rsmp) made and destroyed in the call; after
+ * a failed run the table is not released. */
+VLX_API int32_t vlxd_rsmp2(vlx_t* in, vlx_t* out, int32_t method, int32_t design, double ratio, vlx_t* hist);
+VLX_API int32_t vlxfd_rsmp2(vlxf_t* in, vlxf_t* out, int32_t method, int32_t design, float ratio, vlxf_t* hist);
+
+/* ======================================================================== */
+/* Streaming and measurement                                                */
+/* ======================================================================== */
+/* The streaming resampler splits a rate ratio (input samples per output
+ * sample) into 2^octaves, done by decimate-by-2 stages (or one interpolate-
+ * by-2 stage), and a remainder near 1 done by a polyphase stage.  The
+ * coefficient object describes a ratio and may be shared by any number of
+ * streams; each stream keeps its filter memory in its own state object.
+ * Order of calls: coef_init, coef_alloc, coef_setup; per stream state_init,
+ * state_alloc, state_reset; vlxh_rsmp per block; state_destroy, coef_destroy. */
+
+/* Coefficient object (float twin: vlxf_t members and a float ratio). */
+typedef struct vlxh_rsmp_coef_t {
+    vlx_t    half_filter; /* half of the octave and last-decimation filter */
+    int32_t  half_odd;    /* odd flag of half_filter (1) */
+    vlx_t    pre_filter;  /* half of the filter ahead of the polyphase stage */
+    int32_t  pre_odd;     /* odd flag of pre_filter (1) */
+    vlx_t    table;       /* polyphase table, 13 taps by 1024 phases */
+    int32_t  method;      /* resampler method (1: linear between phases) */
+    double   ratio;       /* remainder ratio after the power of 2 */
+    int32_t  octaves;     /* decimate-by-2 stages; -1: one interpolate-by-2 stage */
+    int32_t  forced;      /* non-zero: run the polyphase stage even at ratio 1 */
+    int32_t  skip_mid;    /* start-up samples dropped behind the octave stages */
+    int32_t  skip_out;    /* start-up samples dropped at the end */
+} vlxh_rsmp_coef_t;
+
+typedef struct vlxfh_rsmp_coef_t {
+    vlxf_t   half_filter;
+    int32_t  half_odd;
+    vlxf_t   pre_filter;
+    int32_t  pre_odd;
+    vlxf_t   table;
+    int32_t  method;
+    float    ratio;
+    int32_t  octaves;
+    int32_t  forced;
+    int32_t  skip_mid;
+    int32_t  skip_out;
+} vlxfh_rsmp_coef_t;
+
+/* State object of one stream (float twin: vlxf_t members). */
+typedef struct vlxh_rsmp_state_t {
+    int32_t  stages;      /* number of octave-stage histories */
+    vlx_t*   stage_hist;  /* one history per octave stage (standard heap) */
+    int32_t  reserved;    /* zero */
+    int32_t  skip_mid;    /* start-up samples still to drop behind the octave stages */
+    vlx_t    pre_hist;    /* history of the pre-filter */
+    vlx_t    rsmp_hist;   /* window, position and time of the polyphase stage */
+    vlx_t    post_hist;   /* history of the last decimation */
+    vlx_t    spare;       /* never written */
+    int32_t  skip_out;    /* start-up samples still to drop at the end */
+} vlxh_rsmp_state_t;
+
+typedef struct vlxfh_rsmp_state_t {
+    int32_t  stages;
+    vlxf_t*  stage_hist;
+    int32_t  reserved;
+    int32_t  skip_mid;
+    vlxf_t   pre_hist;
+    vlxf_t   rsmp_hist;
+    vlxf_t   post_hist;
+    vlxf_t   spare;
+    int32_t  skip_out;
+} vlxfh_rsmp_state_t;
+
+/* Inits the three vectors and zeroes the other fields.  NULL coef: 0. */
+VLX_API int32_t vlxh_rsmp_coef_init(vlxh_rsmp_coef_t* coef);
+VLX_API int32_t vlxfh_rsmp_coef_init(vlxfh_rsmp_coef_t* coef);
+/* Fills the filters and the polyphase table; kind must be 0 (else -1). */
+VLX_API int32_t vlxh_rsmp_coef_alloc(vlxh_rsmp_coef_t* coef, int32_t kind);
+VLX_API int32_t vlxfh_rsmp_coef_alloc(vlxfh_rsmp_coef_t* coef, int32_t kind);
+/* Configures a ratio in input samples per output sample (0 or below: 1);
+ * forced non-zero runs the polyphase stage even at 1.  reserved must be 0.
+ * An infinite ratio is refused with -1, nothing stored. */
+VLX_API int32_t vlxh_rsmp_coef_setup(vlxh_rsmp_coef_t* coef, double ratio, int32_t forced, int32_t reserved);
+VLX_API int32_t vlxfh_rsmp_coef_setup(vlxfh_rsmp_coef_t* coef, float ratio, int32_t forced, int32_t reserved);
+/* Destroys the three vectors and zeroes the other fields.  NULL coef: 0. */
+VLX_API int32_t vlxh_rsmp_coef_destroy(vlxh_rsmp_coef_t* coef);
+VLX_API int32_t vlxfh_rsmp_coef_destroy(vlxfh_rsmp_coef_t* coef);
+/* Zeroes a state object and inits its vectors.  NULL state: 0. */
+VLX_API int32_t vlxh_rsmp_state_init(vlxh_rsmp_state_t* state);
+VLX_API int32_t vlxfh_rsmp_state_init(vlxfh_rsmp_state_t* state);
+/* Sizes the histories for coef and a real (is_complex 0) or complex stream,
+ * keeping samples already held.  NULL state: 0. */
+VLX_API int32_t vlxh_rsmp_state_alloc(vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state, int32_t is_complex);
+VLX_API int32_t vlxfh_rsmp_state_alloc(vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state, int32_t is_complex);
+/* Clears the histories and arms the start-up discards of coef.  NULL state: 0. */
+VLX_API int32_t vlxh_rsmp_state_reset(vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state);
+VLX_API int32_t vlxfh_rsmp_state_reset(vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state);
+/* Releases the histories and zeroes the counts.  NULL state: 0. */
+VLX_API int32_t vlxh_rsmp_state_destroy(vlxh_rsmp_state_t* state);
+VLX_API int32_t vlxfh_rsmp_state_destroy(vlxfh_rsmp_state_t* state);
+/* *result = input points needed for out_points outputs; settled non-zero adds
+ * the start-up.  NULL coef: -1; NULL result: 0, nothing written. */
+VLX_API int32_t vlxh_rsmp_get_in_pts(int32_t* result, vlxh_rsmp_coef_t* coef, int32_t out_points, int32_t settled);
+VLX_API int32_t vlxfh_rsmp_get_in_pts(int32_t* result, vlxfh_rsmp_coef_t* coef, int32_t out_points, int32_t settled);
+/* *result = outputs from in_points inputs: the largest count possible, or with
+ * at_least (and settled 0) a count certain to be reached; settled takes the
+ * start-up away.  NULL coef: -1; NULL result: 0, nothing written. */
+VLX_API int32_t vlxh_rsmp_get_out_pts(int32_t* result, vlxh_rsmp_coef_t* coef, int32_t in_points, int32_t settled, int32_t at_least);
+VLX_API int32_t vlxfh_rsmp_get_out_pts(int32_t* result, vlxfh_rsmp_coef_t* coef, int32_t in_points, int32_t settled, int32_t at_least);
+/* *result = group delay of the cascade in input points, or in output points
+ * when in_output_units is non-zero.  No NULL checks. */
+VLX_API int32_t vlxh_rsmp_get_delay_pts(double* result, vlxh_rsmp_coef_t* coef, int32_t in_output_units);
+VLX_API int32_t vlxfh_rsmp_get_delay_pts(float* result, vlxfh_rsmp_coef_t* coef, int32_t in_output_units);
+/* *result = length of the start-up discards in input points, or in output
+ * points when in_output_units is non-zero.  NULL coef: -1; NULL result: 0. */
+VLX_API int32_t vlxh_rsmp_get_settle_pts(double* result, vlxh_rsmp_coef_t* coef, int32_t in_output_units);
+VLX_API int32_t vlxfh_rsmp_get_settle_pts(float* result, vlxfh_rsmp_coef_t* coef, int32_t in_output_units);
+/* Pushes one block of the stream through the cascade.  Preset out->points to
+ * the most points wanted; on return it holds the points delivered (delta:
+ * in's times the ratio).  work (scratch) and state may be NULL (a temporary,
+ * no history kept); in and work may share storage with out, work being a
+ * vector of its own. */
+VLX_API int32_t vlxh_rsmp(vlx_t* in, vlx_t* out, vlx_t* work, vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state);
+VLX_API int32_t vlxfh_rsmp(vlxf_t* in, vlxf_t* out, vlxf_t* work, vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state);
+
+/* Averaging modes of vlxh_avg (low four bits of mode; 7 to 15 do nothing). */
+#define VLX_AVG_LAST      0   /* acc = record */
+#define VLX_AVG_LINEAR    1   /* acc = (record - acc) * w + acc */
+#define VLX_AVG_MAX       2   /* maximum hold */
+#define VLX_AVG_MIN       3   /* minimum hold */
+#define VLX_AVG_HARMONIC  4   /* linear average of reciprocals */
+#define VLX_AVG_GEOMETRIC 5   /* linear average of logarithms */
+#define VLX_AVG_SAMPLE    6   /* take the sweep where count mod period is 1 */
+/* Flags of vlxh_avg, or'ed into mode; the conversions run in this order. */
+#define VLX_AVG_LIMITED   16  /* the weight stops falling at 1/limit */
+#define VLX_AVG_POWER     32  /* record to squared magnitudes first */
+#define VLX_AVG_MAG       64  /* record to magnitudes */
+#define VLX_AVG_LOG       128 /* record to natural logarithms */
+
+/* Folds sweep number count (1 for the first, which always starts acc) of in
+ * into acc.  Weight w: weight if >= 0, else 1/count (with VLX_AVG_LIMITED at
+ * most 1/limit).  work holds conversions (NULL: a temporary).  Every step
+ * runs; -1 if any failed. */
+VLX_API int32_t vlxh_avg(vlx_t* in, vlx_t* acc, vlx_t* work, int32_t mode, int32_t count, int32_t period, double weight, double limit);
+VLX_API int32_t vlxfh_avg(vlxf_t* in, vlxf_t* acc, vlxf_t* work, int32_t mode, int32_t count, int32_t period, float weight, float limit);
+/* out[k] = mean over j < lags_pts of conj(ref[j]) * sig[j + k], for each of
+ * the sig->points - lags_pts + 1 lags, by one power-of-2 transform length;
+ * halved when halve is non-zero.  work: scratch (NULL: a temporary).
+ * 0 < lags_pts <= ref->points, sig->points required, else -1; a real ref
+ * with a complex sig also gives -1 (the transforms follow ref's type). */
+VLX_API int32_t vlxh_corr(vlx_t* ref, vlx_t* sig, vlx_t* out, vlx_t* work, int32_t lags_pts, int32_t halve);
+VLX_API int32_t vlxfh_corr(vlxf_t* ref, vlxf_t* sig, vlxf_t* out, vlxf_t* work, int32_t lags_pts, int32_t halve);
+/* vlxh_corr with halve 0. */
+VLX_API int32_t vlxb_corr(vlx_t* ref, vlx_t* sig, vlx_t* out, vlx_t* work, int32_t lags_pts);
+VLX_API int32_t vlxfb_corr(vlxf_t* ref, vlxf_t* sig, vlxf_t* out, vlxf_t* work, int32_t lags_pts);
+
+/* Flags of the spectrum pipeline. */
+#define VLX_SPEC_INVERSE      1   /* spectrum to time */
+#define VLX_SPEC_TWO_SIDED    2   /* complex transform also for real data, centred, no factor 2 */
+#define VLX_SPEC_SUM          4   /* plain sum instead of amplitude scaling */
+#define VLX_SPEC_NO_WINDOW    8   /* no window; only the rotation */
+#define VLX_SPEC_CENTRED      16  /* time origin in the middle of the record even for window 0 */
+#define VLX_SPEC_TWO_SIDED_IN 32  /* inverse: input is a centred two-sided spectrum, factor 0.5 kept */
+#define VLX_SPEC_ODD          64  /* inverse of a one-sided spectrum of odd length (vlxh_dft only) */
+#define VLX_SPEC_RAW          128 /* the transform alone */
+
+/* Spectrum of a record of any length, window id 0 to 31 (0: uniform), scaled
+ * so that a sine's peak reads its amplitude; one-sided (n/2 + 1 points) for a
+ * real record.  VLX_SPEC_INVERSE goes back.  out->delta: the transform's. */
+VLX_API int32_t vlxh_dft(vlx_t* in, vlx_t* out, int32_t window, int32_t flags);
+VLX_API int32_t vlxfh_dft(vlxf_t* in, vlxf_t* out, int32_t window, int32_t flags);
+/* As vlxh_dft on a power-of-2 transform length: the smallest power of 2 at
+ * least nfft (< 1: in->points), of which the first fraction (0 < f <= 1, else
+ * 1) is record taken from in, windowed, and zero-padded. */
+VLX_API int32_t vlxh_fft(vlx_t* in, vlx_t* out, int32_t nfft, double fraction, int32_t window, int32_t flags);
+VLX_API int32_t vlxfh_fft(vlxf_t* in, vlxf_t* out, int32_t nfft, float fraction, int32_t window, int32_t flags);
 
 /* ======================================================================== */
 /* Element-wise: two-operand operations                                     */
@@ -693,288 +974,6 @@ VLX_API int32_t vlxfi_phase(vlxf_t* v);
  * radians), a real vector turning complex. */
 VLX_API int32_t vlxi_rtop(vlx_t* v);
 VLX_API int32_t vlxfi_rtop(vlxf_t* v);
-
-/* ======================================================================== */
-/* Generators and resampling tables                                         */
-/* ======================================================================== */
-/* The generators fill a vector whose points, delta and complex flag the caller
- * has set; sample k stands at x = k*delta, so frequencies are in cycles per
- * unit of x.  points and delta are left as they are. */
-
-/* v[k] = offset + k*delta*slope, by adding delta*slope sample after sample;
- * a complex v gets zero imaginary parts.  0, or -1 if storage fails. */
-VLX_API int32_t vlxc_line(vlx_t* v, double slope, double offset);
-VLX_API int32_t vlxfc_line(vlxf_t* v, float slope, float offset);
-/* v[k] = cos(2*pi*freq*k*delta + phase), phase in radians, by a rotation
- * restarted exactly every 256 samples; a complex v gets zero imaginary parts. */
-VLX_API int32_t vlxc_cos(vlx_t* v, double freq, double phase);
-VLX_API int32_t vlxfc_cos(vlxf_t* v, float freq, float phase);
-/* v[k] = exp(j*(2*pi*freq*k*delta + phase)) in a complex v; a real v gets
- * the cosine (vlxc_cos).  0, or -1 if storage fails. */
-VLX_API int32_t vlxc_cexp(vlx_t* v, double freq, double phase);
-VLX_API int32_t vlxfc_cexp(vlxf_t* v, float freq, float phase);
-
-/* Fills v (points and complex preset) with noise of a kind: 0 uniform in
- * [-1, 1) (complex: in the unit disc), 1 Gaussian of variance 1 (complex:
- * each part), 2 exponential of mean 1, 3 Laplace (2 and 3 real only).  Draws
- * on the C library's rand(), seeded once per family from the machine; each
- * rand() value counts by its low 15 bits (rand() & 0x7FFF), so a uniform
- * draw takes 4 calls (60 bits; float: 2 calls, 30 bits).  Holds lock 1 for
- * the whole fill.  -1 for another kind, kinds 2 and 3 on a complex v (after
- * sizing it), or if storage fails. */
-VLX_API int32_t vlxc_rand(vlx_t* v, int32_t kind);
-VLX_API int32_t vlxfc_rand(vlxf_t* v, int32_t kind);
-/* Random permutation of the samples in place (complex pairs stay together),
- * by a Fisher-Yates walk on 31-bit draws of the same generator.  Returns 0. */
-VLX_API int32_t vlxi_shuffle(vlx_t* v);
-VLX_API int32_t vlxfi_shuffle(vlxf_t* v);
-
-/* A resampling table is a real vector of n = T*P + 2 points (n even): T, the
- * taps per phase, in data[0], then T*P + 1 samples of one low-pass kernel
- * over P phases, symmetric about the middle entry data[1 + (n-2)/2].  The
- * caller presets n (and so P); a design is a real vector of T and shape
- * coefficients.  n below 2 or a design of fewer than 2 scalars: 0, v zero
- * with data[0] = T where both have a first scalar. */
-
-/* Expands built-in design 0 to 4 (T = 8, 13, 8, 10, 13) into v, a kernel
- * that peaks in the middle.  0; -1 for another design, an odd n or if
- * storage fails. */
-VLX_API int32_t vlxc_rsmp(vlx_t* v, int32_t design);
-VLX_API int32_t vlxfc_rsmp(vlxf_t* v, int32_t design);
-/* Expands design d = (T, a0, a1, ...) as the cosine sum a0 + a1*cos(theta) +
- * a2*cos(2*theta) + ..., theta from 0 at the middle to pi at the ends.  -1
- * for an odd n, a complex d or if storage fails.  A complex v gets the
- * table as real parts. */
-VLX_API int32_t vlxc_rsmp_cos(vlx_t* v, const vlx_t* d);
-VLX_API int32_t vlxfc_rsmp_cos(vlxf_t* v, const vlxf_t* d);
-/* As vlxc_rsmp_cos, with the shape a polynomial a0 + a1*c + a2*c^2 + ... in
- * c = cos(theta). */
-VLX_API int32_t vlxc_rsmp_pcos(vlx_t* v, const vlx_t* d);
-VLX_API int32_t vlxfc_rsmp_pcos(vlxf_t* v, const vlxf_t* d);
-
-/* ======================================================================== */
-/* Filters: staging and decimation                                          */
-/* ======================================================================== */
-/* A filter's history `hist` is an optional vector owned by the caller that
- * carries the stream from block to block; NULL or empty starts from silence.
- * Output has as many points as input, except in rate changers. */
-
-/* Staging flags of vlx_stage_io. */
-#define VLX_STAGE_ALIAS       1 /* route a destination sharing the source's data through a temporary */
-#define VLX_STAGE_KEEP_POINTS 2 /* the caller has set out->points already */
-
-/* Keeps every factor-th sample (factor < 1 taken as 1) after the skip count carried in
- * hist->data[0] (hist may be NULL), so blocks fed in turn give what one long call gives.
- * out may be in; out->delta = factor * in->delta. */
-VLX_API int32_t vlxd_deci(vlx_t* in, vlx_t* out, int32_t factor, vlx_t* hist);
-VLX_API int32_t vlxfd_deci(vlxf_t* in, vlxf_t* out, int32_t factor, vlxf_t* hist);
-
-/* ======================================================================== */
-/* Filters: FIR, symmetric FIR, hwfilt, resampler                           */
-/* ======================================================================== */
-/* Filters keep their delay and give as many points as the input; out may be
- * in.  hist (may be NULL) carries the last inputs so that blocks fed in turn
- * continue one stream.  Each returns 0, or -1 on failure. */
-
-/* FIR filter: out[k] = sum of filter[i] * in[k - i] over the filter->points taps, real or complex
- * source and taps; hist holds the last filter->points - 1 inputs.  Long real filters run a fast
- * convolution with the filter's spectrum cached.  An empty filter copies in. */
-VLX_API int32_t vlxd_fir(vlx_t* in, vlx_t* out, vlx_t* filter, vlx_t* hist);
-VLX_API int32_t vlxfd_fir(vlxf_t* in, vlxf_t* out, vlxf_t* filter, vlxf_t* hist);
-/* Linear-phase FIR from the first half of its taps: 2m taps, or 2m - 1 with odd non-zero
- * (filter's last tap the centre); anti non-zero negates the mirrored half.  hist: N - 1 inputs. */
-VLX_API int32_t vlxd_sfir(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd, int32_t anti, vlx_t* hist);
-VLX_API int32_t vlxfd_sfir(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, vlxf_t* hist);
-/* vlxd_sfir then vlxd_deci by factor (below 1 taken as 1); hist holds the N - 1 inputs and, at
- * point N - 1, the skip count.  out->delta = factor * in->delta. */
-VLX_API int32_t vlxd_sfir_deci(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd, int32_t anti, int32_t factor, vlx_t* hist);
-VLX_API int32_t vlxfd_sfir_deci(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, int32_t factor, vlxf_t* hist);
-/* Fixed low-pass of four power-of-two sections (id 0 only; zeros at 1/3 and 1/2 of the rate,
- * gain 1 at 0); hist: 12 points of section state.  -1 for another id. */
-VLX_API int32_t vlxd_hwfilt(vlx_t* in, vlx_t* out, int32_t id, vlx_t* hist);
-VLX_API int32_t vlxfd_hwfilt(vlxf_t* in, vlxf_t* out, int32_t id, vlxf_t* hist);
-/* vlxd_hwfilt in place, from silence, with no history kept. */
-VLX_API int32_t vlxi_hwfilt(vlx_t* v, int32_t id);
-VLX_API int32_t vlxfi_hwfilt(vlxf_t* v, int32_t id);
-/* Resamples by ratio (input samples per output, >= 0) with a polyphase table coef (T in
- * data[0], T * P + 1 entries); method 0 nearest lower phase (real only), 1 interpolated.
- * out->points preset to the most outputs wanted, set to those made; out->delta = in->delta * ratio;
- * hist: T + 2 points (window, mu, T + position reached).  coef under 2 points copies in. */
-VLX_API int32_t vlxd_rsmp(vlx_t* in, vlx_t* out, int32_t method, vlx_t* coef, double ratio, vlx_t* hist);
-VLX_API int32_t vlxfd_rsmp(vlxf_t* in, vlxf_t* out, int32_t method, vlxf_t* coef, float ratio, vlxf_t* hist);
-/* vlxd_rsmp with built-in table design 0 to 4 (vlxc_rsmp) made and destroyed in the call; after
- * a failed run the table is not released. */
-VLX_API int32_t vlxd_rsmp2(vlx_t* in, vlx_t* out, int32_t method, int32_t design, double ratio, vlx_t* hist);
-VLX_API int32_t vlxfd_rsmp2(vlxf_t* in, vlxf_t* out, int32_t method, int32_t design, float ratio, vlxf_t* hist);
-
-/* ======================================================================== */
-/* Streaming and measurement                                                */
-/* ======================================================================== */
-/* The streaming resampler splits a rate ratio (input samples per output
- * sample) into 2^octaves, done by decimate-by-2 stages (or one interpolate-
- * by-2 stage), and a remainder near 1 done by a polyphase stage.  The
- * coefficient object describes a ratio and may be shared by any number of
- * streams; each stream keeps its filter memory in its own state object.
- * Order of calls: coef_init, coef_alloc, coef_setup; per stream state_init,
- * state_alloc, state_reset; vlxh_rsmp per block; state_destroy, coef_destroy. */
-
-/* Coefficient object (float twin: vlxf_t members and a float ratio). */
-typedef struct vlxh_rsmp_coef_t {
-    vlx_t    half_filter; /* half of the octave and last-decimation filter */
-    int32_t  half_odd;    /* odd flag of half_filter (1) */
-    vlx_t    pre_filter;  /* half of the filter ahead of the polyphase stage */
-    int32_t  pre_odd;     /* odd flag of pre_filter (1) */
-    vlx_t    table;       /* polyphase table, 13 taps by 1024 phases */
-    int32_t  method;      /* resampler method (1: linear between phases) */
-    double   ratio;       /* remainder ratio after the power of 2 */
-    int32_t  octaves;     /* decimate-by-2 stages; -1: one interpolate-by-2 stage */
-    int32_t  forced;      /* non-zero: run the polyphase stage even at ratio 1 */
-    int32_t  skip_mid;    /* start-up samples dropped behind the octave stages */
-    int32_t  skip_out;    /* start-up samples dropped at the end */
-} vlxh_rsmp_coef_t;
-
-typedef struct vlxfh_rsmp_coef_t {
-    vlxf_t   half_filter;
-    int32_t  half_odd;
-    vlxf_t   pre_filter;
-    int32_t  pre_odd;
-    vlxf_t   table;
-    int32_t  method;
-    float    ratio;
-    int32_t  octaves;
-    int32_t  forced;
-    int32_t  skip_mid;
-    int32_t  skip_out;
-} vlxfh_rsmp_coef_t;
-
-/* State object of one stream (float twin: vlxf_t members). */
-typedef struct vlxh_rsmp_state_t {
-    int32_t  stages;      /* number of octave-stage histories */
-    vlx_t*   stage_hist;  /* one history per octave stage (standard heap) */
-    int32_t  reserved;    /* zero */
-    int32_t  skip_mid;    /* start-up samples still to drop behind the octave stages */
-    vlx_t    pre_hist;    /* history of the pre-filter */
-    vlx_t    rsmp_hist;   /* window, position and time of the polyphase stage */
-    vlx_t    post_hist;   /* history of the last decimation */
-    vlx_t    spare;       /* never written */
-    int32_t  skip_out;    /* start-up samples still to drop at the end */
-} vlxh_rsmp_state_t;
-
-typedef struct vlxfh_rsmp_state_t {
-    int32_t  stages;
-    vlxf_t*  stage_hist;
-    int32_t  reserved;
-    int32_t  skip_mid;
-    vlxf_t   pre_hist;
-    vlxf_t   rsmp_hist;
-    vlxf_t   post_hist;
-    vlxf_t   spare;
-    int32_t  skip_out;
-} vlxfh_rsmp_state_t;
-
-/* Inits the three vectors and zeroes the other fields.  NULL coef: 0. */
-VLX_API int32_t vlxh_rsmp_coef_init(vlxh_rsmp_coef_t* coef);
-VLX_API int32_t vlxfh_rsmp_coef_init(vlxfh_rsmp_coef_t* coef);
-/* Fills the filters and the polyphase table; kind must be 0 (else -1). */
-VLX_API int32_t vlxh_rsmp_coef_alloc(vlxh_rsmp_coef_t* coef, int32_t kind);
-VLX_API int32_t vlxfh_rsmp_coef_alloc(vlxfh_rsmp_coef_t* coef, int32_t kind);
-/* Configures a ratio in input samples per output sample (0 or below: 1);
- * forced non-zero runs the polyphase stage even at 1.  reserved must be 0.
- * An infinite ratio is refused with -1, nothing stored. */
-VLX_API int32_t vlxh_rsmp_coef_setup(vlxh_rsmp_coef_t* coef, double ratio, int32_t forced, int32_t reserved);
-VLX_API int32_t vlxfh_rsmp_coef_setup(vlxfh_rsmp_coef_t* coef, float ratio, int32_t forced, int32_t reserved);
-/* Destroys the three vectors and zeroes the other fields.  NULL coef: 0. */
-VLX_API int32_t vlxh_rsmp_coef_destroy(vlxh_rsmp_coef_t* coef);
-VLX_API int32_t vlxfh_rsmp_coef_destroy(vlxfh_rsmp_coef_t* coef);
-/* Zeroes a state object and inits its vectors.  NULL state: 0. */
-VLX_API int32_t vlxh_rsmp_state_init(vlxh_rsmp_state_t* state);
-VLX_API int32_t vlxfh_rsmp_state_init(vlxfh_rsmp_state_t* state);
-/* Sizes the histories for coef and a real (is_complex 0) or complex stream,
- * keeping samples already held.  NULL state: 0. */
-VLX_API int32_t vlxh_rsmp_state_alloc(vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state, int32_t is_complex);
-VLX_API int32_t vlxfh_rsmp_state_alloc(vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state, int32_t is_complex);
-/* Clears the histories and arms the start-up discards of coef.  NULL state: 0. */
-VLX_API int32_t vlxh_rsmp_state_reset(vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state);
-VLX_API int32_t vlxfh_rsmp_state_reset(vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state);
-/* Releases the histories and zeroes the counts.  NULL state: 0. */
-VLX_API int32_t vlxh_rsmp_state_destroy(vlxh_rsmp_state_t* state);
-VLX_API int32_t vlxfh_rsmp_state_destroy(vlxfh_rsmp_state_t* state);
-/* *result = input points needed for out_points outputs; settled non-zero adds
- * the start-up.  NULL coef: -1; NULL result: 0, nothing written. */
-VLX_API int32_t vlxh_rsmp_get_in_pts(int32_t* result, vlxh_rsmp_coef_t* coef, int32_t out_points, int32_t settled);
-VLX_API int32_t vlxfh_rsmp_get_in_pts(int32_t* result, vlxfh_rsmp_coef_t* coef, int32_t out_points, int32_t settled);
-/* *result = outputs from in_points inputs: the largest count possible, or with
- * at_least (and settled 0) a count certain to be reached; settled takes the
- * start-up away.  NULL coef: -1; NULL result: 0, nothing written. */
-VLX_API int32_t vlxh_rsmp_get_out_pts(int32_t* result, vlxh_rsmp_coef_t* coef, int32_t in_points, int32_t settled, int32_t at_least);
-VLX_API int32_t vlxfh_rsmp_get_out_pts(int32_t* result, vlxfh_rsmp_coef_t* coef, int32_t in_points, int32_t settled, int32_t at_least);
-/* *result = group delay of the cascade in input points, or in output points
- * when in_output_units is non-zero.  No NULL checks. */
-VLX_API int32_t vlxh_rsmp_get_delay_pts(double* result, vlxh_rsmp_coef_t* coef, int32_t in_output_units);
-VLX_API int32_t vlxfh_rsmp_get_delay_pts(float* result, vlxfh_rsmp_coef_t* coef, int32_t in_output_units);
-/* *result = length of the start-up discards in input points, or in output
- * points when in_output_units is non-zero.  NULL coef: -1; NULL result: 0. */
-VLX_API int32_t vlxh_rsmp_get_settle_pts(double* result, vlxh_rsmp_coef_t* coef, int32_t in_output_units);
-VLX_API int32_t vlxfh_rsmp_get_settle_pts(float* result, vlxfh_rsmp_coef_t* coef, int32_t in_output_units);
-/* Pushes one block of the stream through the cascade.  Preset out->points to
- * the most points wanted; on return it holds the points delivered (delta:
- * in's times the ratio).  work (scratch) and state may be NULL (a temporary,
- * no history kept); in and work may share storage with out, work being a
- * vector of its own. */
-VLX_API int32_t vlxh_rsmp(vlx_t* in, vlx_t* out, vlx_t* work, vlxh_rsmp_coef_t* coef, vlxh_rsmp_state_t* state);
-VLX_API int32_t vlxfh_rsmp(vlxf_t* in, vlxf_t* out, vlxf_t* work, vlxfh_rsmp_coef_t* coef, vlxfh_rsmp_state_t* state);
-
-/* Averaging modes of vlxh_avg (low four bits of mode; 7 to 15 do nothing). */
-#define VLX_AVG_LAST      0   /* acc = record */
-#define VLX_AVG_LINEAR    1   /* acc = (record - acc) * w + acc */
-#define VLX_AVG_MAX       2   /* maximum hold */
-#define VLX_AVG_MIN       3   /* minimum hold */
-#define VLX_AVG_HARMONIC  4   /* linear average of reciprocals */
-#define VLX_AVG_GEOMETRIC 5   /* linear average of logarithms */
-#define VLX_AVG_SAMPLE    6   /* take the sweep where count mod period is 1 */
-/* Flags of vlxh_avg, or'ed into mode; the conversions run in this order. */
-#define VLX_AVG_LIMITED   16  /* the weight stops falling at 1/limit */
-#define VLX_AVG_POWER     32  /* record to squared magnitudes first */
-#define VLX_AVG_MAG       64  /* record to magnitudes */
-#define VLX_AVG_LOG       128 /* record to natural logarithms */
-
-/* Folds sweep number count (1 for the first, which always starts acc) of in
- * into acc.  Weight w: weight if >= 0, else 1/count (with VLX_AVG_LIMITED at
- * most 1/limit).  work holds conversions (NULL: a temporary).  Every step
- * runs; -1 if any failed. */
-VLX_API int32_t vlxh_avg(vlx_t* in, vlx_t* acc, vlx_t* work, int32_t mode, int32_t count, int32_t period, double weight, double limit);
-VLX_API int32_t vlxfh_avg(vlxf_t* in, vlxf_t* acc, vlxf_t* work, int32_t mode, int32_t count, int32_t period, float weight, float limit);
-/* out[k] = mean over j < lags_pts of conj(ref[j]) * sig[j + k], for each of
- * the sig->points - lags_pts + 1 lags, by one power-of-2 transform length;
- * halved when halve is non-zero.  work: scratch (NULL: a temporary).
- * 0 < lags_pts <= ref->points, sig->points required, else -1; a real ref
- * with a complex sig also gives -1 (the transforms follow ref's type). */
-VLX_API int32_t vlxh_corr(vlx_t* ref, vlx_t* sig, vlx_t* out, vlx_t* work, int32_t lags_pts, int32_t halve);
-VLX_API int32_t vlxfh_corr(vlxf_t* ref, vlxf_t* sig, vlxf_t* out, vlxf_t* work, int32_t lags_pts, int32_t halve);
-/* vlxh_corr with halve 0. */
-VLX_API int32_t vlxb_corr(vlx_t* ref, vlx_t* sig, vlx_t* out, vlx_t* work, int32_t lags_pts);
-VLX_API int32_t vlxfb_corr(vlxf_t* ref, vlxf_t* sig, vlxf_t* out, vlxf_t* work, int32_t lags_pts);
-
-/* Flags of the spectrum pipeline. */
-#define VLX_SPEC_INVERSE      1   /* spectrum to time */
-#define VLX_SPEC_TWO_SIDED    2   /* complex transform also for real data, centred, no factor 2 */
-#define VLX_SPEC_SUM          4   /* plain sum instead of amplitude scaling */
-#define VLX_SPEC_NO_WINDOW    8   /* no window; only the rotation */
-#define VLX_SPEC_CENTRED      16  /* time origin in the middle of the record even for window 0 */
-#define VLX_SPEC_TWO_SIDED_IN 32  /* inverse: input is a centred two-sided spectrum, factor 0.5 kept */
-#define VLX_SPEC_ODD          64  /* inverse of a one-sided spectrum of odd length (vlxh_dft only) */
-#define VLX_SPEC_RAW          128 /* the transform alone */
-
-/* Spectrum of a record of any length, window id 0 to 31 (0: uniform), scaled
- * so that a sine's peak reads its amplitude; one-sided (n/2 + 1 points) for a
- * real record.  VLX_SPEC_INVERSE goes back.  out->delta: the transform's. */
-VLX_API int32_t vlxh_dft(vlx_t* in, vlx_t* out, int32_t window, int32_t flags);
-VLX_API int32_t vlxfh_dft(vlxf_t* in, vlxf_t* out, int32_t window, int32_t flags);
-/* As vlxh_dft on a power-of-2 transform length: the smallest power of 2 at
- * least nfft (< 1: in->points), of which the first fraction (0 < f <= 1, else
- * 1) is record taken from in, windowed, and zero-padded. */
-VLX_API int32_t vlxh_fft(vlx_t* in, vlx_t* out, int32_t nfft, double fraction, int32_t window, int32_t flags);
-VLX_API int32_t vlxfh_fft(vlxf_t* in, vlxf_t* out, int32_t nfft, float fraction, int32_t window, int32_t flags);
 
 /* ======================================================================== */
 /* Statistics: moments, histogram, sort and median                          */

@@ -3,7 +3,7 @@
 // steers it, the table of committed descriptors, and the thread controls.
 // Without the modules everything here is inert and transforms stay native.
 #include "core/frame.hpp"
-#include "core/modules.hpp"
+#include "core/platform.hpp"
 #include "transforms/transforms.hpp"
 
 #include <algorithm>

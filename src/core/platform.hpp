@@ -1,11 +1,14 @@
-// What the platform decides for number text and standard streams, kept in one
-// place so that the file layer reads the same everywhere: a C locale object
-// for conversions that must not follow the caller's locale, and the switch of
-// a standard stream to binary mode.
+// What the platform decides, kept in one place so that the rest of the
+// library reads the same everywhere: a C locale object for number text that
+// must not follow the caller's locale, the switch of a standard stream to
+// binary mode, and the loading of the optional vendor modules.
 #pragma once
 
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
+
+#include <dlfcn.h>
 
 #if defined(_WIN32)
 #include <fcntl.h>
@@ -81,3 +84,37 @@ inline void set_binary_mode(std::FILE* stream) {
 }
 
 }  // namespace vlx::platform
+
+// The optional vendor transform binding: module names, loading, lookup and
+// the environment.
+namespace vlx::modules {
+
+// Plain names, so that the loader's search path (LD_LIBRARY_PATH, the cache,
+// the default folders) decides where they come from.
+inline constexpr const char* dfti_module = "libmkl_rt.so.2";
+inline constexpr const char* openmp_module = "libiomp5.so";
+
+// A handle, or null if the module is absent or cannot be loaded.  The library
+// never unloads what it loaded.
+inline void* load(const char* name) { return dlopen(name, RTLD_NOW | RTLD_LOCAL); }
+
+// A function of a loaded module, or null if the module lacks it.
+template <class Fn>
+inline Fn function(void* module, const char* name) {
+    void* address = dlsym(module, name);
+    Fn fn;
+    static_assert(sizeof(fn) == sizeof(address));
+    std::memcpy(&fn, &address, sizeof(fn));
+    return fn;
+}
+
+// A variable counts as set only with a value of at least one character: an
+// empty one is treated as absent, a value of any length as present.
+inline bool env_is_set(const char* name) {
+    const char* value = std::getenv(name);
+    return value != nullptr && value[0] != '\0';
+}
+
+inline void env_set(const char* name, const char* value) { setenv(name, value, 1); }
+
+}  // namespace vlx::modules

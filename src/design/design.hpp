@@ -39,4 +39,11 @@ template <VlxVector V> int32_t rsmp_pcos(V* v, const V* d);
 // Expands built-in design 0 to 4 (vlxc_rsmp).
 template <VlxVector V> int32_t rsmp(V* v, int32_t design);
 
+// ---- FIR design ----
+
+// Ideal impulse response of filter type 0 to 10 into v->points taps (vlxc_fir).
+template <VlxVector V> int32_t fir_design(V* v, int32_t type, real_t<V> arg1, real_t<V> arg2);
+// Fixed half-filter coefficient set 100 to 104 (vlxc_fir2).
+template <VlxVector V> int32_t fir_design_set(V* v, int32_t set);
+
 }  // namespace vlx

@@ -1,5 +1,7 @@
 // FIR design: the ideal impulse responses of the standard filter types, and
 // five fixed half-filter coefficient sets.
+#include "design/design.hpp"
+
 #include "core/precise_math.hpp"
 #include "elementwise/elementwise.hpp"
 #include "stats/stats.hpp"

@@ -17,10 +17,6 @@
 
 namespace vlx {
 
-// The fixed half filters of the FIR design (vlxc_fir2), defined with it.
-template <VlxVector V>
-int32_t fir_design_set(V* v, int32_t set);
-
 namespace {
 
 // Remainder ratios at or above this use the shorter interpolation filter.

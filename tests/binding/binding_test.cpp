@@ -1,6 +1,5 @@
-// The vendor transform binding, one scenario and family per process (see
-// tests/CMakeLists.txt): modules absent, the stand-in DFT module with the
-// system's OpenMP runtime, refusals, a preset environment, the two families.
+// The vendor transform binding, one scenario and family per process (see tests/CMakeLists.txt): modules absent, the
+// stand-in DFT module with the system's OpenMP runtime, refusals, a preset environment, the two families.
 #include "../transforms/fft_reference.hpp"
 
 #include <dlfcn.h>
@@ -45,8 +44,8 @@ F module_fn(const char* name) {
     return m == nullptr ? nullptr : reinterpret_cast<F>(dlsym(m, name));
 }
 
-// The stand-in's calls since the last look: "c<precision>.<domain>.<dimension>/<length>"
-// create, "s<param>=<value>", "m" commit, "f"/"b" compute, "x" free.
+// The stand-in's calls since the last look: "c<precision>.<domain>.<dimension>/<length>" create, "s<param>=<value>",
+// "m" commit, "f"/"b" compute, "x" free.
 std::string calls() {
     static size_t seen = 0;
     const std::string all = module_fn<const char* (*)()>("standin_trace")();
@@ -55,14 +54,12 @@ std::string calls() {
     return fresh;
 }
 template <class V>
-std::string created() {
-    return std::string(1, 'c').append(std::to_string(api<V>::precision)).append(".");
-}
+std::string created() { return std::string(1, 'c').append(std::to_string(api<V>::precision)).append("."); }
 
 enum Kind { forward, inverse, real_fft, real_as_complex };
 
-// A transform through the library against the module's own DFT (fast) or the
-// native engine's recipe (n >= 4), bit for bit, with the layout and delta.
+// A transform through the library against the module's own DFT (fast) or the native engine's recipe (n >= 4), bit for
+// bit, with the layout and delta.
 template <class V>
 void expect_transform(Kind kind, int n, bool fast) {
     using T = real_of<V>;
@@ -85,9 +82,7 @@ void expect_transform(Kind kind, int n, bool fast) {
     EXPECT_TRUE(same_scalars(v.values(), want) && has_shape(v.get(), points, 1, 2.0 / n)) << kind << " " << n;
 }
 
-template <class V>
-class Binding : public ::testing::Test {};
-TYPED_TEST_SUITE(Binding, Families);
+VLX_TYPED_SUITE(Binding);
 
 TYPED_TEST(Binding, Absent) {
     SCENARIO("Absent");
@@ -109,17 +104,11 @@ TYPED_TEST(Binding, Absent) {
 TYPED_TEST(Binding, Present) {
     SCENARIO("Present");
     using A = api<TypeParam>;
-    EXPECT_EQ(got<uint32_t>(A::get), 0x3000u);
-    EXPECT_EQ(got(A::threads), 2);
+    EXPECT_TRUE((got<uint32_t>(A::get)) == 0x3000u && got(A::threads) == 2);
     const std::string c = created<TypeParam>();
     // Without KEEP each transform makes and frees its descriptor; forward scale 1/N.
-    const struct {
-        Kind kind;
-        int n;
-        std::string calls;
-    } cases[] = {{forward, 8, c + "32.1/8 s4=0.125 m f x "},
-                 {inverse, 8, c + "32.1/8 s4=0.125 m b x "},
-                 {real_fft, 16, c + "33.1/16 s4=0.0625 m f x "},
+    const struct { Kind kind; int n; std::string calls; } cases[] = {{forward, 8, c + "32.1/8 s4=0.125 m f x "},
+                 {inverse, 8, c + "32.1/8 s4=0.125 m b x "}, {real_fft, 16, c + "33.1/16 s4=0.0625 m f x "},
                  {real_fft, 1, c + "33.1/1 s4=1 m f x "},  // one real point comes back complex
                  {real_as_complex, 1, c + "32.1/1 s4=1 m f x "}};
     for (const auto& k : cases) {
@@ -135,8 +124,7 @@ TYPED_TEST(Binding, Present) {
     expect_transform<TypeParam>(forward, 16, true);
     EXPECT_EQ(A::release(), 0);
     const std::string procs = std::to_string(module_fn<int (*)()>("omp_get_num_procs")());
-    EXPECT_EQ(calls(), "x x " + c + "32.1/16 s4=0.0625 s26=" + procs + " m f x ");
-    EXPECT_EQ(A::set_threads(2), 0);
+    EXPECT_TRUE(calls() == ("x x " + c + "32.1/16 s4=0.0625 s26=" + procs + " m f x ") && A::set_threads(2) == 0);
     expect_transform<TypeParam>(forward, 16, true);
     A::set(0x2000);  // the next transform frees what was kept
     expect_transform<TypeParam>(forward, 16, true);
@@ -171,8 +159,7 @@ TYPED_TEST(Binding, Environment) {
     EXPECT_EQ(got<uint32_t>(A::get), 0x3000u);
     EXPECT_STREQ(std::getenv("MKL_DISABLE_FAST_MM"), "YES");
     EXPECT_STREQ(std::getenv("KMP_BLOCKTIME"), "7");
-    EXPECT_EQ(got(A::blocktime), 7);
-    EXPECT_EQ(A::set_blocktime(25) + got(A::blocktime), 25);
+    EXPECT_TRUE(got(A::blocktime) == 7 && (A::set_blocktime(25) + got(A::blocktime)) == 25);
 }
 
 TYPED_TEST(Binding, Families) {

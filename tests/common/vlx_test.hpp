@@ -1,12 +1,12 @@
-// Shared test support: the two families as GoogleTest types, overloads that
-// route a call to the twin of the vector's family, an owning vector wrapper,
-// and closeness checks in which a NaN never passes.
+// Shared test support: the two families as GoogleTest types, overloads that route a call to the twin of the vector's
+// family, an owning vector wrapper, and closeness checks in which a NaN never passes.
 #pragma once
 
 #include "libvlx.h"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
@@ -22,6 +22,12 @@ namespace vlxtest {
 
 using Families = ::testing::Types<vlx_t, vlxf_t>;
 
+// A typed test suite over both families: VLX_TYPED_SUITE(Name); then TYPED_TEST(Name, ...).
+#define VLX_TYPED_SUITE(name) \
+    template <class V>        \
+    class name : public ::testing::Test {}; \
+    TYPED_TEST_SUITE(name, ::vlxtest::Families)
+
 // The scalar type of a family: double for vlx_t, float for vlxf_t.
 template <class V>
 using real_of = std::remove_pointer_t<decltype(V::data)>;
@@ -29,8 +35,15 @@ using real_of = std::remove_pointer_t<decltype(V::data)>;
 template <class V>
 constexpr bool is_double = std::is_same_v<V, vlx_t>;
 
-// Defines `name(vector, args...)` for both families, forwarding to the
-// double export or its float twin by the type of the first argument.
+// The family's saturation bound, also the spacing a transform gives a vector of spacing 0.
+template <class V>
+constexpr real_of<V> bound_of() { return is_double<V> ? real_of<V>(1e100) : real_of<V>(1e15f); }
+
+template <class V>
+inline int32_t t_free_internal() { return is_double<V> ? vlx_free_internal() : vlxf_free_internal(); }
+
+// Defines `name(vector, args...)` for both families, forwarding to the double export or its float twin by the type of
+// the first argument.
 #define VLX_TEST_TWIN(name, dfn, ffn)                                                            \
     template <class... A>                                                                        \
     inline auto name(vlx_t* v, A&&... a) { return dfn(v, std::forward<A>(a)...); }              \
@@ -40,19 +53,13 @@ constexpr bool is_double = std::is_same_v<V, vlx_t>;
 // The usual prefixes: VLX_TWIN(i, neg) is t_neg over vlxi_neg and vlxfi_neg.
 #define VLX_TWIN(prefix, name) VLX_TEST_TWIN(t_##name, vlx##prefix##_##name, vlxf##prefix##_##name)
 
-VLX_TEST_TWIN(t_init, vlx_init, vlxf_init)
-VLX_TEST_TWIN(t_destroy, vlx_destroy, vlxf_destroy)
-VLX_TEST_TWIN(t_alloc, vlx_alloc, vlxf_alloc)
-VLX_TEST_TWIN(t_realloc, vlx_realloc, vlxf_realloc)
-VLX_TEST_TWIN(t_zero, vlxi_zero, vlxfi_zero)
-VLX_TEST_TWIN(t_rtoc, vlxi_rtoc, vlxfi_rtoc)
-VLX_TEST_TWIN(t_zpad, vlxi_zpad, vlxfi_zpad)
-VLX_TEST_TWIN(t_append, vlx_append, vlxf_append)
-VLX_TEST_TWIN(t_copy, vlx_copy, vlxf_copy)
-VLX_TEST_TWIN(t_copy_at_most, vlx_copy_at_most, vlxf_copy_at_most)
-VLX_TEST_TWIN(t_subvec, vlxu_subvec, vlxfu_subvec)
+VLX_TEST_TWIN(t_init, vlx_init, vlxf_init) VLX_TEST_TWIN(t_destroy, vlx_destroy, vlxf_destroy)
+VLX_TEST_TWIN(t_alloc, vlx_alloc, vlxf_alloc) VLX_TEST_TWIN(t_realloc, vlx_realloc, vlxf_realloc)
+VLX_TEST_TWIN(t_zero, vlxi_zero, vlxfi_zero) VLX_TEST_TWIN(t_rtoc, vlxi_rtoc, vlxfi_rtoc)
+VLX_TEST_TWIN(t_zpad, vlxi_zpad, vlxfi_zpad) VLX_TEST_TWIN(t_append, vlx_append, vlxf_append)
+VLX_TEST_TWIN(t_copy, vlx_copy, vlxf_copy) VLX_TEST_TWIN(t_copy_at_most, vlx_copy_at_most, vlxf_copy_at_most)
+VLX_TEST_TWIN(t_subvec, vlxu_subvec, vlxfu_subvec) VLX_TEST_TWIN(t_cmp, vlx_cmp, vlxf_cmp)
 VLX_TEST_TWIN(t_insert_subvec, vlx_insert_subvec, vlxf_insert_subvec)
-VLX_TEST_TWIN(t_cmp, vlx_cmp, vlxf_cmp)
 
 // An owning vector for tests: initialised on construction, destroyed on exit.
 template <class V>
@@ -99,9 +106,7 @@ std::vector<T> random_values(size_t n, uint32_t seed, double lo = -1.0, double h
 
 // Bit-for-bit equality (so -0.0 differs from +0.0, and equal NaNs match).
 template <class T>
-bool same_bits(T a, T b) {
-    return std::memcmp(&a, &b, sizeof(T)) == 0;
-}
+bool same_bits(T a, T b) { return std::memcmp(&a, &b, sizeof(T)) == 0; }
 
 // Distance in units in the last place; a NaN is infinitely far from anything.
 template <class T>
@@ -132,8 +137,7 @@ template <class V>
                                          << v->delta << "; want " << points << ", " << is_complex << ", " << delta;
 }
 
-// Every scalar of `got` within `ulps` of `want` (0: bit for bit); a NaN
-// matches only a NaN.
+// Every scalar of `got` within `ulps` of `want` (0: bit for bit); a NaN matches only a NaN.
 template <class T>
 ::testing::AssertionResult same_scalars(const std::vector<T>& got, const std::vector<T>& want, double ulps = 0) {
     if (got.size() != want.size()) return ::testing::AssertionFailure() << got.size() << " scalars, want " << want.size();
@@ -143,6 +147,26 @@ template <class T>
         if (!ok) return ::testing::AssertionFailure() << "scalar " << i << ": " << got[i] << " want " << want[i];
     }
     return ::testing::AssertionSuccess();
+}
+
+// x in blocks of random length below max_len (in place on odd ones if asked) through run(block, out), the outputs
+// joined.
+template <class V, class Run>
+std::vector<real_of<V>> in_blocks(const std::vector<real_of<V>>& x, bool xc, uint32_t seed, Run run, bool in_place = true,
+                                   int64_t max_len = 90) {
+    using T = real_of<V>;
+    const int64_t w = xc ? 2 : 1, total = int64_t(x.size()) / w;
+    std::vector<T> got;
+    std::mt19937 rng(seed);
+    for (int64_t at = 0, i = 0; at < total; ++i) {
+        const int64_t len = std::min<int64_t>(int64_t(rng() % uint64_t(max_len)), total - at);
+        Vec<V> block(std::vector<T>(x.begin() + at * w, x.begin() + (at + len) * w), xc), other;
+        V* out = in_place && i % 2 ? block.get() : other.get();
+        EXPECT_EQ(run(block.get(), out), 0);
+        got.insert(got.end(), out->data, out->data + out->points * w);
+        at += len;
+    }
+    return got;
 }
 
 // Installs the family's storage hooks; null restores the library's own.
@@ -155,8 +179,7 @@ void set_hooks(int32_t (*a)(V*), int32_t (*r)(V*, int32_t, int32_t), int32_t (*f
     }
 }
 
-// While in scope every allocation of the family fails: the hooks release the
-// old block and hand back no storage.
+// While in scope every allocation of the family fails: the hooks release the old block and hand back no storage.
 template <class V>
 struct FailingAlloc {
     static int32_t alloc(V* v) {

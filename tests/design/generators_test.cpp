@@ -4,15 +4,9 @@
 using namespace vlxtest;
 
 namespace {
-VLX_TWIN(c, line)
-VLX_TWIN(c, cos)
-VLX_TWIN(c, cexp)
-VLX_TWIN(c, rand)
-VLX_TWIN(c, rsmp)
+VLX_TWIN(c, line) VLX_TWIN(c, cos) VLX_TWIN(c, cexp) VLX_TWIN(c, rand) VLX_TWIN(c, rsmp)
 
-template <class V>
-class Generators : public ::testing::Test {};
-TYPED_TEST_SUITE(Generators, Families);
+VLX_TYPED_SUITE(Generators);
 
 template <class V>  // a creator's vector: points, delta and complex preset by the caller
 V* preset(Vec<V>& v, int32_t points, double delta, int32_t cx) {
@@ -35,9 +29,8 @@ TYPED_TEST(Generators, LineToneAndExponentialFollowTheirReferences) {
         ASSERT_TRUE(near(re[k], cosl(angle), tol) && same_bits(cx[2 * k], re[k]) && cx[2 * k + 1] == T(0)) << k;
         ASSERT_TRUE(near(ex[2 * k], cosl(angle), tol) && near(ex[2 * k + 1], sinl(angle), tol)) << k;
     }
-    // Sample 256 restarts at the exact angle, whatever the rotation gathered:
-    // the float tone in single precision reduced in double, the float
-    // exponential wholly in double.
+    // Sample 256 restarts at the exact angle, whatever the rotation gathered: the float tone in single precision
+    // reduced in double, the float exponential wholly in double.
     const T w = delta * T(2) * static_cast<T>(3.141592653589793) * freq, angle = T(256) * w + phase;
     if constexpr (is_double<TypeParam>)
         EXPECT_TRUE(same_bits(re[256], std::cos(angle)) && same_bits(ex[513], std::sin(angle)));
@@ -47,8 +40,7 @@ TYPED_TEST(Generators, LineToneAndExponentialFollowTheirReferences) {
 }
 
 TYPED_TEST(Generators, CreatorsOnEmptyAndUnallocatableVectors) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     int32_t (*const creators[])(V*) = {
         [](V* v) { return t_line(v, T(1), T(0)); }, [](V* v) { return t_cos(v, T(1), T(0)); },
         [](V* v) { return t_cexp(v, T(1), T(0)); }, [](V* v) { return t_rand(v, 0) | t_rand(v, 2); },

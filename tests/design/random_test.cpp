@@ -4,12 +4,9 @@
 using namespace vlxtest;
 
 namespace {
-VLX_TWIN(c, rand)
-VLX_TWIN(i, shuffle)
+VLX_TWIN(c, rand) VLX_TWIN(i, shuffle)
 
-template <class V>
-class Random : public ::testing::Test {};
-TYPED_TEST_SUITE(Random, Families);
+VLX_TYPED_SUITE(Random);
 
 // The widened uniform draw from the low 15 bits of each rand() value.
 template <class V>

@@ -4,13 +4,9 @@
 using namespace vlxtest;
 
 namespace {
-VLX_TWIN(c, rsmp)
-VLX_TWIN(c, rsmp_cos)
-VLX_TWIN(c, rsmp_pcos)
+VLX_TWIN(c, rsmp) VLX_TWIN(c, rsmp_cos) VLX_TWIN(c, rsmp_pcos)
 
-template <class V>
-class ResamplingTables : public ::testing::Test {};
-TYPED_TEST_SUITE(ResamplingTables, Families);
+VLX_TYPED_SUITE(ResamplingTables);
 
 TYPED_TEST(ResamplingTables, BuiltInKernelsAreSymmetricAndPeakInTheMiddle) {
     // 1024 phases; design 4 gives the 13314-point table of the streaming resampler

@@ -10,12 +10,10 @@ VLX_TWIN(i, unwrap) VLX_TWIN(i, unwrap_wnd) VLX_TWIN(i, differ) VLX_TWIN(i, inte
 VLX_TWIN(i, limit) VLX_TWIN(i, pdiffer) VLX_TWIN(i, phase) VLX_TWIN(i, rtop)
 }  // namespace
 
-template <class V>
-class Phase : public ::testing::Test {};
-TYPED_TEST_SUITE(Phase, Families);
+VLX_TYPED_SUITE(Phase);
 
-// A ramp wrapped into [-pi, pi) comes back whole (plus the turns that bring
-// its first sample within pi of 0), by the plain unwrap and by windows.
+// A ramp wrapped into [-pi, pi) comes back whole (plus the turns that bring its first sample within pi of 0), by the
+// plain unwrap and by windows.
 TYPED_TEST(Phase, UnwrapRestoresRamp) {
     using T = real_of<TypeParam>;
     const long double pi = 3.14159265358979323846L;
@@ -57,7 +55,7 @@ TYPED_TEST(Phase, EdgesOfSine) {
 TYPED_TEST(Phase, FixedCases) {
     using T = real_of<TypeParam>;
     const T pi = is_double<TypeParam> ? T(3.141592653589793) : T(3.1415927f);
-    const T b = is_double<TypeParam> ? T(1e100) : T(1e15f);
+    const T b = bound_of<TypeParam>();
     const T nan = std::numeric_limits<T>::quiet_NaN();
     int32_t clipped = -5;
     struct Row {

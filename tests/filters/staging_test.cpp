@@ -7,8 +7,7 @@ using namespace vlxtest;
 
 namespace {
 
-VLX_TEST_TWIN(t_deci, vlxd_deci, vlxfd_deci)
-VLX_TEST_TWIN(t_stage, vlx_stage_io, vlxf_stage_io)
+VLX_TEST_TWIN(t_deci, vlxd_deci, vlxfd_deci) VLX_TEST_TWIN(t_stage, vlx_stage_io, vlxf_stage_io)
 VLX_TEST_TWIN(t_unstage, vlx_unstage_io, vlxf_unstage_io)
 
 template <class V>
@@ -17,15 +16,12 @@ int32_t stage(V* in, V** out, V* other, V** hist, int32_t hist_points, int32_t f
     return t_stage(in, out, other, hist, hist_points, flags, aliased, tmp, saved);
 }
 
-template <class V>
-class Staging : public ::testing::Test {};
-TYPED_TEST_SUITE(Staging, Families);
+VLX_TYPED_SUITE(Staging);
 
-// Blocks fed one after another give exactly the samples of one long call,
-// whatever the split, and those are every factor-th sample.
+// Blocks fed one after another give exactly the samples of one long call, whatever the split, and those are every
+// factor-th sample.
 TYPED_TEST(Staging, BlockFedDecimationEqualsOneCall) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     const int32_t total = 97;
     for (bool cx : {false, true})
         for (int32_t factor : {-2, 0, 1, 2, 3, 4, 7, 16, 100})
@@ -36,31 +32,20 @@ TYPED_TEST(Staging, BlockFedDecimationEqualsOneCall) {
                 std::vector<T> want;
                 for (int64_t k = 0; k < total; k += f)
                     for (int64_t c = 0; c < w; ++c) want.push_back(x[size_t(k * w + c)]);
-
-                Vec<V> hist;  // empty: starts from silence
-                std::vector<T> got;
-                std::mt19937 rng(split_seed);
-                for (int32_t at = 0; at < total;) {
-                    const int32_t len = std::min<int32_t>(int32_t(rng() % 23), total - at);  // empty blocks too
-                    Vec<V> block(std::vector<T>(x.begin() + at * w, x.begin() + (at + len) * w), cx);
-                    block->delta = T(0.5);
-                    // odd splits decimate in place
-                    Vec<V> other;
-                    V* out = split_seed % 2 ? block.get() : other.get();
-                    ASSERT_EQ(t_deci(block.get(), out, factor, hist.get()), 0);
-                    EXPECT_EQ(out->complex, cx ? 1 : 0);
-                    EXPECT_EQ(out->delta, T(f) * T(0.5));
-                    got.insert(got.end(), out->data, out->data + (out->points * w));
-                    at += len;
-                }
+                Vec<V> hist;  // empty: starts from silence; odd blocks decimate in place
+                const auto got = in_blocks<V>(x, cx, split_seed, [&](V* in, V* out) {
+                    in->delta = T(0.5);
+                    const int32_t r = t_deci(in, out, factor, hist.get());
+                    EXPECT_TRUE(out->complex == (cx ? 1 : 0) && out->delta == (T(f) * T(0.5)));
+                    return r;
+                }, true, 23);
                 EXPECT_EQ(got, want) << "factor " << factor << " split " << split_seed << " cx " << cx;
                 EXPECT_EQ(hist->complex, cx ? 1 : 0);
             }
 }
 
 TYPED_TEST(Staging, DecimationSkipCount) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     struct Case {
         T stored;
         int32_t n, factor;
@@ -96,8 +81,7 @@ TYPED_TEST(Staging, DecimationSkipCount) {
 }
 
 TYPED_TEST(Staging, HistoryFollowsSourceAndIsNeverShortened) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     Vec<V> in({1, 2, 3, 4}, true);
     in->delta = T(0.25);
     Vec<V> out;
@@ -106,9 +90,7 @@ TYPED_TEST(Staging, HistoryFollowsSourceAndIsNeverShortened) {
     V* op = out.get();
     ASSERT_EQ(stage<V>(in.get(), &op, nullptr, &hp, 3, 0), 0);
     EXPECT_TRUE(has_shape(hist.get(), 5, 1, 0.25));  // surplus stays
-    EXPECT_EQ(hist[2], T(8));
-    EXPECT_EQ(hist[3], T(0));
-    EXPECT_TRUE(has_shape(out.get(), 2, 1, 0.25));
+    EXPECT_TRUE(hist[2] == T(8) && hist[3] == T(0) && has_shape(out.get(), 2, 1, 0.25));
     // a real source turns it back and pads a short one
     Vec<V> real_in({1, 2});
     Vec<V> short_hist({4, 5}, true);
@@ -118,11 +100,10 @@ TYPED_TEST(Staging, HistoryFollowsSourceAndIsNeverShortened) {
     EXPECT_EQ(out->complex, 1);  // the complex filter makes the output complex
 }
 
-// A destination sharing the source's storage is filled through a temporary
-// that unstaging delivers; without somewhere to put it the call fails.
+// A destination sharing the source's storage is filled through a temporary that unstaging delivers; without somewhere
+// to put it the call fails.
 TYPED_TEST(Staging, AliasedDestination) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     for (int32_t flags : {VLX_STAGE_ALIAS, VLX_STAGE_ALIAS | VLX_STAGE_KEEP_POINTS}) {
         Vec<V> v({1, 2, 3});
         V* out = v.get();
@@ -130,18 +111,14 @@ TYPED_TEST(Staging, AliasedDestination) {
         V* saved = nullptr;
         int32_t aliased = -7;
         if (flags & VLX_STAGE_KEEP_POINTS) v->points = 2;
-        ASSERT_EQ(stage<V>(v.get(), &out, nullptr, nullptr, 0, flags, &aliased, &tmp, &saved), 0);
-        ASSERT_EQ(aliased, 1);
+        ASSERT_TRUE(stage<V>(v.get(), &out, nullptr, nullptr, 0, flags, &aliased, &tmp, &saved) == 0 && aliased == 1);
         EXPECT_EQ(saved, v.get());
         ASSERT_EQ(out, &tmp);
         EXPECT_EQ(tmp.points, (flags & VLX_STAGE_KEEP_POINTS) ? 2 : 3);
         for (int32_t i = 0; i < tmp.points; ++i) tmp.data[i] = v[i] * T(10);  // the kernel reads the source
         const int32_t delivered = tmp.points;
         ASSERT_EQ(t_unstage(out, aliased, saved), 0);
-        EXPECT_EQ(tmp.data, nullptr);
-        EXPECT_EQ(v->points, delivered);
-        EXPECT_EQ(v[0], T(10));
-        EXPECT_EQ(v[1], T(20));
+        EXPECT_TRUE(tmp.data == nullptr && v->points == delivered && v[0] == T(10) && v[1] == T(20));
     }
     // two empty vectors share a null data pointer
     Vec<V> a, b;
@@ -151,15 +128,12 @@ TYPED_TEST(Staging, AliasedDestination) {
     V tmp;
     V* saved = nullptr;
     ASSERT_EQ(stage<V>(a.get(), &out, nullptr, nullptr, 0, VLX_STAGE_ALIAS, &aliased, &tmp, &saved), 0);
-    EXPECT_EQ(aliased, 1);
-    EXPECT_EQ(t_unstage(out, 1, static_cast<V*>(nullptr)), -1);
-    EXPECT_EQ(t_unstage(out, 1, saved), 0);
+    EXPECT_TRUE(aliased == 1 && t_unstage(out, 1, static_cast<V*>(nullptr)) == -1 && t_unstage(out, 1, saved) == 0);
     EXPECT_EQ(t_unstage(a.get(), 0, static_cast<V*>(nullptr)), 0);
 }
 
 TYPED_TEST(Staging, AllocationFailure) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     Vec<V> in({1, 2, 3});
     Vec<V> dst;
     V* out = in.get();
@@ -169,35 +143,25 @@ TYPED_TEST(Staging, AllocationFailure) {
     {
         FailingAlloc<V> failing;
         EXPECT_EQ(stage<V>(in.get(), &out, nullptr, nullptr, 0, VLX_STAGE_ALIAS, &aliased, &tmp, &saved), -1);
-        EXPECT_EQ(t_deci(in.get(), dst.get(), 1, static_cast<V*>(nullptr)), -1);
-        EXPECT_EQ(dst->points, 0);
+        EXPECT_TRUE(t_deci(in.get(), dst.get(), 1, static_cast<V*>(nullptr)) == -1 && dst->points == 0);
     }
     EXPECT_EQ(in.values(), (std::vector<T>{1, 2, 3}));
 }
 
 TEST(PointCounts, NearlyEqual) {
-    struct Case {
-        double a, b;
-        int32_t want;
-    };
+    struct Case { double a, b; int32_t want; };
     const Case cases[] = {
         {0.0, 1e-310, 1},   {1e-300, 0.0, 0}, {1.0, 1.0 + 4e-15, 1}, {1.0, 1.0 + 5e-15, 0},
-        {-2.0, -2.0, 1},    {2.0, -2.0, 0},   {NAN, NAN, 0},         {1.0, NAN, 0},
-        {4.4e-307, -4.4e-307, 1},
+        {-2.0, -2.0, 1},    {2.0, -2.0, 0},   {NAN, NAN, 0},         {1.0, NAN, 0}, {4.4e-307, -4.4e-307, 1},
     };
     for (const Case& c : cases) EXPECT_EQ(vlx_nearly_equal(c.a, c.b), c.want) << c.a << " " << c.b;
     // the float allowance is 7 epsilons
-    EXPECT_EQ(vlxf_nearly_equal(1.0f, 1.0000007f), 1);
-    EXPECT_EQ(vlxf_nearly_equal(1.0f, 1.000001f), 0);
-    EXPECT_EQ(vlxf_nearly_equal(0.0f, 2e-37f), 1);
-    EXPECT_EQ(vlxf_nearly_equal(3e-37f, 0.0f), 0);
+    EXPECT_TRUE(vlxf_nearly_equal(1.0f, 1.0000007f) == 1 && vlxf_nearly_equal(1.0f, 1.000001f) == 0);
+    EXPECT_TRUE(vlxf_nearly_equal(0.0f, 2e-37f) == 1 && vlxf_nearly_equal(3e-37f, 0.0f) == 0);
 }
 
 TEST(PointCounts, CeilAndFloorForgiveNoise) {
-    struct Case {
-        double x;
-        int32_t ceil, floor;
-    };
+    struct Case { double x; int32_t ceil, floor; };
     const Case cases[] = {
         {2.0000000000000004, 2, 2}, {1.9999999999999998, 2, 2}, {2.0, 2, 2},  {2.01, 3, 2},
         {1.99, 2, 1},               {0.0, 0, 0},                {1e-20, 0, 0}, {0.3, 1, 0},
@@ -205,16 +169,14 @@ TEST(PointCounts, CeilAndFloorForgiveNoise) {
         {3e9, INT_MAX, INT_MAX},    {2147483647.0, INT_MAX, INT_MAX},
     };
     for (const Case& c : cases) {
-        EXPECT_EQ(vlx_ceil_pts(c.x), c.ceil) << c.x;
-        EXPECT_EQ(vlx_floor_pts(c.x), c.floor) << c.x;
+        EXPECT_TRUE(vlx_ceil_pts(c.x) == c.ceil && vlx_floor_pts(c.x) == c.floor) << c.x;
     }
     const Case fcases[] = {
         {2.0000002, 2, 2},  {1.9999999, 2, 2}, {20000.004, 20000, 20000}, {20000.02, 20001, 20000},
         {2147483648.0, INT_MAX, INT_MAX}, {1e10, INT_MAX, INT_MAX}, {-3.0, 0, 0}, {0.25, 1, 0},
     };
     for (const Case& c : fcases) {
-        EXPECT_EQ(vlxf_ceil_pts(float(c.x)), c.ceil) << c.x;
-        EXPECT_EQ(vlxf_floor_pts(float(c.x)), c.floor) << c.x;
+        EXPECT_TRUE(vlxf_ceil_pts(float(c.x)) == c.ceil && vlxf_floor_pts(float(c.x)) == c.floor) << c.x;
     }
 }
 

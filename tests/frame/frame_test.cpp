@@ -1,6 +1,5 @@
-// The frame's internals: locks before and after vlx_lib_init, the bounded
-// counter, the active counter and the teardown that waits for readers.
-// Linked against the static library, whose internal symbols are visible.
+// The frame's internals: locks before and after vlx_lib_init, the bounded counter, the active counter and the
+// teardown that waits for readers. Linked against the static library, whose internal symbols are visible.
 #include "core/frame.hpp"
 
 #include <gtest/gtest.h>
@@ -37,8 +36,7 @@ int64_t blocked_ms(int n, int hold_ms) {
 
 // Runs first in this executable: before vlx_lib_init the locks do nothing.
 TEST(Frame, LocksWorkOnlyAfterInitAndInitRepeats) {
-    EXPECT_LT(blocked_ms(0, 100), 50);
-    EXPECT_LT(blocked_ms(1, 100), 50);
+    EXPECT_TRUE(blocked_ms(0, 100) < 50 && blocked_ms(1, 100) < 50);
 
     std::vector<std::thread> threads;
     for (int t = 0; t < 4; ++t)
@@ -48,8 +46,7 @@ TEST(Frame, LocksWorkOnlyAfterInitAndInitRepeats) {
     for (auto& t : threads) t.join();
     EXPECT_EQ(vlxf_lib_init(), 0);
 
-    EXPECT_GE(blocked_ms(0, 100), 60);
-    EXPECT_GE(blocked_ms(1, 100), 60);
+    EXPECT_TRUE(blocked_ms(0, 100) >= 60 && blocked_ms(1, 100) >= 60);
     // recursive for the holding thread
     vlx::lib_lock(1);
     vlx::lib_lock(1);
@@ -57,17 +54,14 @@ TEST(Frame, LocksWorkOnlyAfterInitAndInitRepeats) {
     vlx::lib_unlock(0);
     vlx::lib_unlock(1);
     vlx::lib_unlock(1);
-    EXPECT_EQ(vlx_version(), 328);
-    EXPECT_EQ(vlxf_version(), 328);
+    EXPECT_TRUE(vlx_version() == 328 && vlxf_version() == 328);
 }
 
 TEST(Frame, BoundedCounterFiresOnceAndStaysBounded) {
     std::atomic<int32_t> counter{0};
     int first = 0;
     for (int i = 0; i < 25000; ++i) first += vlx::bounded_counter_first(counter) ? 1 : 0;
-    EXPECT_EQ(first, 1);
-    EXPECT_LE(counter.load(), 10000);
-    EXPECT_GE(counter.load(), 9999);
+    EXPECT_TRUE(first == 1 && counter.load() <= 10000 && counter.load() >= 9999);
 }
 
 std::vector<int> ran;
@@ -86,8 +80,7 @@ TEST(Frame, TeardownRunsStepsInOrderAndStopsAtAFailure) {
     vlx::register_teardown<vlx_t>(TeardownStep::twiddle_tables, &record_step<7, 0>);
     ran.clear();
     EXPECT_EQ(vlxf_free_internal(), 0);  // the float family has its own steps
-    EXPECT_TRUE(ran.empty());
-    EXPECT_EQ(vlx_free_internal(), 0);
+    EXPECT_TRUE(ran.empty() && vlx_free_internal() == 0);
     EXPECT_EQ(ran, (std::vector<int>{1, 3, 7, 8}));
 
     vlx::register_teardown<vlx_t>(TeardownStep::chirp, &record_step<5, -7>);
@@ -130,8 +123,7 @@ TEST(Frame, TeardownWaitsForAReaderOutsideTheLock) {
 
     // With nobody reading, the wait returns at once.
     const auto t1 = Clock::now();
-    EXPECT_EQ(vlx_free_internal(), 0);
-    EXPECT_LT(std::chrono::duration_cast<milliseconds>(Clock::now() - t1).count(), 50);
+    EXPECT_TRUE(vlx_free_internal() == 0 && (std::chrono::duration_cast<milliseconds>(Clock::now() - t1).count()) < 50);
     vlx::register_teardown<vlx_t>(vlx::TeardownStep::twiddle_tables, nullptr);
 }
 

@@ -1,12 +1,11 @@
-// Interpolation: splines reproduce a cubic under every end condition that can, the lower
-// methods reproduce their own polynomials, and failures leave what they should.
+// Interpolation: splines reproduce a cubic under every end condition that can, the lower methods reproduce their own
+// polynomials, and failures leave what they should.
 #include "stats_support.hpp"
 
 using namespace vlxtest;
 
 namespace {
-VLX_TEST_TWIN(t_interp, vlx_interp, vlxf_interp)
-VLX_TEST_TWIN(t_cspline, vlx_cspline, vlxf_cspline)
+VLX_TEST_TWIN(t_interp, vlx_interp, vlxf_interp) VLX_TEST_TWIN(t_cspline, vlx_cspline, vlxf_cspline)
 VLX_TEST_TWIN(t_cspline_2d, vlxb_cspline_2d, vlxfb_cspline_2d)
 
 using LD = long double;
@@ -22,12 +21,10 @@ Vec<V> table(const std::vector<LD>& xs, F f) {
 }
 }  // namespace
 
-template <class V>
-class Interp : public ::testing::Test {};
-TYPED_TEST_SUITE(Interp, Families);
+VLX_TYPED_SUITE(Interp);
 
-// Second derivatives and values of a cubic, in and beyond the table, for the
-// four-point closed form and the tridiagonal path; y comes back unchanged.
+// Second derivatives and values of a cubic, in and beyond the table, for the four-point closed form and the
+// tridiagonal path; y comes back unchanged.
 TYPED_TEST(Interp, SplineReproducesCubic) {
     using T = real_of<TypeParam>;
     const LD tol = is_double<TypeParam> ? 1e-11L : 2e-4L;
@@ -59,8 +56,7 @@ TYPED_TEST(Interp, SplineReproducesCubic) {
     EXPECT_TRUE(same_scalars(xi.values(), y.values(), is_double<TypeParam> ? 64 : 16));
 }
 
-// Each lower method on its own polynomial, with and without held ends, and
-// the method values without a formula.
+// Each lower method on its own polynomial, with and without held ends, and the method values without a formula.
 TYPED_TEST(Interp, LowerMethods) {
     using T = real_of<TypeParam>;
     const std::vector<LD> xs{0, 1, 2.5L, 3, 5};

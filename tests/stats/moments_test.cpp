@@ -1,5 +1,5 @@
-// Moments against long-double references, the block order of the sums bit for
-// bit, and the fixed results of degenerate, huge and NaN inputs.
+// Moments against long-double references, the block order of the sums bit for bit, and the fixed results of
+// degenerate, huge and NaN inputs.
 #include "stats_support.hpp"
 
 #include <functional>
@@ -7,16 +7,13 @@
 
 using namespace vlxtest;
 
-template <class V>
-class Moments : public ::testing::Test {};
-TYPED_TEST_SUITE(Moments, Families);
+VLX_TYPED_SUITE(Moments);
 
 namespace {
 
 constexpr int64_t kBlock = 2048;
 
-// The defined order: each block of 2048 summed from 0 in index order, the
-// block sums added to a total in block order.
+// The defined order: each block of 2048 summed from 0 in index order, the block sums added to a total in block order.
 template <class T, class Term>
 T blockwise(int64_t n, Term term) {
     T total = T(0);
@@ -29,17 +26,14 @@ T blockwise(int64_t n, Term term) {
 }
 
 template <class T>
-T saturated(T x, T b) {
-    return x > b ? b : (x < -b ? -b : x);
-}
+T saturated(T x, T b) { return x > b ? b : (x < -b ? -b : x); }
 
 }  // namespace
 
-// Tolerance: rounding errors of a sequential sum grow like the square root of
-// the adds in one block, so 2 * sqrt(adds per block) ulps, plus 8 for the
-// divisions, root and pivoted combination after the sums.  The excess kurtosis
-// is measured in ulps of m4/m2^2, the quantity actually computed.  A wrong
-// divisor (n against n - 1), a lost block or a wrong pivot is off by far more.
+// Tolerance: rounding errors of a sequential sum grow like the square root of the adds in one block, so 2 * sqrt(adds
+// per block) ulps, plus 8 for the divisions, root and pivoted combination after the sums.  The excess kurtosis is
+// measured in ulps of m4/m2^2, the quantity actually computed.  A wrong divisor (n against n - 1), a lost block or a
+// wrong pivot is off by far more.
 TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     using T = real_of<TypeParam>;
     for (const int64_t n : {int64_t(7), int64_t(1000), int64_t(5000), int64_t(2 * 8 * kBlock + 700)}) {
@@ -66,18 +60,13 @@ TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
             long double scale = 0;  // what the ulps are counted in, if not the result
         };
         const Row rows[] = {
-            {"sum", STAT(t_sum), s1},
-            {"mean", STAT(t_mean), m},
-            {"magsq_sum", STAT(t_magsq_sum), sq},
-            {"rms", STAT(t_rms), std::sqrt(sq / n)},
-            {"pop_var", STAT(t_pop_var), var},
-            {"samp_var", STAT(t_samp_var), s2 / (n - 1)},
-            {"pop_stddev", STAT(t_pop_stddev), std::sqrt(var)},
+            {"sum", STAT(t_sum), s1}, {"mean", STAT(t_mean), m}, {"magsq_sum", STAT(t_magsq_sum), sq},
+            {"rms", STAT(t_rms), std::sqrt(sq / n)}, {"pop_var", STAT(t_pop_var), var},
+            {"samp_var", STAT(t_samp_var), s2 / (n - 1)}, {"pop_stddev", STAT(t_pop_stddev), std::sqrt(var)},
             {"samp_stddev", STAT(t_samp_stddev), std::sqrt(s2 / (n - 1))},
             {"skew", STAT(t_skew), (s3 / n) / (var * std::sqrt(var))},
             {"excess", STAT(t_excess), (s4 / n) / (var * var) - 3, (s4 / n) / (var * var)},
-            {"gmean", STAT(t_gmean), std::exp(logs / n)},
-            {"hmean", STAT(t_hmean), n / inv},
+            {"gmean", STAT(t_gmean), std::exp(logs / n)}, {"hmean", STAT(t_hmean), n / inv},
         };
         const double tolerance = 8.0 + 2.0 * std::sqrt(static_cast<double>(std::min<int64_t>(n, kBlock)));
         for (const Row& row : rows) {
@@ -92,13 +81,13 @@ TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     }
 }
 
-// Bit for bit against the literal blockwise order, on lengths that end inside
-// a block, on a block edge, and past several groups of blocks.
+// Bit for bit against the literal blockwise order, on lengths that end inside a block, on a block edge, and past
+// several groups of blocks.
 TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
     using T = real_of<TypeParam>;
     constexpr T b = bound_of<TypeParam>();
-    // A running sum loses the small tail against the leading 1; in blocks the
-    // tail sums exactly to 2048 * tiny and survives.
+    // A running sum loses the small tail against the leading 1; in blocks the tail sums exactly to 2048 * tiny and
+    // survives.
     {
         const T tiny = std::numeric_limits<T>::epsilon() / 2;
         std::vector<T> x(2 * kBlock, T(0));
@@ -144,24 +133,13 @@ TYPED_TEST(Moments, FixedResults) {
     constexpr T b = bound_of<TypeParam>();
     const T nan = std::numeric_limits<T>::quiet_NaN();
     using Fn = StatFn<TypeParam>;
-    struct Row {
-        const char* what;
-        Fn fn;
-        std::vector<T> in;
-        bool complex;
-        T re, im;
-    };
+    struct Row { const char* what; Fn fn; std::vector<T> in; bool complex; T re, im; };
     const Row rows[] = {
-        {"empty sum", STAT(t_sum), {}, true, 0, 0},
-        {"empty mean", STAT(t_mean), {}, false, 0, 0},
-        {"empty variance", STAT(t_pop_var), {}, false, 0, 0},
-        {"empty skew", STAT(t_skew), {}, false, 0, 0},
-        {"empty excess", STAT(t_excess), {}, false, -3, 0},
-        {"empty gmean", STAT(t_gmean), {}, true, 0, 0},
-        {"empty hmean", STAT(t_hmean), {}, true, 0, 0},
-        {"empty min", STAT(t_min), {}, false, 0, 0},
-        {"empty max", STAT(t_max), {}, true, 0, 0},
-        {"empty median", STAT(t_median), {}, false, 0, 0},
+        {"empty sum", STAT(t_sum), {}, true, 0, 0}, {"empty mean", STAT(t_mean), {}, false, 0, 0},
+        {"empty variance", STAT(t_pop_var), {}, false, 0, 0}, {"empty skew", STAT(t_skew), {}, false, 0, 0},
+        {"empty excess", STAT(t_excess), {}, false, -3, 0}, {"empty gmean", STAT(t_gmean), {}, true, 0, 0},
+        {"empty hmean", STAT(t_hmean), {}, true, 0, 0}, {"empty min", STAT(t_min), {}, false, 0, 0},
+        {"empty max", STAT(t_max), {}, true, 0, 0}, {"empty median", STAT(t_median), {}, false, 0, 0},
         {"constant skew", STAT(t_skew), {2.5, 2.5, 2.5, 2.5}, false, 0, 0},
         {"constant excess", STAT(t_excess), {2.5, 2.5, 2.5, 2.5}, false, -3, 0},
         {"one-point sample variance", STAT(t_samp_var), {7}, false, 0, 0},
@@ -195,14 +173,11 @@ TYPED_TEST(Moments, FixedResults) {
     }
     // A NaN flows through the sums.
     Vec<TypeParam> with_nan{1, nan, 3};
-    EXPECT_TRUE(std::isnan(STAT(t_mean)(with_nan).re));
-    EXPECT_TRUE(std::isnan(STAT(t_pop_var)(with_nan).re));
+    EXPECT_TRUE(std::isnan(STAT(t_mean)(with_nan).re) && std::isnan(STAT(t_pop_var)(with_nan).re));
     // Complex input to skew and excess is refused, dst untouched.
     Vec<TypeParam> cx({1, 2, 3, 4}, true);
     Vec<TypeParam> dst{42};
-    EXPECT_EQ(t_skew(cx.get(), dst.get()), -1);
-    EXPECT_EQ(t_excess(cx.get(), dst.get()), -1);
-    EXPECT_EQ(dst->points, 1);
+    EXPECT_TRUE(t_skew(cx.get(), dst.get()) == -1 && t_excess(cx.get(), dst.get()) == -1 && dst->points == 1);
     EXPECT_EQ(dst[0], T(42));
 }
 
@@ -217,8 +192,7 @@ TYPED_TEST(Moments, InPlaceAndComplexShape) {
     // complex variance is that of re plus that of im; the result is real
     Vec<TypeParam> c({1, 10, 3, 10, 5, 40}, true);
     const auto r = STAT(t_pop_var)(c);
-    EXPECT_EQ(r.complex, 0);
-    EXPECT_TRUE(near(r.re, T(8) / 3 + T(200), 1e-4));
+    EXPECT_TRUE(r.complex == 0 && near(r.re, T(8) / 3 + T(200), 1e-4));
 }
 
 // A failed allocation is a status: dst is left empty, nothing is written.
@@ -228,11 +202,8 @@ TEST(MomentsHooks, AllocationFailureIsReported) {
     src.data = lent;  // lent storage: no allocation needed to read it
     Vec<vlx_t> dst;
     FailingAlloc<vlx_t> failing;
-    EXPECT_EQ(vlxs_sum(&src, dst.get()), -1);
-    EXPECT_EQ(dst->points, 0);
-    EXPECT_EQ(dst->data, nullptr);
-    EXPECT_EQ(vlxs_median(&src, dst.get()), -1);
-    EXPECT_EQ(vlxs_hist(&src, dst.get(), 0, 1, 4), -1);
+    EXPECT_TRUE(vlxs_sum(&src, dst.get()) == -1 && dst->points == 0 && dst->data == nullptr);
+    EXPECT_TRUE(vlxs_median(&src, dst.get()) == -1 && vlxs_hist(&src, dst.get(), 0, 1, 4) == -1);
     EXPECT_EQ(vlxs_peak(&src, dst.get(), VLX_PEAK_SAMPLE, 0), -1);
     EXPECT_EQ(vlxs_peak(&src, &src, VLX_PEAK_SAMPLE, 0), -1);
 }

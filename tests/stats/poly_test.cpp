@@ -1,6 +1,5 @@
-// Polynomials: roots checked against their polynomial in long double, the
-// expansion back to coefficients, the closed forms' layout, the single-root
-// searches' fixed cases, the bounds, and allocation failure.
+// Polynomials: roots checked against their polynomial in long double, the expansion back to coefficients, the closed
+// forms' layout, the single-root searches' fixed cases, the bounds, and allocation failure.
 #include "stats_support.hpp"
 
 #include <algorithm>
@@ -14,14 +13,12 @@ using namespace vlxtest;
 
 namespace {
 VLX_TWIN(s, peval) VLX_TWIN(s, psolve) VLX_TWIN(s, pcsolve) VLX_TWIN(s, proots)
-VLX_TWIN(s, root_upper_bound) VLX_TWIN(s, root_lower_bound)
-VLX_TEST_TWIN(t_pztoc, vlxi_pztoc, vlxfi_pztoc)
+VLX_TWIN(s, root_upper_bound) VLX_TWIN(s, root_lower_bound) VLX_TEST_TWIN(t_pztoc, vlxi_pztoc, vlxfi_pztoc)
 VLX_TWIN(s, root_restarts)
 
 using LC = std::complex<long double>;
 
-// vlxi_proots leaves its two work vectors behind by design; that storage is
-// not a leak the sanitizer should report.
+// vlxi_proots leaves its two work vectors behind by design; that storage is not a leak the sanitizer should report.
 template <class V>
 int32_t iproots(V* v) {
 #if defined(__SANITIZE_ADDRESS__)
@@ -43,8 +40,8 @@ std::vector<long double> expand(const std::vector<LC>& roots, long double lead) 
     return out;
 }
 
-// |p(z)| over the sum of |a_k| |z|^k: the residual relative to the size of
-// the terms, which is what a backward-stable root can promise.
+// |p(z)| over the sum of |a_k| |z|^k: the residual relative to the size of the terms, which is what a backward-stable
+// root can promise.
 template <class T>
 long double relative_residual(const std::vector<T>& a, LC z) {
     LC p = 0;
@@ -56,9 +53,8 @@ long double relative_residual(const std::vector<T>& a, LC z) {
     return std::abs(p) / scale;
 }
 
-// Root sets, apart from each other: random real roots and conjugate pairs;
-// the same with each real root doubled 1e-3 away (clusters); a triple and a
-// double root among them; real roots over four decades.
+// Root sets, apart from each other: random real roots and conjugate pairs; the same with each real root doubled 1e-3
+// away (clusters); a triple and a double root among them; real roots over four decades.
 std::vector<LC> root_set(int kind, int degree, uint32_t seed) {
     std::mt19937 rng(seed);
     std::uniform_real_distribution<double> u(-2, 2);
@@ -79,9 +75,8 @@ std::vector<LC> root_set(int kind, int degree, uint32_t seed) {
     return r;
 }
 
-// vlxs_pcsolve rebuilt from the exported layers.  The library does not know
-// these step pointers as its own, so it runs every round of every search
-// instead of skipping the cycles it recognises.
+// vlxs_pcsolve rebuilt from the exported layers.  The library does not know these step pointers as its own, so it
+// runs every round of every search instead of skipping the cycles it recognises.
 template <class V>
 int32_t pcsolve_every_round(V* src, V* dst, real_of<V> re, real_of<V> im) {
     using T = real_of<V>;
@@ -106,9 +101,7 @@ std::vector<real_of<V>> rounded(const std::vector<long double>& c) {
 
 }  // namespace
 
-template <class V>
-class Poly : public ::testing::Test {};
-TYPED_TEST_SUITE(Poly, Families);
+VLX_TYPED_SUITE(Poly);
 
 TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialAndExpandBack) {
     using T = real_of<TypeParam>;
@@ -122,15 +115,14 @@ TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialAndExpandBack) {
             ASSERT_TRUE(has_shape(v.get(), degree, 1, 1));
             for (int i = 0; i < degree; ++i) {
                 const LC z(v[2 * i], v[2 * i + 1]);
-                // Each root comes from a deflated polynomial, so earlier
-                // deflations' rounding adds up; clusters take the most.
+                // Each root comes from a deflated polynomial, so earlier deflations' rounding adds up; clusters take
+                // the most.
                 EXPECT_LT(relative_residual(a, z), 256 * degree * eps) << "kind " << kind << ", degree " << degree << ", root " << z;
                 // sorted by power first
                 EXPECT_TRUE(i == 0 || std::norm(LC(v[2 * i - 2], v[2 * i - 1])) <= std::norm(z) * (1 + 4 * eps));
             }
             // Roots back to coefficients: the monic polynomial, to the size of its terms.
-            ASSERT_EQ(t_pztoc(v.get()), 0);
-            ASSERT_TRUE(has_shape(v.get(), degree + 1, 1, 1));
+            ASSERT_TRUE(t_pztoc(v.get()) == 0 && has_shape(v.get(), degree + 1, 1, 1));
             long double size = 0;
             for (T x : a) size += std::fabs(static_cast<long double>(x / a[degree]));
             for (int k = 0; k <= degree; ++k) {
@@ -163,8 +155,7 @@ TYPED_TEST(Poly, ClosedFormsKeepRealRootsReal) {
         std::vector<T> a = rounded<TypeParam>(expand(r, u(rng) > 0 ? 2.5L : -0.75L));
         a.resize(6, T(0));  // leading zeros lower the degree
         Vec<TypeParam> src(a, false), dst;
-        ASSERT_EQ(t_proots(src.get(), dst.get()), 0);
-        ASSERT_EQ(dst->points, degree);
+        ASSERT_TRUE(t_proots(src.get(), dst.get()) == 0 && dst->points == degree);
         ASSERT_EQ(dst->complex, pairs ? 1 : 0) << "trial " << trial;
         const int w = dst->complex ? 2 : 1;
         for (int i = 0; i < degree; ++i) {
@@ -184,38 +175,28 @@ TYPED_TEST(Poly, ClosedFormsKeepRealRootsReal) {
 
 TYPED_TEST(Poly, FixedCases) {
     using T = real_of<TypeParam>;
-    struct Row {
-        const char* what;
-        std::vector<T> coefficients, roots;
-        int32_t status, complex;
-    };
+    struct Row { const char* what; std::vector<T> coefficients, roots; int32_t status, complex; };
     const Row rows[] = {
-        {"double root below the zero tail", {1, 2, 1, 0, 0, 0}, {-1, -1}, 0, 0},
-        {"constant", {5}, {}, 0, 0},
-        {"empty", {}, {}, 0, 0},
-        {"zero polynomial", {0, 0, 0}, {}, 0, 0},
+        {"double root below the zero tail", {1, 2, 1, 0, 0, 0}, {-1, -1}, 0, 0}, {"constant", {5}, {}, 0, 0},
+        {"empty", {}, {}, 0, 0}, {"zero polynomial", {0, 0, 0}, {}, 0, 0},
         {"seven coefficients", {1, 2, 3, 4, 5, 6, 7}, {}, -1, 0},
         {"x^2 + 1, negative imaginary part first", {1, 0, 1}, {-0.0, -1, -0.0, 1}, 0, 1},
-        {"root at zero", {0, 3, 2}, {-1.5, -0.0}, 0, 0},
-        {"exact quadratic", {2, -3, 1}, {1, 2}, 0, 0},
+        {"root at zero", {0, 3, 2}, {-1.5, -0.0}, 0, 0}, {"exact quadratic", {2, -3, 1}, {1, 2}, 0, 0},
         {"linear", {3, -4}, {0.75}, 0, 0},
     };
     for (const Row& row : rows) {
         Vec<TypeParam> src(row.coefficients, false), dst;
         ASSERT_EQ(t_proots(src.get(), dst.get()), row.status) << row.what;
         if (row.status) continue;
-        EXPECT_EQ(dst->complex, row.complex) << row.what;
-        EXPECT_TRUE(same_scalars(dst.values(), row.roots)) << row.what;
+        EXPECT_TRUE(dst->complex == row.complex && same_scalars(dst.values(), row.roots)) << row.what;
         // the same in place
         EXPECT_EQ(t_proots(src.get(), src.get()), 0);
         EXPECT_TRUE(same_scalars(src.values(), row.roots)) << row.what;
     }
     Vec<TypeParam> cx({1, 0, 1, 0}, true), out;
-    EXPECT_EQ(t_proots(cx.get(), out.get()), -1);
-    EXPECT_EQ(iproots(cx.get()), -1);
+    EXPECT_TRUE(t_proots(cx.get(), out.get()) == -1 && iproots(cx.get()) == -1);
     Vec<TypeParam> constant{4, 0, 0};
-    EXPECT_EQ(iproots(constant.get()), 0);
-    EXPECT_EQ(constant->points, 0);
+    EXPECT_TRUE(iproots(constant.get()) == 0 && constant->points == 0);
     Vec<TypeParam> list{1, 2}, none;
     ASSERT_EQ(t_pztoc(list.get()), 0);
     EXPECT_TRUE(same_scalars(list.values(), {2, -3, 1}));
@@ -226,22 +207,16 @@ TYPED_TEST(Poly, FixedCases) {
 TYPED_TEST(Poly, SingleRootSearches) {
     using T = real_of<TypeParam>;
     Vec<TypeParam> empty, constant{5}, zero{0}, unit_circle{1, 0, 1}, origin{0, 1, 1}, dst;
-    EXPECT_EQ(t_peval(empty.get(), dst.get(), T(3)), 0);
-    EXPECT_TRUE(same_scalars(dst.values(), {0}));
-    EXPECT_EQ(t_psolve(empty.get(), dst.get(), T(3)), 0);
-    EXPECT_TRUE(same_scalars(dst.values(), {0}));
-    EXPECT_EQ(t_pcsolve(empty.get(), dst.get(), T(3), T(1)), 0);
-    EXPECT_EQ(dst->complex, 0);
-    EXPECT_EQ(dst[0], T(0));
+    EXPECT_TRUE(t_peval(empty.get(), dst.get(), T(3)) == 0 && same_scalars(dst.values(), {0}));
+    EXPECT_TRUE(t_psolve(empty.get(), dst.get(), T(3)) == 0 && same_scalars(dst.values(), {0}));
+    EXPECT_TRUE(t_pcsolve(empty.get(), dst.get(), T(3), T(1)) == 0 && dst->complex == 0 && dst[0] == T(0));
     EXPECT_EQ(t_psolve(constant.get(), dst.get(), T(0)), -1);
     EXPECT_EQ(t_pcsolve(constant.get(), dst.get(), T(0), T(0)), -1);
     // the zero polynomial passes at once, from the start moved onto the bound 1
-    EXPECT_EQ(t_psolve(zero.get(), dst.get(), T(7)), 0);
-    EXPECT_EQ(dst[0], T(1));
+    EXPECT_TRUE(t_psolve(zero.get(), dst.get(), T(7)) == 0 && dst[0] == T(1));
     EXPECT_EQ(t_psolve(unit_circle.get(), dst.get(), T(0)), -1);
     ASSERT_EQ(t_pcsolve(unit_circle.get(), dst.get(), T(0), T(0)), 0);
-    EXPECT_EQ(dst->complex, 1);
-    EXPECT_TRUE(near(std::fabs(dst[1]), 1, 4 * std::numeric_limits<T>::epsilon()));
+    EXPECT_TRUE(dst->complex == 1 && near(std::fabs(dst[1]), 1, 4 * std::numeric_limits<T>::epsilon()));
     EXPECT_TRUE(near(dst[0], 0, 4 * std::numeric_limits<T>::epsilon()));
     // constant term 0: always classed real
     ASSERT_EQ(t_pcsolve(origin.get(), dst.get(), T(0.3), T(0.7)), 0);
@@ -256,8 +231,7 @@ TYPED_TEST(Poly, SingleRootSearches) {
             EXPECT_TRUE(z.imag() != 0 || (lo <= z.real() && z.real() <= hi)) << z;
         ASSERT_EQ(t_psolve(v.get(), v.get(), T(0.25)), 0) << degree;
         ASSERT_TRUE(has_shape(v.get(), 1, 0, 1));
-        EXPECT_LT(relative_residual(a, LC(v[0])), 64 * degree * eps);
-        EXPECT_TRUE(v[0] >= lo && v[0] <= hi);
+        EXPECT_TRUE(relative_residual(a, LC(v[0])) < (64 * degree * eps) && (v[0] >= lo && v[0] <= hi));
     }
 }
 
@@ -281,9 +255,7 @@ TYPED_TEST(Poly, AllocationFailure) {
     using T = real_of<TypeParam>;
     Vec<TypeParam> quartic{1, 0, 0, 0, 1}, dst, list{1, 2, 3}, coefficients{2, -3, 1};
     FailingAlloc<TypeParam> failing;
-    EXPECT_EQ(t_proots(quartic.get(), dst.get()), -1);
-    EXPECT_EQ(t_pcsolve(quartic.get(), dst.get(), T(0), T(0)), -1);
-    EXPECT_EQ(t_peval(quartic.get(), dst.get(), T(0)), -1);
-    EXPECT_LT(t_pztoc(list.get()), 0);
+    EXPECT_TRUE(t_proots(quartic.get(), dst.get()) == -1 && t_pcsolve(quartic.get(), dst.get(), T(0), T(0)) == -1);
+    EXPECT_TRUE(t_peval(quartic.get(), dst.get(), T(0)) == -1 && t_pztoc(list.get()) < 0);
     EXPECT_LT(iproots(coefficients.get()), 0);
 }

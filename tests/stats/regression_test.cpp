@@ -1,5 +1,5 @@
-// Regression: the twenty-number record against the closed-form least squares
-// in long double, and the settled results of degenerate vectors.
+// Regression: the twenty-number record against the closed-form least squares in long double, and the settled results
+// of degenerate vectors.
 #include "stats_support.hpp"
 
 using namespace vlxtest;
@@ -33,12 +33,10 @@ std::vector<LD> reference(const std::vector<LD>& x, const std::vector<LD>& y) {
 
 }  // namespace
 
-template <class V>
-class Regression : public ::testing::Test {};
-TYPED_TEST_SUITE(Regression, Families);
+VLX_TYPED_SUITE(Regression);
 
-// Real vectors (one crossing the 2048-point block, where x starts again at 0)
-// and a complex scatter far from the origin, against the long double fit.
+// Real vectors (one crossing the 2048-point block, where x starts again at 0) and a complex scatter far from the
+// origin, against the long double fit.
 TYPED_TEST(Regression, MatchesLeastSquares) {
     using T = real_of<TypeParam>;
     const LD tol = is_double<TypeParam> ? 1e-9L : 3e-3L;
@@ -58,8 +56,7 @@ TYPED_TEST(Regression, MatchesLeastSquares) {
         }
         Vec<TypeParam> src(in, cx), dst;
         src->delta = T(0.25);  // the record's x comes from delta
-        ASSERT_EQ(t_lin_regres2(src.get(), dst.get()), 0);
-        ASSERT_TRUE(has_shape(dst.get(), 20, 0, 1.0));
+        ASSERT_TRUE(t_lin_regres2(src.get(), dst.get()) == 0 && has_shape(dst.get(), 20, 0, 1.0));
         const std::vector<LD> want = reference(xs, ys);
         for (int k = 0; k < 20; ++k)
             EXPECT_TRUE(near(dst[k], want[k], tol * (std::fabs(want[k]) + 1e-3L))) << "n " << n << " entry " << k;

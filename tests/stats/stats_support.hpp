@@ -12,19 +12,9 @@ VLX_TWIN(s, pop_stddev) VLX_TWIN(s, samp_stddev) VLX_TWIN(s, skew) VLX_TWIN(s, e
 VLX_TWIN(s, hmean) VLX_TWIN(s, min) VLX_TWIN(s, max) VLX_TWIN(s, median) VLX_TWIN(s, hist) VLX_TWIN(s, peak)
 VLX_TEST_TWIN(t_sort, vlxi_sort, vlxfi_sort)
 
-// The family's saturation bound.
-template <class V>
-constexpr real_of<V> bound_of() {
-    return is_double<V> ? real_of<V>(1e100) : real_of<V>(1e15f);
-}
-
 // A statistic of src as (status, re, im, complex flag of the result).
 template <class V>
-struct StatResult {
-    int32_t status;
-    real_of<V> re, im;
-    int32_t complex;
-};
+struct StatResult { int32_t status; real_of<V> re, im; int32_t complex; };
 
 template <class V, class Fn>
 StatResult<V> stat(Fn fn, Vec<V>& src) {

@@ -1,24 +1,20 @@
-// Analytic signal and Hilbert transform: tones turn cos into sin, DC and
-// Nyquist have no quadrature part, and the short lengths keep their shape.
+// Analytic signal and Hilbert transform: tones turn cos into sin, DC and Nyquist have no quadrature part, and the
+// short lengths keep their shape.
 #include "fft_reference.hpp"
 
 using namespace vlxtest;
 
 namespace {
 
-VLX_TEST_TWIN(t_analytic, vlxi_analytic, vlxfi_analytic)
-VLX_TEST_TWIN(t_hilbert, vlxi_hilbert, vlxfi_hilbert)
+VLX_TEST_TWIN(t_analytic, vlxi_analytic, vlxfi_analytic) VLX_TEST_TWIN(t_hilbert, vlxi_hilbert, vlxfi_hilbert)
 
-template <class V>
-class AnalyticTest : public ::testing::Test {};
-TYPED_TEST_SUITE(AnalyticTest, Families);
+VLX_TYPED_SUITE(AnalyticTest);
 
 }  // namespace
 
-// x = a cos(w i) + DC + Nyquist (even N): the analytic signal is x + j a
-// sin(w i), the Hilbert transform a sin(w i), for real input and for complex
-// input with zero imaginary parts.  Tolerance as for the transforms of any
-// length up to L = 1024.
+// x = a cos(w i) + DC + Nyquist (even N): the analytic signal is x + j a sin(w i), the Hilbert transform a sin(w i),
+// for real input and for complex input with zero imaginary parts.  Tolerance as for the transforms of any length up
+// to L = 1024.
 TYPED_TEST(AnalyticTest, TonesAndEdgeBins) {
     using T = real_of<TypeParam>;
     const double tol = 2 * fftref::transform_tolerance(std::numeric_limits<T>::epsilon(), 10);
@@ -33,9 +29,7 @@ TYPED_TEST(AnalyticTest, TonesAndEdgeBins) {
             }
             for (bool cplx : {false, true}) {
                 Vec<TypeParam> a(cplx ? c : x, cplx), h(cplx ? c : x, cplx);
-                ASSERT_EQ(t_analytic(&a), 0);
-                ASSERT_EQ(t_hilbert(&h), 0);
-                ASSERT_EQ(a->complex, 1);
+                ASSERT_TRUE(t_analytic(&a) == 0 && t_hilbert(&h) == 0 && a->complex == 1);
                 ASSERT_EQ(h->complex, cplx ? 1 : 0);
                 for (int32_t i = 0; i < n; ++i) {
                     ASSERT_TRUE(near(a[2 * i], x[i], tol) && near(a[2 * i + 1], s[i], tol)) << n << " " << bin << " " << i;
@@ -49,19 +43,17 @@ TYPED_TEST(AnalyticTest, TonesAndEdgeBins) {
 TYPED_TEST(AnalyticTest, ShortLengths) {
     using T = real_of<TypeParam>;
     Vec<TypeParam> a({1, 0, -1, 0}), h({1, 0, -1, 0}), two({3, -1});
-    ASSERT_EQ(t_analytic(&a), 0);
-    ASSERT_EQ(t_hilbert(&h), 0);
+    ASSERT_TRUE(t_analytic(&a) == 0 && t_hilbert(&h) == 0);
     ASSERT_EQ(t_analytic(&two), 0);  // both bins kept as they are
     const std::vector<T> want_a = {1, 0, 0, 1, -1, 0, 0, -1}, want_h = {0, 1, 0, -1}, want_two = {3, 0, -1, 0};
     for (size_t i = 0; i < 8; ++i) EXPECT_TRUE(near(a[i], want_a[i], 1e-6)) << i;
     for (size_t i = 0; i < 4; ++i) EXPECT_TRUE(near(h[i], want_h[i], 1e-6) && near(two[i], want_two[i], 1e-6)) << i;
 
-    // One real sample in a one-scalar block: the analytic signal keeps it
-    // (and delta), the Hilbert transform zeroes it in place and stays real.
+    // One real sample in a one-scalar block: the analytic signal keeps it (and delta), the Hilbert transform zeroes
+    // it in place and stays real.
     Vec<TypeParam> one({5}), zero({5});
     one->delta = T(4);
-    ASSERT_EQ(t_analytic(&one), 0);
-    ASSERT_EQ(t_hilbert(&zero), 0);
+    ASSERT_TRUE(t_analytic(&one) == 0 && t_hilbert(&zero) == 0);
     EXPECT_TRUE(one->complex == 0 && same_bits(one[0], T(5)) && same_bits(one->delta, T(4)));
     EXPECT_TRUE(zero->complex == 0 && same_bits(zero[0], T(0)));
 }

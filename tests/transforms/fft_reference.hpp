@@ -1,6 +1,5 @@
-// References for the power-of-two transforms: a literal stage-by-stage
-// split-radix engine (the bit-exactness yardstick for the library's reordered
-// engine), and long-double transforms for accuracy.
+// References for the power-of-two transforms: a literal stage-by-stage split-radix engine (the bit-exactness
+// yardstick for the library's reordered engine), and long-double transforms for accuracy.
 #pragma once
 
 #include "vlx_test.hpp"
@@ -13,12 +12,9 @@
 
 namespace fftref {
 
-VLX_TEST_TWIN(t_fft, vlxi_fft, vlxfi_fft)
-VLX_TEST_TWIN(t_rfft, vlxi_rfft, vlxfi_rfft)
-VLX_TEST_TWIN(t_irfft, vlxi_irfft, vlxfi_irfft)
-VLX_TEST_TWIN(t_orecon, vlxi_orecon, vlxfi_orecon)
-VLX_TEST_TWIN(t_recon, vlxi_recon, vlxfi_recon)
-VLX_TEST_TWIN(t_bitrev, vlxi_bitrev, vlxfi_bitrev)
+VLX_TEST_TWIN(t_fft, vlxi_fft, vlxfi_fft) VLX_TEST_TWIN(t_rfft, vlxi_rfft, vlxfi_rfft)
+VLX_TEST_TWIN(t_irfft, vlxi_irfft, vlxfi_irfft) VLX_TEST_TWIN(t_orecon, vlxi_orecon, vlxfi_orecon)
+VLX_TEST_TWIN(t_recon, vlxi_recon, vlxfi_recon) VLX_TEST_TWIN(t_bitrev, vlxi_bitrev, vlxfi_bitrev)
 VLX_TEST_TWIN(t_bitrev_scale, vlxi_bitrev_scale, vlxfi_bitrev_scale)
 
 inline int log2i(size_t n) {
@@ -33,8 +29,8 @@ inline size_t reverse_index(size_t i, int bits) {
     return r;
 }
 
-// The twiddle table, step by step as the recipe reads: recurrence with
-// restarts after every 256 entries, pi/4 constants, reflected 3-theta triples.
+// The twiddle table, step by step as the recipe reads: recurrence with restarts after every 256 entries, pi/4
+// constants, reflected 3-theta triples.
 template <class T>
 std::vector<T> literal_table(size_t n) {
     constexpr bool dbl = std::is_same_v<T, double>;
@@ -82,60 +78,41 @@ std::vector<T> literal_table(size_t n) {
     return t;
 }
 
-// The complex engine, stage by stage with the level walk, closing pass, then
-// reordering (times 1/N forward).  x holds n interleaved points, n >= 4.
+// The engines' blocks by recursion.  A block depends only on its parent (complex) or its children (real), so any such
+// order gives the bits of the library's stage-by-stage level walk.
+template <class T>
+void literal_block(T* x, size_t len, size_t n, const std::vector<T>& t, bool inverse) {
+    auto rot = [inverse](T& re, T& im, const T* tri) {
+        const T mm = (re + im) * tri[0];
+        const T nr = inverse ? mm + tri[1] * im : mm + tri[2] * im, ni = inverse ? mm + tri[2] * re : mm + tri[1] * re;
+        re = nr, im = ni;
+    };
+    if (len == 2) {  // the closing pass
+        const T r = x[0], i = x[1];
+        x[0] = r + x[2], x[1] = i + x[3], x[2] = r - x[2], x[3] = i - x[3];
+    }
+    if (len < 4) return;
+    const size_t q = len / 4;
+    for (size_t k = 0; k < q; ++k) {  // the L-shaped butterfly, then the half and the two quarters
+        T *a0 = x + 2 * k, *a1 = a0 + 2 * q, *a2 = a0 + 4 * q, *a3 = a0 + 6 * q;
+        const T ur = a0[0] - a2[0], ui = a0[1] - a2[1], wr = a1[0] - a3[0], wi = a1[1] - a3[1];
+        a0[0] = a0[0] + a2[0], a0[1] = a0[1] + a2[1], a1[0] = a1[0] + a3[0], a1[1] = a1[1] + a3[1];
+        T z1r = inverse ? ur - wi : ur + wi, z1i = inverse ? ui + wr : ui - wr;
+        T z3r = inverse ? ur + wi : ur - wi, z3i = inverse ? ui - wr : ui + wr;
+        if (k > 0) rot(z1r, z1i, &t[6 * k * (n / len)]), rot(z3r, z3i, &t[6 * k * (n / len) + 3]);
+        a2[0] = z1r, a2[1] = z1i, a3[0] = z3r, a3[1] = z3i;
+    }
+    literal_block(x, 2 * q, n, t, inverse);
+    literal_block(x + 4 * q, q, n, t, inverse);
+    literal_block(x + 6 * q, q, n, t, inverse);
+}
+
+// The complex engine (n >= 4 interleaved points): the blocks, then the reordering (times 1/N forward).
 template <class T>
 void literal_fft(std::vector<T>& x, bool inverse) {
     const size_t n = x.size() / 2;
     const int m = log2i(n);
-    const std::vector<T> t = literal_table<T>(n);
-    auto rot = [&](T& re, T& im, const T* tri) {
-        const T mm = (re + im) * tri[0];
-        const T nr = inverse ? mm + tri[1] * im : mm + tri[2] * im;
-        const T ni = inverse ? mm + tri[2] * re : mm + tri[1] * re;
-        re = nr, im = ni;
-    };
-    for (int s = 0; s <= m - 2; ++s) {
-        const size_t q = n >> (s + 2);
-        size_t pos = 0, spacing = 8, c = ((size_t(1) << s) + 1) / 2;
-        while (c > 0) {
-            for (size_t b = 0; b < c; ++b) {
-                const size_t p = (pos + b * spacing) * q;
-                for (size_t k = 0; k < q; ++k) {
-                    T* a0 = &x[2 * (p + k)];
-                    T* a1 = &x[2 * (p + k + q)];
-                    T* a2 = &x[2 * (p + k + 2 * q)];
-                    T* a3 = &x[2 * (p + k + 3 * q)];
-                    const T ur = a0[0] - a2[0], ui = a0[1] - a2[1];
-                    const T wr = a1[0] - a3[0], wi = a1[1] - a3[1];
-                    a0[0] = a0[0] + a2[0], a0[1] = a0[1] + a2[1];
-                    a1[0] = a1[0] + a3[0], a1[1] = a1[1] + a3[1];
-                    T z1r, z1i, z3r, z3i;
-                    if (!inverse) {
-                        z1r = ur + wi, z1i = ui - wr, z3r = ur - wi, z3i = ui + wr;
-                    } else {
-                        z1r = ur - wi, z1i = ui + wr, z3r = ur + wi, z3i = ui - wr;
-                    }
-                    if (k > 0) {
-                        const T* pair = &t[6 * (k << s)];
-                        rot(z1r, z1i, pair);
-                        rot(z3r, z3i, pair + 3);
-                    }
-                    a2[0] = z1r, a2[1] = z1i, a3[0] = z3r, a3[1] = z3i;
-                }
-            }
-            pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4;
-        }
-    }
-    size_t pos = 0, spacing = 4, c = ((size_t(1) << (m - 1)) + 1) / 2;
-    while (c > 0) {
-        for (size_t b = 0; b < c; ++b) {
-            T* a = &x[2 * (pos + b * spacing)];
-            const T r = a[0], i = a[1];
-            a[0] = r + a[2], a[1] = i + a[3], a[2] = r - a[2], a[3] = i - a[3];
-        }
-        pos = 4 * pos + 6, spacing *= 4, c = (c + 2) / 4;
-    }
+    literal_block(x.data(), n, n, literal_table<T>(n), inverse);
     std::vector<T> y(x.size());
     const T f = T(1) / T(n);
     for (size_t i = 0; i < n; ++i) {
@@ -146,82 +123,64 @@ void literal_fft(std::vector<T>& x, bool inverse) {
     x = y;
 }
 
-// The real engine as the recipe reads, on n real samples (n >= 4): scaled
-// reversal, two-point pass, stages of blocks by levels; n/2 + 1 bins out.
+// A block of the real engine at point p of x (real parts in place, 4h points), after its half and quarters.
+template <class T>
+void literal_real_block(std::vector<T>& x, size_t p, size_t len, size_t n, const std::vector<T>& t) {
+    auto re = [&](size_t i) -> T& { return x[2 * i]; };
+    auto im = [&](size_t i) -> T& { return x[2 * i + 1]; };
+    if (len == 2) {  // the two-point pass
+        const T a = re(p), b = re(p + 1);
+        re(p) = a + b, re(p + 1) = a - b;
+    }
+    if (len < 4) return;
+    const size_t h = len / 4;
+    literal_real_block(x, p, 2 * h, n, t);
+    literal_real_block(x, p + 2 * h, h, n, t);
+    literal_real_block(x, p + 3 * h, h, n, t);
+    const T x0 = re(p), x2 = re(p + 2 * h), x3 = re(p + 3 * h), tt = x3 + x2;
+    re(p) = x0 + tt, re(p + 2 * h) = x0 - tt, im(p + h) = x3 - x2;
+    for (size_t k = 1; k < h / 2; ++k) {
+        const T* pr = &t[6 * (k * (n / len))];
+        T m1 = (re(p + 2 * h + k) + im(p + 2 * h + k)) * pr[0];
+        const T w1r = m1 + pr[2] * im(p + 2 * h + k), w1i = m1 + pr[1] * re(p + 2 * h + k);
+        T m3 = (re(p + 3 * h + k) + im(p + 3 * h + k)) * pr[3];
+        const T w3r = m3 + pr[5] * im(p + 3 * h + k), w3i = m3 + pr[4] * re(p + 3 * h + k);
+        const T sr = w1r + w3r, si = w1i + w3i, dr = w3r - w1r, di = w3i - w1i;
+        const T e1r = re(p + k), e1i = im(p + k), e2r = re(p + h - k), e2i = im(p + h - k);
+        re(p + k) = e1r + sr, im(p + k) = e1i + si;
+        re(p + 2 * h - k) = e1r - sr, im(p + 2 * h - k) = si - e1i;
+        re(p + h - k) = e2r + di, im(p + h - k) = dr + e2i;
+        re(p + h + k) = e2r - di, im(p + h + k) = dr - e2i;
+    }
+    if (h > 1) {
+        const T r = std::is_same_v<T, double> ? T(0.7071067811865476) : T(0.70710677f);
+        const size_t k = h / 2;
+        const T u = -r * re(p + 3 * h + k), v = r * re(p + 2 * h + k), er = re(p + k), ei = im(p + k);
+        re(p + k) = er + (u + v), im(p + k) = (u - v) + ei;
+        re(p + h + k) = er - (u + v), im(p + h + k) = (u - v) - ei;
+    }
+}
+
+// The real engine on n real samples (n >= 4): scaled reversal, then the blocks; n/2 + 1 bins out.
 template <class T>
 std::vector<T> literal_rfft(const std::vector<T>& in) {
     const size_t n = in.size();
-    const int m = log2i(n);
-    const std::vector<T> t = literal_table<T>(n);
-    const T r = std::is_same_v<T, double> ? T(0.7071067811865476) : T(0.70710677f);
     std::vector<T> x(2 * n, T(0));
-    for (size_t i = 0; i < n; ++i) x[2 * reverse_index(i, m)] = in[i] * (T(1) / T(n));
-    for (size_t pos = 0, sp = 4, c = (n + 2) / 4; c > 0; pos = 4 * pos + 6, sp *= 4, c = (c + 2) / 4)
-        for (size_t b = 0, p = pos; b < c; ++b, p += sp) {
-            const T a = x[2 * p], bb = x[2 * p + 2];
-            x[2 * p] = a + bb, x[2 * p + 2] = a - bb;
-        }
-    auto re = [&](size_t i) -> T& { return x[2 * i]; };
-    auto im = [&](size_t i) -> T& { return x[2 * i + 1]; };
-    for (int s = 0; s <= m - 2; ++s) {
-        const size_t h = size_t(1) << s, len = 4 * h;
-        for (size_t pos = 0, sp = 8, c = (n / len + 1) / 2; c > 0; pos = 4 * pos + 12, sp *= 4, c = (c + 2) / 4)
-            for (size_t b = 0; b < c; ++b) {
-                const size_t p = (pos + b * sp) * h;
-                const T x0 = re(p), x2 = re(p + 2 * h), x3 = re(p + 3 * h), tt = x3 + x2;
-                re(p) = x0 + tt, re(p + 2 * h) = x0 - tt, im(p + h) = x3 - x2;
-                for (size_t k = 1; k < h / 2; ++k) {
-                    const T* pr = &t[6 * (k * (n / len))];
-                    T m1 = (re(p + 2 * h + k) + im(p + 2 * h + k)) * pr[0];
-                    const T w1r = m1 + pr[2] * im(p + 2 * h + k), w1i = m1 + pr[1] * re(p + 2 * h + k);
-                    T m3 = (re(p + 3 * h + k) + im(p + 3 * h + k)) * pr[3];
-                    const T w3r = m3 + pr[5] * im(p + 3 * h + k), w3i = m3 + pr[4] * re(p + 3 * h + k);
-                    const T sr = w1r + w3r, si = w1i + w3i, dr = w3r - w1r, di = w3i - w1i;
-                    const T e1r = re(p + k), e1i = im(p + k), e2r = re(p + h - k), e2i = im(p + h - k);
-                    re(p + k) = e1r + sr, im(p + k) = e1i + si;
-                    re(p + 2 * h - k) = e1r - sr, im(p + 2 * h - k) = si - e1i;
-                    re(p + h - k) = e2r + di, im(p + h - k) = dr + e2i;
-                    re(p + h + k) = e2r - di, im(p + h + k) = dr - e2i;
-                }
-                if (s > 0) {
-                    const size_t k = h / 2;
-                    const T u = -r * re(p + 3 * h + k), v = r * re(p + 2 * h + k);
-                    const T er = re(p + k), ei = im(p + k);
-                    re(p + k) = er + (u + v), im(p + k) = (u - v) + ei;
-                    re(p + h + k) = er - (u + v), im(p + h + k) = (u - v) - ei;
-                }
-            }
-    }
+    for (size_t i = 0; i < n; ++i) x[2 * reverse_index(i, log2i(n))] = in[i] * (T(1) / T(n));
+    literal_real_block(x, 0, n, n, literal_table<T>(n));
     x.resize(n + 2);
     return x;
 }
 
 using cld = std::complex<long double>;
 
-// Unscaled long-double sum with exp(sign j 2 pi n k / N): naive for small or
-// odd n, exact-twiddle radix 2 above (checked against the naive sum).
-inline std::vector<cld> exact_sum(const std::vector<cld>& x, long double sign, bool force_naive = false) {
+// Unscaled long-double sum with exp(sign j 2 pi n k / N), naive.
+inline std::vector<cld> exact_sum(const std::vector<cld>& x, long double sign) {
     const size_t n = x.size();
-    const long double two_pi = 6.283185307179586476925286766559L;
-    std::vector<cld> y(n);
-    if (n <= 1024 || force_naive || n % 2 != 0) {
-        std::vector<cld> w(n);
-        for (size_t k = 0; k < n; ++k) w[k] = std::polar(1.0L, sign * two_pi * k / n);
-        for (size_t k = 0; k < n; ++k) {
-            cld acc = 0;
-            for (size_t j = 0; j < n; ++j) acc += x[j] * w[(j * k) % n];
-            y[k] = acc;
-        }
-        return y;
-    }
-    std::vector<cld> even(n / 2), odd(n / 2);
-    for (size_t j = 0; j < n / 2; ++j) even[j] = x[2 * j], odd[j] = x[2 * j + 1];
-    const std::vector<cld> e = exact_sum(even, sign), o = exact_sum(odd, sign);
-    for (size_t k = 0; k < n / 2; ++k) {
-        const cld tw = std::polar(1.0L, sign * two_pi * k / n) * o[k];
-        y[k] = e[k] + tw;
-        y[k + n / 2] = e[k] - tw;
-    }
+    std::vector<cld> w(n), y(n);
+    for (size_t k = 0; k < n; ++k) w[k] = std::polar(1.0L, sign * 6.283185307179586476925286766559L * k / n);
+    for (size_t k = 0; k < n; ++k)
+        for (size_t j = 0; j < n; ++j) y[k] += x[j] * w[(j * k) % n];
     return y;
 }
 
@@ -233,10 +192,9 @@ inline std::vector<cld> exact_dft(const std::vector<cld>& x, bool inverse) {
     return y;
 }
 
-// Error bound of a transform of 2^m points against long double.  The
-// butterflies alone stay within a few eps sqrt(m), but the twiddle tables
-// come from a recurrence restarted only every 256 steps, whose rounding grows
-// along a run: up to about one eps per step in the table values.
+// Error bound of a transform of 2^m points against long double.  The butterflies alone stay within a few eps sqrt(m),
+// but the twiddle tables come from a recurrence restarted only every 256 steps, whose rounding grows along a run: up
+// to about one eps per step in the table values.
 inline double transform_tolerance(double eps, int m) {
     const double steps = m >= 3 ? std::min(double(size_t(1) << (m - 3)), 256.0) : 0.0;
     return eps * (4 * std::sqrt(std::max(1.0, double(m))) + steps);

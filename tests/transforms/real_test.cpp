@@ -9,9 +9,7 @@ using namespace fftref;
 
 namespace {
 
-template <class V>
-class RealFft : public ::testing::Test {};
-TYPED_TEST_SUITE(RealFft, Families);
+VLX_TYPED_SUITE(RealFft);
 
 // The vectorised engine against the literal recipe, bit for bit.
 TYPED_TEST(RealFft, MatchesLiteralEngineBitForBit) {
@@ -20,68 +18,44 @@ TYPED_TEST(RealFft, MatchesLiteralEngineBitForBit) {
         const std::vector<T> in = random_values<T>(size_t(1) << m, 300 + m);
         const std::vector<T> want = literal_rfft(in);
         Vec<TypeParam> v(in, false);
-        ASSERT_EQ(t_rfft(&v), 0);
-        ASSERT_EQ(v.scalars(), int64_t(want.size()));
+        ASSERT_TRUE(t_rfft(&v) == 0 && v.scalars() == int64_t(want.size()));
         size_t mismatches = 0;
         for (size_t i = 0; i < want.size(); ++i) mismatches += !same_bits(v[int64_t(i)], want[i]);
         EXPECT_EQ(mismatches, 0u) << "n = " << in.size();
     }
 }
 
-// The half spectrum against long double, and against the complex engine on
-// the same data; then the inverse brings the samples back.
+// The half spectrum against long double; the inverse brings the samples back.
 TYPED_TEST(RealFft, AccuracyAndRoundTrip) {
     using T = real_of<TypeParam>;
-    const double eps = std::numeric_limits<T>::epsilon();
-    for (int m = 0; m <= 16; ++m) {
+    for (int m = 0; m <= 12; ++m) {
         const size_t n = size_t(1) << m;
         const std::vector<T> in = random_values<T>(n, 40 + m);
-        std::vector<cld> x(n);
-        for (size_t k = 0; k < n; ++k) x[k] = in[k];
-        const std::vector<cld> want = exact_dft(x, false);
-        const double tol = transform_tolerance(eps, m);
-
-        Vec<TypeParam> v(in, false), c(in, false);
+        std::vector<cld> x(in.begin(), in.end());
+        std::vector<T> back(2 * n, T(0));  // the samples as complex, to measure the round trip
+        const double tol = transform_tolerance(std::numeric_limits<T>::epsilon(), m);
+        Vec<TypeParam> v(in, false);
         ASSERT_EQ(t_rfft(&v), 0);
         if (n == 1) {
-            EXPECT_EQ(v->complex, 0);
-            EXPECT_EQ(v.values(), in);
+            EXPECT_TRUE(v->complex == 0 && v.values() == in);
             continue;
         }
-        ASSERT_EQ(v->points, int32_t(n / 2 + 1));
-        ASSERT_EQ(v->complex, 1);
-        const std::vector<cld> half(want.begin(), want.begin() + n / 2 + 1);
-        EXPECT_LE(double(rel_l2(v.get()->data, half, n / 2 + 1)), tol) << "n = " << n;
-        EXPECT_EQ(v[1], T(0));  // bin 0 is real
-        EXPECT_EQ(v[int64_t(n) + 1], T(0));  // and so is the Nyquist bin
-
-        ASSERT_EQ(t_fft(&c, 0), 0);
-        std::vector<cld> from_complex(n / 2 + 1);
-        for (size_t k = 0; k <= n / 2; ++k) from_complex[k] = cld(c[2 * k], c[2 * k + 1]);
-        EXPECT_LE(double(rel_l2(v.get()->data, from_complex, n / 2 + 1)), 2 * tol) << "n = " << n;
-
+        ASSERT_TRUE(has_shape(v.get(), int32_t(n / 2 + 1), 1, 1.0 / n));
+        const std::vector<cld> want = exact_dft(x, false);
+        EXPECT_LE(double(rel_l2(v.get()->data, std::vector<cld>(want.begin(), want.begin() + n / 2 + 1), n / 2 + 1)), tol) << n;
+        EXPECT_TRUE(v[1] == T(0) && v[int64_t(n) + 1] == T(0));  // bins 0 and N/2 are real
         v->delta = T(0.125);
-        ASSERT_EQ(t_irfft(&v), 0);
-        ASSERT_EQ(v->points, int32_t(n));
-        ASSERT_EQ(v->complex, 0);
-        EXPECT_EQ(v->delta, T(1) / (T(n) * T(0.125)));
-        std::vector<cld> back(n);
-        std::vector<T> interleaved(2 * n);
-        for (size_t k = 0; k < n; ++k) interleaved[2 * k] = v[k], interleaved[2 * k + 1] = 0;
-        for (size_t k = 0; k < n; ++k) back[k] = in[k];
-        EXPECT_LE(double(rel_l2(interleaved.data(), back, n)), 3 * tol) << "n = " << n;
+        ASSERT_TRUE(t_irfft(&v) == 0 && has_shape(v.get(), int32_t(n), 0, 1 / (double(n) * 0.125)));
+        for (size_t k = 0; k < n; ++k) back[2 * k] = v[k];
+        EXPECT_LE(double(rel_l2(back.data(), x, n)), 3 * tol) << "n = " << n;
     }
 }
 
 TYPED_TEST(RealFft, ExactSmallLengths) {
     using T = real_of<TypeParam>;
-    struct Case {
-        std::vector<T> in;
-        std::vector<T> out;
-    };
+    struct Case { std::vector<T> in; std::vector<T> out; };
     const Case cases[] = {
-        {{1, 3}, {2, 0, -1, 0}},
-        {{1, 2, 3, 4}, {2.5, 0, -0.5, 0.5, -0.5, 0}},
+        {{1, 3}, {2, 0, -1, 0}}, {{1, 2, 3, 4}, {2.5, 0, -0.5, 0.5, -0.5, 0}},
         {{1, 1, 1, 1, 1, 1, 1, 1}, {1, 0, 0, 0, 0, 0, 0, 0, 0, 0}},
         {{8, 0, 0, 0, 0, 0, 0, 0}, {1, 0, 1, 0, 1, 0, 1, 0, 1, 0}},
     };
@@ -89,40 +63,26 @@ TYPED_TEST(RealFft, ExactSmallLengths) {
         Vec<TypeParam> v(c.in, false);
         v->delta = T(0);
         ASSERT_EQ(t_rfft(&v), 0);
-        EXPECT_EQ(v->complex, 1);
-        EXPECT_EQ(v.values(), c.out);
-        EXPECT_EQ(v->delta, is_double<TypeParam> ? T(1e100) : T(999999986991104.0f));
+        EXPECT_TRUE((v->complex == 1 && v.values() == c.out) && v->delta == bound_of<TypeParam>());
     }
-    // A vector with room for its 8 real samples grows to the 16 scalars the
-    // transform works in, although only 5 points remain.
+    // A vector with room for its 8 real samples grows to the 16 scalars the transform works in, although only 5
+    // points remain.
     Vec<TypeParam> v(random_values<T>(8, 2), false);
-    ASSERT_EQ(v->alloc, 8);
-    ASSERT_EQ(t_rfft(&v), 0);
-    EXPECT_EQ(v->alloc, 16);
-    EXPECT_EQ(v->points, 5);
+    ASSERT_TRUE(v->alloc == 8 && t_rfft(&v) == 0);
+    EXPECT_TRUE(v->alloc == 16 && v->points == 5);
 }
 
 TYPED_TEST(RealFft, Rejects) {
     using T = real_of<TypeParam>;
     const std::vector<T> in = random_values<T>(8, 4);
     Vec<TypeParam> cplx(in, true), odd(std::vector<T>(in.begin(), in.begin() + 6), false), empty;
-    EXPECT_EQ(t_rfft(&cplx), -1);
-    EXPECT_EQ(cplx.values(), in);
-    EXPECT_EQ(cplx->points, 4);
-    EXPECT_EQ(t_rfft(&odd), -1);
-    EXPECT_EQ(odd->complex, 0);
-    EXPECT_EQ(odd->points, 6);
-    EXPECT_EQ(t_rfft(&empty), -1);
+    EXPECT_TRUE(t_rfft(&cplx) == -1 && cplx.values() == in && cplx->points == 4);
+    EXPECT_TRUE((t_rfft(&odd) == -1 && odd->complex == 0 && odd->points == 6) && t_rfft(&empty) == -1);
 }
 
 TYPED_TEST(RealFft, Reconstruction) {
     using T = real_of<TypeParam>;
-    struct Case {
-        std::vector<T> in;
-        bool cplx;
-        int odd;
-        std::vector<T> out;
-    };
+    struct Case { std::vector<T> in; bool cplx; int odd; std::vector<T> out; };
     const Case cases[] = {
         {{1, 2, 3, 4}, true, 0, {1, 2, 3, 4}},                  // 2 points: nothing to mirror
         {{1, 2, 3, 4}, true, 1, {1, 2, 3, 4, 3, -4}},           // odd: point 1 mirrored

@@ -8,15 +8,8 @@
 
 namespace vlxtest {
 
-VLX_TWIN(i, window2)
-VLX_TWIN(i, window)
-VLX_TWIN(i, window_cos)
-VLX_TWIN(i, window_kaiser)
-VLX_TWIN(i, window_gauss)
-VLX_TWIN(i, window_sinc)
-VLX_TWIN(i, window_tukey)
-VLX_TWIN(i, window_fir)
-VLX_TWIN(i, swap_halves2)
+VLX_TWIN(i, window2) VLX_TWIN(i, window) VLX_TWIN(i, window_cos) VLX_TWIN(i, window_kaiser) VLX_TWIN(i, window_gauss)
+VLX_TWIN(i, window_sinc) VLX_TWIN(i, window_tukey) VLX_TWIN(i, window_fir) VLX_TWIN(i, swap_halves2)
 VLX_TEST_TWIN(t_synth, vlx_window_synth, vlxf_window_synth)
 VLX_TEST_TWIN(t_cos_sum, vlx_window_cos_sum, vlxf_window_cos_sum)
 
@@ -28,11 +21,6 @@ VLX_METRIC_TWIN(window2_scale)
 VLX_METRIC_TWIN(window_scale)
 VLX_METRIC_TWIN(window_metric)
 #undef VLX_METRIC_TWIN
-
-template <class V>
-inline int32_t t_free_internal() {
-    return is_double<V> ? vlx_free_internal() : vlxf_free_internal();
-}
 
 // Window id with flags on n points, through the synthesis engine.
 template <class V>

@@ -1,6 +1,5 @@
-// Stand-in for the vendor DFT module, built as libmkl_rt.so.2: plain DFTs in
-// the descriptor's precision, a trace of the calls for the tests, and
-// refusals on demand through STANDIN_FAIL ("create", "compute" or "free").
+// Stand-in for the vendor DFT module, built as libmkl_rt.so.2: plain DFTs in the descriptor's precision, a trace of
+// the calls for the tests, and refusals on demand through STANDIN_FAIL ("create", "compute" or "free").
 #include <cmath>
 #include <cstdarg>
 #include <cstdio>
@@ -11,11 +10,7 @@
 
 #define EXPORT extern "C" __attribute__((visibility("default")))
 
-struct Handle {
-    int precision, domain;
-    long n;
-    double scale;
-};
+struct Handle { int precision, domain; long n; double scale; };
 static std::string trace;
 
 // Notes the call; true if the test asked for this operation to be refused.
@@ -25,8 +20,8 @@ static bool refuse(const char* op, const std::string& note) {
     return f != nullptr && std::strcmp(f, op) == 0;
 }
 
-// In place: n complex points, or n real samples to n/2 + 1 complex points;
-// long-double sums, times scale, rounded once.
+// In place: n complex points, or n real samples to n/2 + 1 complex points; long-double sums, times scale, rounded
+// once.
 template <class T>
 static void plain_dft(T* x, long n, bool real_in, bool inverse, long double scale) {
     std::vector<long double> re(n), im(n, 0.0L);
