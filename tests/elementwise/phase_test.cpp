@@ -71,7 +71,8 @@ TYPED_TEST(Phase, FixedCases) {
     const T two_pi = T(6.283185307179586);
     const Row rows[] = {
         {"unwrap", [](auto* v) { return t_unwrap(v); }, {3, -3}, false, 1, {3, T(-3) + two_pi}, 2, 0},
-        {"unwrap from 0", [](auto* v) { return t_unwrap_wnd(v, 2); }, {4}, false, 1, {T(4) - two_pi}, 1, 0},
+        {"unwrap from 0", [](auto* v) { return t_unwrap(v); }, {4}, false, 1, {T(4) - two_pi}, 1, 0},
+        {"unwrap_wnd from 0", [](auto* v) { return t_unwrap_wnd(v, 2); }, {4}, false, 1, {T(4) - two_pi}, 1, 0},
         {"edge", [](auto* v) { return t_edge(v, 1, T(1)); }, {0, 2}, false, 0.5, {0.25}, 1, 0, 1},
         {"edge, one point", [](auto* v) { return t_edge(v, 3, T(1)); }, {5}, false, 0.5, {}, 0, 0, 1},
         {"differ", [](auto* v) { return t_differ(v); }, {1, 3, 6}, false, 0.5, {2, 4, 6}, 3, 0},

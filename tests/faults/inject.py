@@ -102,17 +102,29 @@ FAULTS = [
      "pp = {q.re + static_cast<T>(k * (k + 1)) * a[k], q.im};", "stats", "second derivative weight off by one"),
     ("interp-knot-edge", "src/stats/interp.cpp", "while (k < n - 1 && t >= xs[k]) ++k;",
      "while (k < n - 1 && t > xs[k]) ++k;", "stats", "a step query on a knot takes the segment below"),
+    ("rsmp-skip-out", "src/streaming/rsmp_stream.cpp", "if (k >= 0) coef->skip_out = c + 19;",
+     "if (k >= 0) coef->skip_out = c + 18;", "streaming", "start-up discard of a decimating stream one point short"),
+    ("avg-zero-weight", "src/streaming/avg.cpp", "if (weight >= T(0)) return weight;",
+     "if (weight > T(0)) return weight;", "streaming", "a fixed weight of 0 read as the running mean's"),
+    ("unwrap-first", "src/elementwise/phase.cpp", "T p = T(0);  // the first sample is measured from 0 as well",
+     "T p = n > 0 ? x[0] : T(0);", "elementwise", "unwrapping takes the first sample as its own reference"),
+    ("spline-start-diag", "src/stats/interp.cpp", "w.diag[0] = T(2);", "w.diag[0] = T(3);", "stats",
+     "spline with a given start slope: first diagonal weight changed"),
     # sample files
     ("file-float-digits", "src/fileio/writers.cpp", 'static constexpr const char* line = "%.7g\\n";',
      'static constexpr const char* line = "%.6g\\n";', "fileio", "float text lines written with a digit too few"),
     ("file-swap32", "src/fileio/reader.cpp", "(x >> 24) | ((x >> 8) & 0xFF00u) | ((x << 8) & 0xFF0000u) | (x << 24)",
      "(x >> 24) | ((x << 8) & 0xFF00u) | ((x >> 8) & 0xFF0000u) | (x << 24)", "fileio",
      "byte swap of 32-bit words exchanges the middle bytes wrongly"),
+    ("file-odd-complex", "src/fileio/reader.cpp", "v->data[count] = T(0);", "v->data[count] = T(1);", "fileio",
+     "odd complex text file: the missing imaginary part not zero"),
     # binding of the vendor transform modules
     ("bind-scale-param", "src/core/binding.cpp", "constexpr int dfti_forward_scale = 4;",
      "constexpr int dfti_forward_scale = 5;", "binding", "forward scale set through the wrong parameter"),
     ("bind-precision", "src/core/binding.cpp", "constexpr int dfti_double = 36;", "constexpr int dfti_double = 35;",
      "binding", "double descriptors created in single precision"),
+    ("bind-user-threads", "src/core/binding.cpp", "constexpr int dfti_number_of_user_threads = 26;",
+     "constexpr int dfti_number_of_user_threads = 27;", "binding", "user-thread count set through the wrong parameter"),
 ]
 
 

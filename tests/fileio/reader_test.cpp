@@ -6,9 +6,7 @@
 
 using namespace vlxtest;
 
-template <class V>
-class Reader : public ::testing::Test {};
-TYPED_TEST_SUITE(Reader, Families);
+VLX_TYPED_SUITE(Reader);
 
 namespace {
 

@@ -8,9 +8,7 @@
 
 using namespace vlxtest;
 
-template <class V>
-class Writers : public ::testing::Test {};
-TYPED_TEST_SUITE(Writers, Families);
+VLX_TYPED_SUITE(Writers);
 
 namespace {
 

@@ -8,17 +8,10 @@ using namespace vlxtest;
 
 namespace {
 
-VLX_TWIN(h, avg)
-VLX_TWIN(h, corr)
-VLX_TWIN(i, scale)
-VLX_TEST_TWIN(t_bcorr, vlxb_corr, vlxfb_corr)
-VLX_TWIN(h, dft)
-VLX_TWIN(h, fft)
-VLX_TWIN(i, window2)
+VLX_TWIN(h, avg) VLX_TWIN(h, corr) VLX_TWIN(i, scale) VLX_TEST_TWIN(t_bcorr, vlxb_corr, vlxfb_corr) VLX_TWIN(h, dft)
+VLX_TWIN(h, fft) VLX_TWIN(i, window2)
 
-template <class V>
-class Measuring : public ::testing::Test {};
-TYPED_TEST_SUITE(Measuring, Families);
+VLX_TYPED_SUITE(Measuring);
 
 // From an accumulator of zeros and a record of ones a linear step leaves
 // exactly its weight: fixed, 1/count, or with VLX_AVG_LIMITED at most 1/limit.

@@ -8,14 +8,8 @@ using namespace vlxtest;
 
 namespace {
 
-VLX_TWIN(c, cos)
-VLX_TWIN(c, rand)
-VLX_TWIN(i, scale)
-VLX_TWIN(b, add)
-VLX_TWIN(h, fft)
-VLX_TWIN(h, avg)
-VLX_TWIN(s, peak)
-VLX_TWIN(i, window_gauss)
+VLX_TWIN(c, cos) VLX_TWIN(c, rand) VLX_TWIN(i, scale) VLX_TWIN(b, add) VLX_TWIN(h, fft) VLX_TWIN(h, avg)
+VLX_TWIN(s, peak) VLX_TWIN(i, window_gauss)
 
 template <class V>
 struct Rsmp;
@@ -53,9 +47,7 @@ struct Stream {
     int32_t run(V* in, V* out, V* work, bool keep = true) { return R::run(in, out, work, &coef, keep ? &state : nullptr); }
 };
 
-template <class V>
-class StreamingResampler : public ::testing::Test {};
-TYPED_TEST_SUITE(StreamingResampler, Families);
+VLX_TYPED_SUITE(StreamingResampler);
 
 // Ratio split, filter (half lengths 20, 38, 61), discards, delay and start-up;
 // one object through every set-up, reloading its filter as r crosses 1.5625.

@@ -1,9 +1,8 @@
 // Names, shapes against closed forms and the cosine-sum recurrence bit for bit, normalisation of every id, worked
-// examples, the cache, threads.
+// examples, the cache.
 #include "window_support.hpp"
 
 #include <string>
-#include <thread>
 
 using namespace vlxtest;
 
@@ -211,30 +210,4 @@ TYPED_TEST(Synthesis, CacheReuseAndStrictRotation) {
     const T near_40 = T(40) * (1 + std::numeric_limits<T>::epsilon());
     ASSERT_EQ(t_window2(a.get(), 4, VLX_WFLAG_WIDTH, T(40)) + t_window2(b.get(), 4, VLX_WFLAG_WIDTH, near_40), 0);
     EXPECT_TRUE(same_scalars(a.values(), b.values()));
-}
-
-// Several threads through more keys than the cache holds get what one gets.
-TYPED_TEST(Synthesis, SeveralThreads) {
-    using T = real_of<TypeParam>;
-    vlx_lib_init();
-    constexpr int kKeys = 24;
-    std::vector<std::vector<T>> want(kKeys);
-    for (int k = 0; k < kKeys; ++k) {
-        Vec<TypeParam> v(std::vector<T>(100 + k, T(1)), false);
-        ASSERT_EQ(t_window(v.get(), 2 + k % 12, k % 3), 0);
-        want[k] = v.values();
-    }
-    std::atomic<int> wrong{0};
-    std::vector<std::thread> threads;
-    for (int th = 0; th < 4; ++th) {
-        threads.emplace_back([&, th] {
-            for (int r = 0; r < 60; ++r) {
-                const int k = (r * 7 + th * 5) % kKeys;
-                Vec<TypeParam> v(std::vector<T>(100 + k, T(1)), false);
-                if (t_window(v.get(), 2 + k % 12, k % 3) != 0 || !same_scalars(v.values(), want[k])) ++wrong;
-            }
-        });
-    }
-    for (auto& t : threads) t.join();
-    EXPECT_EQ(wrong.load(), 0);
 }
