@@ -72,59 +72,63 @@ inline T real_taps_at(const T* x, const T* h, int64_t m, int64_t w, int64_t s) {
 }
 
 #ifdef VLX_FIR_AVX
-// Several outputs side by side, one per lane: each lane adds exactly the
-// products of the scalar sum in the same order, without FMA.  Returns the
-// first scalar left over.
-__attribute__((target("avx2"))) int64_t real_taps_avx(const double* x, double* y, int64_t s, int64_t end,
-                                                      const double* h, int64_t m, int64_t w) {
-    for (; s + 16 <= end; s += 16) {
-        __m256d a0 = _mm256_setzero_pd(), a1 = a0, a2 = a0, a3 = a0;
-        const double* xp = x + s - w * (m - 1);
-        for (int64_t i = m - 1; i >= 0; --i, xp += w) {
-            const __m256d c = _mm256_broadcast_sd(h + i);
-            a0 = _mm256_add_pd(a0, _mm256_mul_pd(c, _mm256_loadu_pd(xp)));
-            a1 = _mm256_add_pd(a1, _mm256_mul_pd(c, _mm256_loadu_pd(xp + 4)));
-            a2 = _mm256_add_pd(a2, _mm256_mul_pd(c, _mm256_loadu_pd(xp + 8)));
-            a3 = _mm256_add_pd(a3, _mm256_mul_pd(c, _mm256_loadu_pd(xp + 12)));
-        }
-        _mm256_storeu_pd(y + s, a0);
-        _mm256_storeu_pd(y + s + 4, a1);
-        _mm256_storeu_pd(y + s + 8, a2);
-        _mm256_storeu_pd(y + s + 12, a3);
+// One AVX register of samples: 4 doubles or 8 floats.
+template <class T>
+struct FirLanes;
+template <>
+struct FirLanes<double> {
+    using reg = __m256d;
+    static constexpr int64_t width = 4;
+    __attribute__((target("avx2"))) static reg zero() { return _mm256_setzero_pd(); }
+    __attribute__((target("avx2"))) static reg broadcast(const double* p) { return _mm256_broadcast_sd(p); }
+    __attribute__((target("avx2"))) static reg load(const double* p) { return _mm256_loadu_pd(p); }
+    __attribute__((target("avx2"))) static void store(double* p, reg v) { _mm256_storeu_pd(p, v); }
+    __attribute__((target("avx2"))) static reg add_product(reg acc, reg c, reg x) {
+        return _mm256_add_pd(acc, _mm256_mul_pd(c, x));
     }
-    for (; s + 4 <= end; s += 4) {
-        __m256d a0 = _mm256_setzero_pd();
-        const double* xp = x + s - w * (m - 1);
-        for (int64_t i = m - 1; i >= 0; --i, xp += w)
-            a0 = _mm256_add_pd(a0, _mm256_mul_pd(_mm256_broadcast_sd(h + i), _mm256_loadu_pd(xp)));
-        _mm256_storeu_pd(y + s, a0);
+};
+template <>
+struct FirLanes<float> {
+    using reg = __m256;
+    static constexpr int64_t width = 8;
+    __attribute__((target("avx2"))) static reg zero() { return _mm256_setzero_ps(); }
+    __attribute__((target("avx2"))) static reg broadcast(const float* p) { return _mm256_broadcast_ss(p); }
+    __attribute__((target("avx2"))) static reg load(const float* p) { return _mm256_loadu_ps(p); }
+    __attribute__((target("avx2"))) static void store(float* p, reg v) { _mm256_storeu_ps(p, v); }
+    __attribute__((target("avx2"))) static reg add_product(reg acc, reg c, reg x) {
+        return _mm256_add_ps(acc, _mm256_mul_ps(c, x));
     }
-    return s;
-}
+};
 
-__attribute__((target("avx2"))) int64_t real_taps_avx(const float* x, float* y, int64_t s, int64_t end,
-                                                      const float* h, int64_t m, int64_t w) {
-    for (; s + 32 <= end; s += 32) {
-        __m256 a0 = _mm256_setzero_ps(), a1 = a0, a2 = a0, a3 = a0;
-        const float* xp = x + s - w * (m - 1);
+// Several outputs side by side, one per lane: each lane adds exactly the
+// products of the scalar sum in the same order, without FMA (a separate
+// multiply and add).  Four registers at a time, then one.  Returns the first
+// scalar left over.
+template <class T>
+__attribute__((target("avx2"))) int64_t real_taps_avx(const T* x, T* y, int64_t s, int64_t end, const T* h,
+                                                      int64_t m, int64_t w) {
+    using L = FirLanes<T>;
+    constexpr int64_t n = L::width;
+    for (; s + 4 * n <= end; s += 4 * n) {
+        typename L::reg a0 = L::zero(), a1 = a0, a2 = a0, a3 = a0;
+        const T* xp = x + s - w * (m - 1);
         for (int64_t i = m - 1; i >= 0; --i, xp += w) {
-            const __m256 c = _mm256_broadcast_ss(h + i);
-            a0 = _mm256_add_ps(a0, _mm256_mul_ps(c, _mm256_loadu_ps(xp)));
-            a1 = _mm256_add_ps(a1, _mm256_mul_ps(c, _mm256_loadu_ps(xp + 8)));
-            a2 = _mm256_add_ps(a2, _mm256_mul_ps(c, _mm256_loadu_ps(xp + 16)));
-            a3 = _mm256_add_ps(a3, _mm256_mul_ps(c, _mm256_loadu_ps(xp + 24)));
+            const typename L::reg c = L::broadcast(h + i);
+            a0 = L::add_product(a0, c, L::load(xp));
+            a1 = L::add_product(a1, c, L::load(xp + n));
+            a2 = L::add_product(a2, c, L::load(xp + 2 * n));
+            a3 = L::add_product(a3, c, L::load(xp + 3 * n));
         }
-        _mm256_storeu_ps(y + s, a0);
-        _mm256_storeu_ps(y + s + 8, a1);
-        _mm256_storeu_ps(y + s + 16, a2);
-        _mm256_storeu_ps(y + s + 24, a3);
+        L::store(y + s, a0);
+        L::store(y + s + n, a1);
+        L::store(y + s + 2 * n, a2);
+        L::store(y + s + 3 * n, a3);
     }
-    for (; s + 8 <= end; s += 8) {
-        __m256 a0 = _mm256_setzero_ps();
-        const float* xp = x + s - w * (m - 1);
-        for (int64_t i = m - 1; i >= 0; --i, xp += w)
-            a0 = _mm256_add_ps(a0, _mm256_mul_ps(_mm256_broadcast_ss(h + i), _mm256_loadu_ps(xp)));
-        _mm256_storeu_ps(y + s, a0);
+    for (; s + n <= end; s += n) {
+        typename L::reg a0 = L::zero();
+        const T* xp = x + s - w * (m - 1);
+        for (int64_t i = m - 1; i >= 0; --i, xp += w) a0 = L::add_product(a0, L::broadcast(h + i), L::load(xp));
+        L::store(y + s, a0);
     }
     return s;
 }
