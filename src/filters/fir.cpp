@@ -6,16 +6,13 @@
 #include "core/frame.hpp"
 #include "elementwise/elementwise.hpp"
 #include "filters/filters.hpp"
+#include "filters/lanes.hpp"
 #include "transforms/transforms.hpp"
 
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
 
-#if defined(__x86_64__) && defined(__GNUC__)
-#define VLX_FIR_AVX 1
-#include <immintrin.h>
-#endif
 
 namespace vlx {
 namespace {
@@ -71,35 +68,7 @@ inline T real_taps_at(const T* x, const T* h, int64_t m, int64_t w, int64_t s) {
     return acc;
 }
 
-#ifdef VLX_FIR_AVX
-// One AVX register of samples: 4 doubles or 8 floats.
-template <class T>
-struct FirLanes;
-template <>
-struct FirLanes<double> {
-    using reg = __m256d;
-    static constexpr int64_t width = 4;
-    __attribute__((target("avx2"))) static reg zero() { return _mm256_setzero_pd(); }
-    __attribute__((target("avx2"))) static reg broadcast(const double* p) { return _mm256_broadcast_sd(p); }
-    __attribute__((target("avx2"))) static reg load(const double* p) { return _mm256_loadu_pd(p); }
-    __attribute__((target("avx2"))) static void store(double* p, reg v) { _mm256_storeu_pd(p, v); }
-    __attribute__((target("avx2"))) static reg add_product(reg acc, reg c, reg x) {
-        return _mm256_add_pd(acc, _mm256_mul_pd(c, x));
-    }
-};
-template <>
-struct FirLanes<float> {
-    using reg = __m256;
-    static constexpr int64_t width = 8;
-    __attribute__((target("avx2"))) static reg zero() { return _mm256_setzero_ps(); }
-    __attribute__((target("avx2"))) static reg broadcast(const float* p) { return _mm256_broadcast_ss(p); }
-    __attribute__((target("avx2"))) static reg load(const float* p) { return _mm256_loadu_ps(p); }
-    __attribute__((target("avx2"))) static void store(float* p, reg v) { _mm256_storeu_ps(p, v); }
-    __attribute__((target("avx2"))) static reg add_product(reg acc, reg c, reg x) {
-        return _mm256_add_ps(acc, _mm256_mul_ps(c, x));
-    }
-};
-
+#ifdef VLX_FILTER_LANES
 // Several outputs side by side, one per lane: each lane adds exactly the
 // products of the scalar sum in the same order, without FMA (a separate
 // multiply and add).  Four registers at a time, then one.  Returns the first
@@ -107,7 +76,7 @@ struct FirLanes<float> {
 template <class T>
 __attribute__((target("avx2"))) int64_t real_taps_avx(const T* x, T* y, int64_t s, int64_t end, const T* h,
                                                       int64_t m, int64_t w) {
-    using L = FirLanes<T>;
+    using L = Lanes<T>;
     constexpr int64_t n = L::width;
     for (; s + 4 * n <= end; s += 4 * n) {
         typename L::reg a0 = L::zero(), a1 = a0, a2 = a0, a3 = a0;
@@ -149,7 +118,7 @@ void direct_real_taps(const T* x, T* y, int64_t n, const T* h, int64_t m, const 
         y[s] = acc;
     }
     int64_t s = head;
-#ifdef VLX_FIR_AVX
+#ifdef VLX_FILTER_LANES
     if (cpu::has_avx2()) s = real_taps_avx(x, y, s, end, h, m, w);
 #endif
     for (; s < end; ++s) y[s] = real_taps_at(x, h, m, w, s);
