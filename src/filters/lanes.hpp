@@ -24,6 +24,21 @@ struct Lanes<double> {
     __attribute__((target("avx2"))) static reg add_product(reg acc, reg c, reg x) {
         return _mm256_add_pd(acc, _mm256_mul_pd(c, x));
     }
+    // Per-lane table reads: lane k takes base[i[k]].
+    using index = __m128i;
+    __attribute__((target("avx2"))) static index load_index(const int32_t* p) {
+        return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+    }
+    __attribute__((target("avx2"))) static index step(index i, int32_t by) {
+        return _mm_add_epi32(i, _mm_set1_epi32(by));
+    }
+    __attribute__((target("avx2"))) static reg gather(const double* base, index i) {
+        // the masked form: the plain one trips a false uninitialised warning
+        return _mm256_mask_i32gather_pd(_mm256_setzero_pd(), base, i, _mm256_castsi256_pd(_mm256_set1_epi64x(-1)), 8);
+    }
+    __attribute__((target("avx2"))) static reg sub(reg a, reg b) { return _mm256_sub_pd(a, b); }
+    __attribute__((target("avx2"))) static reg mul(reg a, reg b) { return _mm256_mul_pd(a, b); }
+    __attribute__((target("avx2"))) static reg add(reg a, reg b) { return _mm256_add_pd(a, b); }
 };
 template <>
 struct Lanes<float> {
@@ -36,6 +51,19 @@ struct Lanes<float> {
     __attribute__((target("avx2"))) static reg add_product(reg acc, reg c, reg x) {
         return _mm256_add_ps(acc, _mm256_mul_ps(c, x));
     }
+    using index = __m256i;
+    __attribute__((target("avx2"))) static index load_index(const int32_t* p) {
+        return _mm256_loadu_si256(reinterpret_cast<const __m256i*>(p));
+    }
+    __attribute__((target("avx2"))) static index step(index i, int32_t by) {
+        return _mm256_add_epi32(i, _mm256_set1_epi32(by));
+    }
+    __attribute__((target("avx2"))) static reg gather(const float* base, index i) {
+        return _mm256_mask_i32gather_ps(_mm256_setzero_ps(), base, i, _mm256_castsi256_ps(_mm256_set1_epi32(-1)), 4);
+    }
+    __attribute__((target("avx2"))) static reg sub(reg a, reg b) { return _mm256_sub_ps(a, b); }
+    __attribute__((target("avx2"))) static reg mul(reg a, reg b) { return _mm256_mul_ps(a, b); }
+    __attribute__((target("avx2"))) static reg add(reg a, reg b) { return _mm256_add_ps(a, b); }
 };
 
 
