@@ -83,35 +83,51 @@ struct Batch {
 
 #ifdef VLX_FILTER_LANES
 // Each lane adds exactly the products of its own scalar sum, in the same
-// order and without FMA, and forms its coefficients as the scalar route does;
-// the table and the window are read per lane.  Whole registers only: the
-// caller pads the batch.
+// order and without FMA, and forms its coefficients as the scalar route does.
+// A lane reads its coefficient pairs straight from the table, and its window
+// as a row that a transpose turns into one column per scalar; so every
+// window is read up to a whole number of registers (see lane_reach).  Whole
+// registers of outputs only: the caller pads the batch.
 template <class T, int Method>
 __attribute__((target("avx2"))) void batch_sums_avx(Batch<T>& b, const T* table, int64_t P, int64_t taps,
                                                    const T* x, int64_t w) {
     using L = Lanes<T>;
-    const auto stride = static_cast<int32_t>(P), wide = static_cast<int32_t>(w);
-    for (int64_t k = 0; k < b.count; k += L::width) {
-        typename L::index at = L::load_index(b.phase + k), xi = L::load_index(b.start + k);
-        const typename L::reg f = L::load(b.f + k);
-        typename L::reg re = L::zero(), im = re;
-        for (int64_t j = 0; j < taps; ++j) {
-            typename L::reg c = L::gather(table, at);
-            if constexpr (Method == 1) c = L::add(L::mul(L::sub(L::gather(table + 1, at), c), f), c);
-            re = L::add_product(re, c, L::gather(x, xi));
-            if (w == 2) im = L::add_product(im, c, L::gather(x + 1, xi));
-            at = L::step(at, stride);
-            xi = L::step(xi, wide);
+    using reg = typename L::reg;
+    constexpr int64_t n = L::width;
+    for (int64_t k = 0; k < b.count; k += n) {
+        const reg f = L::load(b.f + k);
+        reg re = L::zero(), im = re;
+        int32_t start[n];
+        for (int64_t l = 0; l < n; ++l) start[l] = b.start[k + l];
+        for (int64_t j = 0; j < taps;) {
+            reg col[n];
+            L::columns(x, start, col);
+            for (int64_t s = 0; s < n && j < taps; s += w, ++j) {
+                reg c, next;
+                L::pairs(table + j * P, b.phase + k, c, next);
+                if constexpr (Method == 1) c = L::add(L::mul(L::sub(next, c), f), c);
+                re = L::add_product(re, c, col[s]);
+                if (w == 2) im = L::add_product(im, c, col[s + 1]);
+            }
+            for (int64_t l = 0; l < n; ++l) start[l] += static_cast<int32_t>(n);
         }
         if (w == 1) {
             L::store(b.sums + k, re);
         } else {
-            T r[L::width], i[L::width];
+            T r[n], i[n];
             L::store(r, re);
             L::store(i, im);
-            for (int64_t l = 0; l < L::width; ++l) b.sums[2 * (k + l)] = r[l], b.sums[2 * (k + l) + 1] = i[l];
+            for (int64_t l = 0; l < n; ++l) b.sums[2 * (k + l)] = r[l], b.sums[2 * (k + l) + 1] = i[l];
         }
     }
+}
+
+// Scalars a lane reads from its window's start: the window rounded up to
+// whole registers.
+template <class T>
+int64_t lane_reach(int64_t taps, int64_t w) {
+    const int64_t n = Lanes<T>::width;
+    return (taps * w + n - 1) / n * n;
 }
 #endif
 
@@ -157,9 +173,13 @@ int32_t rsmp_kernel(V* in, V* out, V* coef, real_t<V> ratio, V* hist, int64_t ta
     const T* past = hist != nullptr ? hist->data : nullptr;
     T* y = out->data;
     const T phases = static_cast<T>(P);
-    // the lanes index the block and the table with 32-bit integers
-    const bool lanes = lanes_in_effect() > 0 && n * w <= std::numeric_limits<int32_t>::max() &&
-                       coef->points <= std::numeric_limits<int32_t>::max();
+    // The lanes index the block with 32-bit integers, and take only windows
+    // whose rounded-up reach stays inside the block.
+    const bool lanes = lanes_in_effect() > 0 && n * w <= std::numeric_limits<int32_t>::max();
+    int64_t reach = 0;
+#ifdef VLX_FILTER_LANES
+    reach = lane_reach<T>(taps, w);
+#endif
     Batch<T> batch;
     while (produced < wanted) {
         if (!advance(mu, pos)) {
@@ -183,7 +203,7 @@ int32_t rsmp_kernel(V* in, V* out, V* coef, real_t<V> ratio, V* hist, int64_t ta
         }
         if (pos > last) break;
         const T f = phase_real - static_cast<T>(phase);
-        if (lanes && pos >= 0) {
+        if (lanes && pos >= 0 && (pos * w + reach <= n * w)) {
             if (batch.count == 0) batch.first = produced;
             batch.start[batch.count] = static_cast<int32_t>(pos * w);
             batch.phase[batch.count] = static_cast<int32_t>(phase);
