@@ -88,36 +88,52 @@ struct Batch {
 // as a row that a transpose turns into one column per scalar; so every
 // window is read up to a whole number of registers (see lane_reach).  Whole
 // registers of outputs only: the caller pads the batch.
-template <class T, int Method>
+template <class T, int Method, int64_t W>
 __attribute__((target("avx2"))) void batch_sums_avx(Batch<T>& b, const T* table, int64_t P, int64_t taps,
-                                                   const T* x, int64_t w) {
+                                                   const T* x) {
     using L = Lanes<T>;
     using reg = typename L::reg;
     constexpr int64_t n = L::width;
-    for (int64_t k = 0; k < b.count; k += n) {
-        const reg f = L::load(b.f + k);
-        reg re = L::zero(), im = re;
-        int32_t start[n];
-        for (int64_t l = 0; l < n; ++l) start[l] = b.start[k + l];
-        for (int64_t j = 0; j < taps;) {
-            reg col[n];
-            L::columns(x, start, col);
-            for (int64_t s = 0; s < n && j < taps; s += w, ++j) {
-                reg c, next;
-                L::pairs(table + j * P, b.phase + k, c, next);
-                if constexpr (Method == 1) c = L::add(L::mul(L::sub(next, c), f), c);
-                re = L::add_product(re, c, col[s]);
-                if (w == 2) im = L::add_product(im, c, col[s + 1]);
+    // two registers of outputs at a time, to keep more independent sums in flight
+    for (int64_t k = 0; k < b.count; k += 2 * n) {
+        const int32_t* phase0 = b.phase + k;
+        const int32_t* phase1 = phase0 + n;
+        const reg f0 = L::load(b.f + k), f1 = L::load(b.f + k + n);
+        reg re0 = L::zero(), im0 = re0, re1 = re0, im1 = re0;
+        int32_t start[2 * n];
+        for (int64_t l = 0; l < 2 * n; ++l) start[l] = b.start[k + l];
+        for (int64_t j0 = 0; j0 < taps; j0 += n / W) {
+            reg col0[n], col1[n];
+            L::columns(x, start, col0);
+            L::columns(x, start + n, col1);
+#pragma GCC unroll 8
+            for (int64_t s = 0; s < n; s += W) {
+                const int64_t j = j0 + s / W;
+                if (j >= taps) break;
+                reg c0, next0, c1, next1;
+                L::pairs(table + j * P, phase0, c0, next0);
+                L::pairs(table + j * P, phase1, c1, next1);
+                if constexpr (Method == 1) {
+                    c0 = L::add(L::mul(L::sub(next0, c0), f0), c0);
+                    c1 = L::add(L::mul(L::sub(next1, c1), f1), c1);
+                }
+                re0 = L::add_product(re0, c0, col0[s]);
+                re1 = L::add_product(re1, c1, col1[s]);
+                if constexpr (W == 2) {
+                    im0 = L::add_product(im0, c0, col0[s + 1]);
+                    im1 = L::add_product(im1, c1, col1[s + 1]);
+                }
             }
-            for (int64_t l = 0; l < n; ++l) start[l] += static_cast<int32_t>(n);
+            for (int64_t l = 0; l < 2 * n; ++l) start[l] += static_cast<int32_t>(n);
         }
-        if (w == 1) {
-            L::store(b.sums + k, re);
+        if constexpr (W == 1) {
+            L::store(b.sums + k, re0);
+            L::store(b.sums + k + n, re1);
         } else {
-            T r[n], i[n];
-            L::store(r, re);
-            L::store(i, im);
-            for (int64_t l = 0; l < n; ++l) b.sums[2 * (k + l)] = r[l], b.sums[2 * (k + l) + 1] = i[l];
+            T r[2 * n], i[2 * n];
+            L::store(r, re0), L::store(r + n, re1);
+            L::store(i, im0), L::store(i + n, im1);
+            for (int64_t l = 0; l < 2 * n; ++l) b.sums[2 * (k + l)] = r[l], b.sums[2 * (k + l) + 1] = i[l];
         }
     }
 }
@@ -138,13 +154,16 @@ void flush(Batch<T>& b, const T* table, int64_t P, int64_t taps, const T* x, int
     if (n == 0) return;
 #ifdef VLX_FILTER_LANES
     // pad to whole registers with copies of the last entry
-    const int64_t width = Lanes<T>::width;
+    const int64_t width = 2 * Lanes<T>::width;
     for (; b.count % width != 0; ++b.count) {
         b.start[b.count] = b.start[n - 1];
         b.phase[b.count] = b.phase[n - 1];
         b.f[b.count] = b.f[n - 1];
     }
-    batch_sums_avx<T, Method>(b, table, P, taps, x, w);
+    if (w == 1)
+        batch_sums_avx<T, Method, 1>(b, table, P, taps, x);
+    else
+        batch_sums_avx<T, Method, 2>(b, table, P, taps, x);
 #endif
     std::memcpy(y + b.first * w, b.sums, static_cast<size_t>(n * w) * sizeof(T));
     b.count = 0;
