@@ -229,7 +229,7 @@ int32_t rsmp_kernel(V* in, V* out, V* coef, real_t<V> ratio, V* hist, int64_t ta
             batch.f[batch.count] = f;
             if (++batch.count == Batch<T>::size) flush<T, Method>(batch, table, P, taps, x, w, y);
         } else {
-            flush<T, Method>(batch, table, P, taps, x, w, y);
+            if (batch.count != 0) flush<T, Method>(batch, table, P, taps, x, w, y);
             for (int64_t c = 0; c < w; ++c)
                 y[produced * w + c] = window_sum<T, Method>(table, P, phase, f, taps, x + c,
                                                             past != nullptr ? past + c : nullptr, pos, w);
