@@ -14,8 +14,8 @@ VLX_TYPED_SUITE(ResampleLanes);
 TYPED_TEST(ResampleLanes, SameBitsAsScalar) {
     using V = TypeParam; using T = real_of<V>;
     Vec<V> table;
-    table->points = 2050;
-    ASSERT_EQ(t_table(table.get(), 2), 0);
+    table->points = 13314;  // 13 taps: windows end inside a register
+    ASSERT_EQ(t_table(table.get(), 4), 0);
     std::mt19937 rng(7);
     for (int trial = 0; trial < 24; ++trial) {
         const bool cx = trial % 3 == 2;
