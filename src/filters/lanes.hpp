@@ -24,6 +24,25 @@ struct Lanes<double> {
     __attribute__((target("avx2"))) static reg add_product(reg acc, reg c, reg x) {
         return _mm256_add_pd(acc, _mm256_mul_pd(c, x));
     }
+    __attribute__((target("avx2"))) static reg sub(reg a, reg b) { return _mm256_sub_pd(a, b); }
+    __attribute__((target("avx2"))) static reg mul(reg a, reg b) { return _mm256_mul_pd(a, b); }
+    __attribute__((target("avx2"))) static reg add(reg a, reg b) { return _mm256_add_pd(a, b); }
+    // Lane k gets t[at[k]] in a and t[at[k] + 1] in b, read as pairs.
+    __attribute__((target("avx2"))) static void pairs(const double* t, const int32_t* at, reg& a, reg& b) {
+        const reg p = _mm256_loadu2_m128d(t + at[2], t + at[0]), q = _mm256_loadu2_m128d(t + at[3], t + at[1]);
+        a = _mm256_unpacklo_pd(p, q);
+        b = _mm256_unpackhi_pd(p, q);
+    }
+    // col[s] lane k = x[at[k] + s] for s below width: four rows turned into columns.
+    __attribute__((target("avx2"))) static void columns(const double* x, const int32_t* at, reg* col) {
+        const reg r0 = load(x + at[0]), r1 = load(x + at[1]), r2 = load(x + at[2]), r3 = load(x + at[3]);
+        const reg t0 = _mm256_unpacklo_pd(r0, r1), t1 = _mm256_unpackhi_pd(r0, r1);
+        const reg t2 = _mm256_unpacklo_pd(r2, r3), t3 = _mm256_unpackhi_pd(r2, r3);
+        col[0] = _mm256_permute2f128_pd(t0, t2, 0x20);
+        col[1] = _mm256_permute2f128_pd(t1, t3, 0x20);
+        col[2] = _mm256_permute2f128_pd(t0, t2, 0x31);
+        col[3] = _mm256_permute2f128_pd(t1, t3, 0x31);
+    }
 };
 template <>
 struct Lanes<float> {
@@ -35,6 +54,39 @@ struct Lanes<float> {
     __attribute__((target("avx2"))) static void store(float* p, reg v) { _mm256_storeu_ps(p, v); }
     __attribute__((target("avx2"))) static reg add_product(reg acc, reg c, reg x) {
         return _mm256_add_ps(acc, _mm256_mul_ps(c, x));
+    }
+    __attribute__((target("avx2"))) static reg sub(reg a, reg b) { return _mm256_sub_ps(a, b); }
+    __attribute__((target("avx2"))) static reg mul(reg a, reg b) { return _mm256_mul_ps(a, b); }
+    __attribute__((target("avx2"))) static reg add(reg a, reg b) { return _mm256_add_ps(a, b); }
+    __attribute__((target("avx2"))) static __m128 pair2(const float* p, const float* q) {
+        const __m128 lo = _mm_loadl_pi(_mm_setzero_ps(), reinterpret_cast<const __m64*>(p));
+        return _mm_loadh_pi(lo, reinterpret_cast<const __m64*>(q));
+    }
+    __attribute__((target("avx2"))) static void pairs(const float* t, const int32_t* at, reg& a, reg& b) {
+        const reg p = _mm256_insertf128_ps(_mm256_castps128_ps256(pair2(t + at[0], t + at[1])),
+                                           pair2(t + at[4], t + at[5]), 1);
+        const reg q = _mm256_insertf128_ps(_mm256_castps128_ps256(pair2(t + at[2], t + at[3])),
+                                           pair2(t + at[6], t + at[7]), 1);
+        a = _mm256_shuffle_ps(p, q, 0x88);
+        b = _mm256_shuffle_ps(p, q, 0xDD);
+    }
+    __attribute__((target("avx2"))) static void columns(const float* x, const int32_t* at, reg* col) {
+        reg t[8], u[8];
+        for (int k = 0; k < 8; k += 2) {
+            const reg r0 = load(x + at[k]), r1 = load(x + at[k + 1]);
+            t[k] = _mm256_unpacklo_ps(r0, r1);
+            t[k + 1] = _mm256_unpackhi_ps(r0, r1);
+        }
+        for (int k = 0; k < 8; k += 4) {
+            u[k] = _mm256_shuffle_ps(t[k], t[k + 2], 0x44);
+            u[k + 1] = _mm256_shuffle_ps(t[k], t[k + 2], 0xEE);
+            u[k + 2] = _mm256_shuffle_ps(t[k + 1], t[k + 3], 0x44);
+            u[k + 3] = _mm256_shuffle_ps(t[k + 1], t[k + 3], 0xEE);
+        }
+        for (int s = 0; s < 4; ++s) {
+            col[s] = _mm256_permute2f128_ps(u[s], u[s + 4], 0x20);
+            col[s + 4] = _mm256_permute2f128_ps(u[s], u[s + 4], 0x31);
+        }
     }
 };
 

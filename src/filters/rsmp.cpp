@@ -2,14 +2,30 @@
 // nearest below its position between input samples, or interpolated between
 // that phase and the next, and the window position and fractional time travel
 // in the history from block to block.
+#include "core/cpu.hpp"
 #include "design/design.hpp"
 #include "filters/filters.hpp"
+#include "filters/lanes.hpp"
 
+#include <atomic>
 #include <cstdint>
 #include <limits>
 
 namespace vlx {
 namespace {
+
+// Lane levels: 0 scalar, 1 AVX2.  The cap lets the tests run both paths on one
+// machine; it never changes a result.
+std::atomic<int32_t> lane_cap{1};
+
+int32_t lanes_in_effect() {
+    int32_t have = 0;
+#ifdef VLX_FILTER_LANES
+    if (cpu::has_avx2()) have = 1;
+#endif
+    const int32_t cap = lane_cap.load(std::memory_order_relaxed);
+    return cap < have ? cap : have;
+}
 
 // Normalises mu to (-1, 0] by advancing the window.  False if mu is so large
 // (or infinite) that subtracting 1 no longer changes it.
@@ -52,6 +68,107 @@ inline T window_sum(const T* table, int64_t P, int64_t phase, T f, int64_t taps,
     return acc;
 }
 
+// Outputs whose windows lie wholly inside the block, gathered by the
+// sequential position walk and summed afterwards, one output per lane.
+template <class T>
+struct Batch {
+    static constexpr int64_t size = 64;
+    int32_t start[size];  // scalar index of the window's first sample
+    int32_t phase[size];
+    T f[size];
+    T sums[2 * size];
+    int64_t count = 0;
+    int64_t first = 0;  // output index of entry 0
+};
+
+#ifdef VLX_FILTER_LANES
+// Each lane adds exactly the products of its own scalar sum, in the same
+// order and without FMA, and forms its coefficients as the scalar route does.
+// A lane reads its coefficient pairs straight from the table, and its window
+// as a row that a transpose turns into one column per scalar; so every
+// window is read up to a whole number of registers (see lane_reach).  Whole
+// registers of outputs only: the caller pads the batch.
+template <class T, int Method, int64_t W>
+__attribute__((target("avx2"))) void batch_sums_avx(Batch<T>& b, const T* table, int64_t P, int64_t taps,
+                                                   const T* x) {
+    using L = Lanes<T>;
+    using reg = typename L::reg;
+    constexpr int64_t n = L::width;
+    // two registers of outputs at a time, to keep more independent sums in flight
+    for (int64_t k = 0; k < b.count; k += 2 * n) {
+        const int32_t* phase0 = b.phase + k;
+        const int32_t* phase1 = phase0 + n;
+        const reg f0 = L::load(b.f + k), f1 = L::load(b.f + k + n);
+        reg re0 = L::zero(), im0 = re0, re1 = re0, im1 = re0;
+        int32_t start[2 * n];
+        for (int64_t l = 0; l < 2 * n; ++l) start[l] = b.start[k + l];
+        for (int64_t j0 = 0; j0 < taps; j0 += n / W) {
+            reg col0[n], col1[n];
+            L::columns(x, start, col0);
+            L::columns(x, start + n, col1);
+#pragma GCC unroll 8
+            for (int64_t s = 0; s < n; s += W) {
+                const int64_t j = j0 + s / W;
+                if (j >= taps) break;
+                reg c0, next0, c1, next1;
+                L::pairs(table + j * P, phase0, c0, next0);
+                L::pairs(table + j * P, phase1, c1, next1);
+                if constexpr (Method == 1) {
+                    c0 = L::add(L::mul(L::sub(next0, c0), f0), c0);
+                    c1 = L::add(L::mul(L::sub(next1, c1), f1), c1);
+                }
+                re0 = L::add_product(re0, c0, col0[s]);
+                re1 = L::add_product(re1, c1, col1[s]);
+                if constexpr (W == 2) {
+                    im0 = L::add_product(im0, c0, col0[s + 1]);
+                    im1 = L::add_product(im1, c1, col1[s + 1]);
+                }
+            }
+            for (int64_t l = 0; l < 2 * n; ++l) start[l] += static_cast<int32_t>(n);
+        }
+        if constexpr (W == 1) {
+            L::store(b.sums + k, re0);
+            L::store(b.sums + k + n, re1);
+        } else {
+            T r[2 * n], i[2 * n];
+            L::store(r, re0), L::store(r + n, re1);
+            L::store(i, im0), L::store(i + n, im1);
+            for (int64_t l = 0; l < 2 * n; ++l) b.sums[2 * (k + l)] = r[l], b.sums[2 * (k + l) + 1] = i[l];
+        }
+    }
+}
+
+// Scalars a lane reads from its window's start: the window rounded up to
+// whole registers.
+template <class T>
+int64_t lane_reach(int64_t taps, int64_t w) {
+    const int64_t n = Lanes<T>::width;
+    return (taps * w + n - 1) / n * n;
+}
+#endif
+
+// Sums the batch into y and empties it.
+template <class T, int Method>
+void flush(Batch<T>& b, const T* table, int64_t P, int64_t taps, const T* x, int64_t w, T* y) {
+    const int64_t n = b.count;
+    if (n == 0) return;
+#ifdef VLX_FILTER_LANES
+    // pad to whole registers with copies of the last entry
+    const int64_t width = 2 * Lanes<T>::width;
+    for (; b.count % width != 0; ++b.count) {
+        b.start[b.count] = b.start[n - 1];
+        b.phase[b.count] = b.phase[n - 1];
+        b.f[b.count] = b.f[n - 1];
+    }
+    if (w == 1)
+        batch_sums_avx<T, Method, 1>(b, table, P, taps, x);
+    else
+        batch_sums_avx<T, Method, 2>(b, table, P, taps, x);
+#endif
+    std::memcpy(y + b.first * w, b.sums, static_cast<size_t>(n * w) * sizeof(T));
+    b.count = 0;
+}
+
 template <VlxVector V, int Method>
 int32_t rsmp_kernel(V* in, V* out, V* coef, real_t<V> ratio, V* hist, int64_t taps) {
     using T = real_t<V>;
@@ -75,14 +192,28 @@ int32_t rsmp_kernel(V* in, V* out, V* coef, real_t<V> ratio, V* hist, int64_t ta
     const T* past = hist != nullptr ? hist->data : nullptr;
     T* y = out->data;
     const T phases = static_cast<T>(P);
+    // The lanes index the block with 32-bit integers, and take only windows
+    // whose rounded-up reach stays inside the block.
+    const bool lanes = lanes_in_effect() > 0 && n * w <= std::numeric_limits<int32_t>::max();
+    int64_t reach = 0;
+#ifdef VLX_FILTER_LANES
+    reach = lane_reach<T>(taps, w);
+#endif
+    Batch<T> batch;
     while (produced < wanted) {
-        if (!advance(mu, pos)) return -1;
+        if (!advance(mu, pos)) {
+            flush<T, Method>(batch, table, P, taps, x, w, y);
+            return -1;
+        }
         T phase_real = -(phases * mu);
         int64_t phase = 0;
         // phase_real >= 0 here; a NaN takes the overflow branch too
         if (!(phase_real < phases)) {
             // rounding, or mu so close to -1: the output lies on the sample before
-            if (pos == -taps) return -1;
+            if (pos == -taps) {
+                flush<T, Method>(batch, table, P, taps, x, w, y);
+                return -1;
+            }
             --pos;
             mu = 0;
             phase_real = 0;
@@ -91,12 +222,22 @@ int32_t rsmp_kernel(V* in, V* out, V* coef, real_t<V> ratio, V* hist, int64_t ta
         }
         if (pos > last) break;
         const T f = phase_real - static_cast<T>(phase);
-        for (int64_t c = 0; c < w; ++c)
-            y[produced * w + c] = window_sum<T, Method>(table, P, phase, f, taps, x + c,
-                                                        past != nullptr ? past + c : nullptr, pos, w);
+        if (lanes && pos >= 0 && (pos * w + reach <= n * w)) {
+            if (batch.count == 0) batch.first = produced;
+            batch.start[batch.count] = static_cast<int32_t>(pos * w);
+            batch.phase[batch.count] = static_cast<int32_t>(phase);
+            batch.f[batch.count] = f;
+            if (++batch.count == Batch<T>::size) flush<T, Method>(batch, table, P, taps, x, w, y);
+        } else {
+            if (batch.count != 0) flush<T, Method>(batch, table, P, taps, x, w, y);
+            for (int64_t c = 0; c < w; ++c)
+                y[produced * w + c] = window_sum<T, Method>(table, P, phase, f, taps, x + c,
+                                                            past != nullptr ? past + c : nullptr, pos, w);
+        }
         mu += ratio;
         ++produced;
     }
+    flush<T, Method>(batch, table, P, taps, x, w, y);
     out->points = static_cast<int32_t>(produced);
     if (hist == nullptr) return 0;
 
@@ -183,6 +324,10 @@ VLX_API int32_t vlxd_rsmp(vlx_t* in, vlx_t* out, int32_t method, vlx_t* coef, do
 }
 VLX_API int32_t vlxfd_rsmp(vlxf_t* in, vlxf_t* out, int32_t method, vlxf_t* coef, float ratio, vlxf_t* hist) {
     return vlx::rsmp(in, out, method, coef, ratio, hist);
+}
+VLX_API int32_t vlx_resample_lanes(int32_t lanes) {
+    if (lanes >= 0) vlx::lane_cap.store(lanes, std::memory_order_relaxed);
+    return vlx::lanes_in_effect();
 }
 VLX_API int32_t vlxd_rsmp2(vlx_t* in, vlx_t* out, int32_t method, int32_t design, double ratio, vlx_t* hist) {
     return vlx::rsmp2(in, out, method, design, ratio, hist);
