@@ -1,5 +1,5 @@
-// The reader: text tokens, keys and line handling from a table, hand-made
-// binary files in every form and byte order, and hostile headers.
+// The reader: text tokens, keys and line handling from a table, hand-made binary files in every form and byte order,
+// and hostile headers.
 #include "fileio_support.hpp"
 
 #include <climits>
@@ -33,13 +33,11 @@ const std::vector<TextCase> text_cases = {
     {"nan -inf INFINITY -0 1e-500 1e", 1, 6, 0, 1, {NAN, -INFINITY, INFINITY, -0.0, 0, 1}, ""},
     // the last line without newline loses its last character: 1 point declared
     {"7\n#VLX points = 12", 1, 1, 0, 1, {7}, ""},
-    // 255 characters fit the line buffer, the last of them is cut; the rest of
-    // a longer line is dropped
+    // 255 characters fit the line buffer, the last of them is cut; the rest of a longer line is dropped
     {"#VLX delta =" + std::string(238, ' ') + "0.255\n1\n#" + std::string(300, ' ') + "2\n3", 1, 2, 0, 0.25, {1, 3}, ""},
 };
 
-// A binary file: form 1 or 2 (width fixed) or 3 (width in the type word),
-// delta 0.125, in the machine's order or the other.
+// A binary file: form 1 or 2 (width fixed) or 3 (width in the type word), delta 0.125, in either byte order.
 std::string binary_file(int form, bool swap, uint32_t width, int32_t points, int32_t is_complex,
                         const std::vector<double>& scalars) {
     std::string out;
@@ -62,11 +60,9 @@ TYPED_TEST(Reader, TextTokensKeysAndLines) {
         SCOPED_TRACE(c.input.substr(0, 60));
         Vec<TypeParam> v;
         std::string rest;
-        EXPECT_EQ(read_from(&v, c.input, &rest), c.status);
-        EXPECT_TRUE(has_shape(v.get(), c.points, c.is_complex, c.delta));
-        EXPECT_EQ(rest, c.rest);
+        EXPECT_TRUE(read_from(&v, c.input, &rest) == c.status && has_shape(v.get(), c.points, c.is_complex, c.delta));
         const std::vector<real_of<TypeParam>> want(c.values.begin(), c.values.end());
-        EXPECT_TRUE(same_scalars(std::vector(v->data, v->data + want.size()), want));
+        EXPECT_TRUE(rest == c.rest && same_scalars(std::vector(v->data, v->data + want.size()), want)) << rest;
     }
 }
 
@@ -77,20 +73,16 @@ TYPED_TEST(Reader, BinaryFormsInBothOrdersAndWidths) {
         for (bool swap : {false, true}) {
             SCOPED_TRACE(::testing::Message() << "form " << form << " width " << width << " swap " << swap);
             Vec<TypeParam> v;
-            std::string rest;
-            EXPECT_EQ(read_from(&v, binary_file(form, swap, width, 2, 7, x) + "\xBE", &rest), 1);
-            EXPECT_TRUE(has_shape(v.get(), 2, 7, 0.125));  // complex kept as written
-            EXPECT_TRUE(same_scalars(v.values(), std::vector<T>(x.begin(), x.end())));
-            EXPECT_EQ(rest, "\xBE");
+            std::string rest;  // complex kept as written
+            EXPECT_TRUE(read_from(&v, binary_file(form, swap, width, 2, 7, x) + "\xBE", &rest) == 1 && rest == "\xBE");
+            EXPECT_TRUE(has_shape(v.get(), 2, 7, 0.125) && same_scalars(v.values(), std::vector<T>(x.begin(), x.end())));
         }
 }
 
 TYPED_TEST(Reader, BrokenAndHostileBinaryHeaders) {
     Vec<TypeParam> v;
-    EXPECT_EQ(read_from(&v, binary_file(3, false, 8, -5, 0, {})), 1);  // no scalars, points kept
-    EXPECT_TRUE(has_shape(v.get(), -5, 0, 0.125));
-    EXPECT_EQ(read_from(&v, binary_file(3, true, 6, 1, 0, {})), -1);  // width 6
-    EXPECT_EQ(v->points, 1);
+    EXPECT_TRUE(read_from(&v, binary_file(3, false, 8, -5, 0, {})) == 1 && has_shape(v.get(), -5, 0, 0.125));  // no scalars
+    EXPECT_TRUE(read_from(&v, binary_file(3, true, 6, 1, 0, {})) == -1 && v->points == 1);  // width 6
     EXPECT_EQ(read_from(&v, binary_file(3, false, 8, 1, 0, {}).substr(0, 10)), -1);  // short header
     EXPECT_EQ(read_from(&v, "\xEB\x01\x10\xBF"), -1);                                  // no magic
     EXPECT_EQ(read_from(&v, binary_file(2, false, 4, 1000, 0, {1, 2})), -1);           // short data
@@ -105,22 +97,18 @@ TYPED_TEST(Reader, BrokenAndHostileBinaryHeaders) {
     EXPECT_TRUE(v->alloc == 0 && v->points == 0);
 }
 
-// The vector grows in blocks of 1024 scalars and never shrinks; a declared
-// count ends the read exactly at a block boundary.
+// The vector grows in blocks of 1024 scalars and never shrinks; a declared count ends the read exactly at a block
+// boundary.
 TYPED_TEST(Reader, TextAcrossBlocks) {
     std::string text = "#VLX points = 2048\n";
     for (int i = 0; i < 2050; ++i) text += std::to_string(i) + "\n";
     Vec<TypeParam> v;
     std::string rest;
-    EXPECT_EQ(read_from(&v, text, &rest), 1);
-    EXPECT_TRUE(v->points == 2048 && v->alloc == 2048 && v[2047] == 2047);
+    EXPECT_TRUE(read_from(&v, text, &rest) == 1 && v->points == 2048 && v->alloc == 2048 && v[2047] == 2047);
     EXPECT_EQ(rest, "\n2048\n2049\n");
 }
 
 TEST(ReaderStreams, DashIsStandardStreamAndStaysOpen) {
-    EXPECT_EQ(vlxf_fopen("-", "rb"), stdin);
-    EXPECT_EQ(vlxff_fopen("-", "w+b"), stdout);
-    EXPECT_EQ(vlxf_fopen("-", "a"), nullptr);
-    EXPECT_EQ(vlxf_fclose(stdin), 0);
-    EXPECT_EQ(vlxff_fclose(stdout), 0);
+    EXPECT_TRUE(vlxf_fopen("-", "rb") == stdin && vlxff_fopen("-", "w+b") == stdout && vlxf_fopen("-", "a") == nullptr);
+    EXPECT_TRUE(vlxf_fclose(stdin) == 0 && vlxff_fclose(stdout) == 0);
 }

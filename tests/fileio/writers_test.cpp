@@ -1,5 +1,5 @@
-// The writers byte for byte, round trips through the reader in both families,
-// the gnuplot script through gnuplot, and text under a decimal-comma locale.
+// The writers byte for byte, round trips through the reader in both families, the gnuplot script through gnuplot, and
+// text under a decimal-comma locale.
 #include "fileio_support.hpp"
 
 #include <clocale>
@@ -12,9 +12,8 @@ VLX_TYPED_SUITE(Writers);
 
 namespace {
 
-// The value read is the value written in the reader's type: converted for
-// binary files, for text the value of the printed digits (16, or 7 for float
-// vectors) parsed independently.  Bit for bit, signs of zero and NaN included.
+// The value read is the value written in the reader's type: converted for binary files, for text the value of the
+// printed digits (16, or 7 for float vectors) parsed independently.  Bit for bit, signs of zero and NaN included.
 template <class R, class W>
 void expect_same(const std::vector<R>& got, const std::vector<W>& written, bool text) {
     std::vector<R> want;
@@ -121,8 +120,7 @@ TYPED_TEST(Writers, SummaryNumbersAndRanges) {
     Vec<TypeParam> r33(ramp, false), r32(std::vector<T>(ramp.begin(), ramp.end() - 1), false);
     EXPECT_EQ(written(r32.get(), VLX_FORMAT_SUMMARY | VLX_FORMAT_NO_HEADER), line.substr(0, line.size() - 3) + "\n");
     EXPECT_EQ(written(r33.get(), VLX_FORMAT_SUMMARY), std::string("[33/1] ").append(line, 0, line.size() - 3) + " ...\n");
-    // The next of 1, 2, 4, 5, 10 in the decade; a rounding error above a step
-    // stays on it; at most the family's bound.
+    // The next of 1, 2, 4, 5, 10 in the decade; a rounding error above a step stays on it; at most the family's bound.
     const T bound = is_double<TypeParam> ? T(1e100) : T(1e15f), up = T(1) + 2 * std::numeric_limits<T>::epsilon();
     const std::vector<std::pair<T, T>> ranges = {{T(0), T(1)}, {T(-3), T(1)}, {T(1), T(1)}, {T(1.2), T(2)},
                                                  {T(3), T(4)}, {T(4.5), T(5)}, {T(6), T(10)}, {T(2) * up, T(2)},
@@ -140,8 +138,7 @@ TYPED_TEST(Writers, GnuplotDrawsTheScript) {
         FILE* f = std::fopen(script.c_str(), "w");
         ASSERT_EQ(t_fwrite2(v.get(), f, VLX_FORMAT_GNUPLOT), 0);
         std::fclose(f);
-        // A gnuplot without mouse support stops at the closing pause, after
-        // the plot is out.
+        // A gnuplot without mouse support stops at the closing pause, after the plot is out.
         (void)std::system(("gnuplot -e \"set terminal png; set output '" + png + "'\" " + script + " 2>/dev/null").c_str());
         char magic[4] = {};
         std::ifstream(png, std::ios::binary).read(magic, 4);
@@ -149,9 +146,8 @@ TYPED_TEST(Writers, GnuplotDrawsTheScript) {
     }
 }
 
-// Numbers are written and read in the C locale whatever the thread's or the
-// process's locale, with threads at work at once, and the caller's locale is
-// left as it was.
+// Numbers are written and read in the C locale whatever the thread's or the process's locale, with threads at work at
+// once, and the caller's locale is left as it was.
 TYPED_TEST(Writers, TextIsTheSameUnderADecimalComma) {
     locale_t german = newlocale(LC_ALL_MASK, "de_DE.UTF-8", static_cast<locale_t>(nullptr));
     if (german == static_cast<locale_t>(nullptr)) GTEST_SKIP() << "de_DE.UTF-8 is not available";
