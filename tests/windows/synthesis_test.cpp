@@ -63,8 +63,7 @@ TYPED_TEST(Synthesis, ShapesMatchClosedForms) {
     }
 }
 
-// Angles by repeated addition, re-seeded every 1024 samples; the float step is 2 pi (single) over n divided in
-// double.
+// Angles by repeated addition, re-seeded every 1024 samples; the float step is 2 pi (single) over n divided in double.
 TYPED_TEST(Synthesis, CosineSumBitsFollowRecurrence) {
     using T = real_of<TypeParam>;
     for (int32_t count : {2, 5, 7}) {
