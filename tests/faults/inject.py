@@ -110,6 +110,13 @@ FAULTS = [
      "T p = n > 0 ? x[0] : T(0);", "elementwise", "unwrapping takes the first sample as its own reference"),
     ("spline-start-diag", "src/stats/interp.cpp", "w.diag[0] = T(2);", "w.diag[0] = T(3);", "stats",
      "spline with a given start slope: first diagonal weight changed"),
+    ("deci-skip-round", "src/filters/staging.cpp", "const T rounded = stored + T(0.5);", "const T rounded = stored;",
+     "filters", "stored decimation skip count truncated instead of rounded"),
+    ("win-kaiser-negative", "src/windows/parametric.cpp", "if (beta > limit || beta < -limit) beta = limit;",
+     "if (beta > limit) beta = limit;", "windows", "a large negative Kaiser beta left unclamped"),
+    ("corr-work-alias", "src/streaming/corr.cpp", "if (work != nullptr && work != ref && work != out) return correlate",
+     "if (work != nullptr && work != ref) return correlate", "streaming",
+     "correlation work given as the output used in place instead of a temporary"),
     # sample files
     ("file-float-digits", "src/fileio/writers.cpp", 'static constexpr const char* line = "%.7g\\n";',
      'static constexpr const char* line = "%.6g\\n";', "fileio", "float text lines written with a digit too few"),
@@ -118,6 +125,9 @@ FAULTS = [
      "byte swap of 32-bit words exchanges the middle bytes wrongly"),
     ("file-odd-complex", "src/fileio/reader.cpp", "v->data[count] = T(0);", "v->data[count] = T(1);", "fileio",
      "odd complex text file: the missing imaginary part not zero"),
+    ("file-summary-cut", "src/fileio/writers.cpp", 'if (v->points > summary_samples) std::fputs(" ...", f);',
+     'if (v->points >= summary_samples) std::fputs(" ...", f);', "fileio",
+     "summary marks a vector of exactly 32 points as cut"),
     # binding of the vendor transform modules
     ("bind-scale-param", "src/core/binding.cpp", "constexpr int dfti_forward_scale = 4;",
      "constexpr int dfti_forward_scale = 5;", "binding", "forward scale set through the wrong parameter"),
