@@ -177,8 +177,7 @@ TYPED_TEST(Reader, BrokenAndHostileBinaryHeaders) {
     EXPECT_TRUE(v->alloc == 0 && v->points == 0);
 }
 
-// The vector grows in blocks of 1024 scalars and never shrinks; a declared count ends the read exactly at a block
-// boundary.
+// Growth in blocks of 1024 scalars, never shrinking; a declared count ends the read exactly at a block boundary.
 TYPED_TEST(Reader, TextAcrossBlocks) {
     std::string text = "#VLX points = 2048\n";
     for (int i = 0; i < 2050; ++i) text += std::to_string(i) + "\n";

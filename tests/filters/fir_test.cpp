@@ -102,8 +102,7 @@ TYPED_TEST(Filters, SpectrumCacheKeyAndTolerance) {
     }
 }
 
-// Symmetric filters stream as the full filter on either path; the decimating kernel keeps exactly the samples of the
-// plain filter and the decimator.
+// Symmetric filters stream as the full filter on either path; the decimating kernel keeps exactly the plain samples.
 TYPED_TEST(Filters, SymmetricStreamsMatchExpandedFilter) {
     using V = TypeParam; using T = real_of<V>;
     const double tol = is_double<V> ? 1e-12 : 1e-4;
@@ -155,8 +154,7 @@ TYPED_TEST(Filters, FirEdgesAndFailures) {
     EXPECT_TRUE(t_fir(&in, &in, &filter, nullptr) == 0 && t_free_internal<V>() == 0);
 }
 
-// Impulse response from silence and its transform against H(z); blocks give one call bit for bit; complex is two real
-// streams; id 1 changes nothing.
+// Impulse from silence against H(z); blocks give one call bit for bit; complex is two real streams; id 1 is refused.
 TYPED_TEST(Filters, Hwfilt) {
     using V = TypeParam; using T = real_of<V>;
     Vec<V> v(std::vector<T>(256, T(0)), false);

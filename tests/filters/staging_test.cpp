@@ -18,8 +18,7 @@ int32_t stage(V* in, V** out, V* other, V** hist, int32_t hist_points, int32_t f
 
 VLX_TYPED_SUITE(Staging);
 
-// Blocks fed one after another give exactly the samples of one long call, whatever the split, and those are every
-// factor-th sample.
+// Blocks fed one after another give one long call's samples exactly, whatever the split: every factor-th sample.
 TYPED_TEST(Staging, BlockFedDecimationEqualsOneCall) {
     using V = TypeParam; using T = real_of<V>;
     const int32_t total = 97;
@@ -44,8 +43,7 @@ TYPED_TEST(Staging, BlockFedDecimationEqualsOneCall) {
             }
 }
 
-// The stored count of samples still to drop, on blocks of 0, 1, 2, ...; without a history every block starts at its
-// first sample.
+// The stored count still to drop, on blocks of 0, 1, 2, ...; without a history each block starts at its first sample.
 TYPED_TEST(Staging, DecimationSkipCount) {
     using V = TypeParam; using T = real_of<V>;
     struct Case { T stored; int32_t n, factor, points; T first, next; };

@@ -13,8 +13,7 @@ VLX_TWIN(h, fft) VLX_TWIN(i, window2)
 
 VLX_TYPED_SUITE(Measuring);
 
-// From an accumulator of zeros and a record of ones a linear step leaves exactly its weight: fixed, 1/count, or with
-// VLX_AVG_LIMITED at most 1/limit.
+// From zeros and a record of ones a linear step leaves its weight: fixed, 1/count, or with LIMITED at most 1/limit.
 TYPED_TEST(Measuring, WeightSchedule) {
     using V = TypeParam; using T = real_of<V>;
     const int32_t lin = VLX_AVG_LINEAR, lim = VLX_AVG_LINEAR | VLX_AVG_LIMITED;
@@ -57,8 +56,7 @@ TYPED_TEST(Measuring, ModesOverSweeps) {
         }
 }
 
-// Every lag against the direct sum in long double: the sample-type pairs, power-of-2 and other lengths, every choice of
-// work.
+// Every lag against the direct sum in long double: sample-type pairs, power-of-2 and other lengths, every work.
 TYPED_TEST(Measuring, CorrelationMatchesDirectSum) {
     using V = TypeParam; using T = real_of<V>; using C = std::complex<long double>;
     const struct { int32_t n, m, ref_points; } cases[] = {{1, 1, 1}, {2, 1, 3}, {16, 16, 16}, {37, 5, 9}, {64, 7, 7}, {100, 33, 40}, {257, 256, 300}};

@@ -102,8 +102,7 @@ TYPED_TEST(Parametric, WorkedExamples) {
     for (const auto& c : cases) EXPECT_NEAR(sp(c[0], c[1]), c[2], is_double<TypeParam> ? 1e-15 : 1e-6) << c[0] << " " << c[1];
 }
 
-// Direct operations multiply the catalogue's forms in and rotate; the FIR prototypes are symmetric, unrotated, and
-// reach only forms taking flag 4.
+// Direct operations multiply the catalogue's forms in and rotate; the FIR prototypes are symmetric and unrotated.
 TYPED_TEST(Parametric, DirectFrameAndPrototypes) {
     using T = real_of<TypeParam>;
     const std::vector<T> x = random_values<T>(2 * 37, 3u);

@@ -1,5 +1,4 @@
-// Names, shapes against closed forms and the cosine-sum recurrence bit for bit, normalisation of every id, worked
-// examples, the cache.
+// Names, closed-form shapes, the cosine-sum recurrence bit for bit, every id's normalisation, worked examples, cache.
 #include "window_support.hpp"
 
 #include <string>
@@ -97,8 +96,7 @@ TYPED_TEST(Synthesis, CosineSumBitsFollowRecurrence) {
     }
 }
 
-// Mean c0, rms 1, centre 1 for every id, short (aliased) and narrower windows included; the metrics' factor from peak
-// mode is the one synthesis applies.
+// Mean c0, rms 1, centre 1 for every id, short (aliased) and narrower windows too; the metrics' scale is synthesis's.
 TYPED_TEST(Synthesis, EveryIdNormalises) {
     using T = real_of<TypeParam>;
     const long double tol = is_double<TypeParam> ? 1e-12L : 2e-5L;
