@@ -18,8 +18,7 @@ int32_t stage(V* in, V** out, V* other, V** hist, int32_t hist_points, int32_t f
 
 VLX_TYPED_SUITE(Staging);
 
-// Blocks fed one after another give exactly the samples of one long call, whatever the split, and those are every
-// factor-th sample.
+// Blocks fed one after another give one long call's samples exactly, whatever the split: every factor-th sample.
 TYPED_TEST(Staging, BlockFedDecimationEqualsOneCall) {
     using V = TypeParam; using T = real_of<V>;
     const int32_t total = 97;
@@ -44,140 +43,70 @@ TYPED_TEST(Staging, BlockFedDecimationEqualsOneCall) {
             }
 }
 
+// The stored count still to drop, on blocks of 0, 1, 2, ...; without a history each block starts at its first sample.
 TYPED_TEST(Staging, DecimationSkipCount) {
     using V = TypeParam; using T = real_of<V>;
-    struct Case {
-        T stored;
-        int32_t n, factor;
-        int32_t points;
-        T first;  // value of the first kept sample (samples are 0, 1, 2, ...)
-        T next;
-    };
+    struct Case { T stored; int32_t n, factor, points; T first, next; };
     const Case cases[] = {
-        {7, 5, 3, 0, -1, 2},   // the whole block is still to be dropped
-        {0, 10, 4, 3, 0, 2},   // keeps 0, 4, 8
-        {0, 0, 4, 0, -1, 0},   // empty block
-        {-3, 4, 2, 2, 0, 0},   // a negative count is 0
-        {1.4f, 6, 2, 3, 1, 1}, // counts round to nearest
-        {1.5f, 6, 2, 2, 2, 0},
+        {7, 5, 3, 0, -1, 2},  // the whole block is still to be dropped
+        {0, 10, 4, 3, 0, 2}, {0, 0, 4, 0, -1, 0},
+        {-3, 4, 2, 2, 0, 0},  // a negative count is 0
+        {1.4f, 6, 2, 3, 1, 1}, {1.5f, 6, 2, 2, 2, 0},  // counts round to nearest
     };
     for (const Case& c : cases) {
         std::vector<T> x(size_t(c.n));
         for (int32_t i = 0; i < c.n; ++i) x[size_t(i)] = T(i);
-        Vec<V> in(x, false);
-        Vec<V> out;
-        Vec<V> hist({c.stored});
+        Vec<V> in(x, false), out, hist({c.stored});
         ASSERT_EQ(t_deci(in.get(), out.get(), c.factor, hist.get()), 0);
-        EXPECT_EQ(out->points, c.points) << c.stored << " " << c.n;
-        if (c.points > 0) {
-            EXPECT_EQ(out[0], c.first);
-        }
-        EXPECT_EQ(hist[0], c.next) << c.stored << " " << c.n;
+        EXPECT_TRUE(out->points == c.points && (c.points == 0 || out[0] == c.first) && hist[0] == c.next) << c.stored << " " << c.n;
     }
-    // without a history every block starts at its first sample
-    Vec<V> in({1, 2, 3, 4, 5});
+    Vec<V> in({1, 2, 3, 4, 5}), dst;
     ASSERT_EQ(t_deci(in.get(), in.get(), 2, static_cast<V*>(nullptr)), 0);
     EXPECT_EQ(in.values(), (std::vector<T>{1, 3, 5}));
+    FailingAlloc<V> failing;  // a failed destination is left empty
+    EXPECT_TRUE(t_deci(in.get(), dst.get(), 1, static_cast<V*>(nullptr)) == -1 && dst->points == 0);
 }
 
-TYPED_TEST(Staging, HistoryFollowsSourceAndIsNeverShortened) {
+// The history takes the source's type and keeps its surplus; a destination sharing the source's storage (two empty
+// vectors included) is filled through a temporary that unstaging delivers, and without one the call fails.
+TYPED_TEST(Staging, HistoryAndAliasedDestination) {
     using V = TypeParam; using T = real_of<V>;
-    Vec<V> in({1, 2, 3, 4}, true);
+    Vec<V> in({1, 2, 3, 4}, true), out, hist({9, 8, 7, 6, 5}), a, b;
     in->delta = T(0.25);
-    Vec<V> out;
-    Vec<V> hist({9, 8, 7, 6, 5});
-    V* hp = hist.get();
-    V* op = out.get();
+    V *hp = hist.get(), *op = out.get(), tmp, *saved = nullptr;
     ASSERT_EQ(stage<V>(in.get(), &op, nullptr, &hp, 3, 0), 0);
-    EXPECT_TRUE(has_shape(hist.get(), 5, 1, 0.25));  // surplus stays
-    EXPECT_TRUE(hist[2] == T(8) && hist[3] == T(0) && has_shape(out.get(), 2, 1, 0.25));
-    // a real source turns it back and pads a short one
-    Vec<V> real_in({1, 2});
-    Vec<V> short_hist({4, 5}, true);
-    hp = short_hist.get();
-    ASSERT_EQ(stage<V>(real_in.get(), &op, in.get(), &hp, 3, 0), 0);
-    EXPECT_EQ(short_hist.values(), (std::vector<T>{4, 0, 0}));
-    EXPECT_EQ(out->complex, 1);  // the complex filter makes the output complex
-}
-
-// A destination sharing the source's storage is filled through a temporary that unstaging delivers; without somewhere
-// to put it the call fails.
-TYPED_TEST(Staging, AliasedDestination) {
-    using V = TypeParam; using T = real_of<V>;
-    for (int32_t flags : {VLX_STAGE_ALIAS, VLX_STAGE_ALIAS | VLX_STAGE_KEEP_POINTS}) {
-        Vec<V> v({1, 2, 3});
-        V* out = v.get();
-        V tmp;
-        V* saved = nullptr;
-        int32_t aliased = -7;
-        if (flags & VLX_STAGE_KEEP_POINTS) v->points = 2;
-        ASSERT_TRUE(stage<V>(v.get(), &out, nullptr, nullptr, 0, flags, &aliased, &tmp, &saved) == 0 && aliased == 1);
-        EXPECT_EQ(saved, v.get());
-        ASSERT_EQ(out, &tmp);
-        EXPECT_EQ(tmp.points, (flags & VLX_STAGE_KEEP_POINTS) ? 2 : 3);
-        for (int32_t i = 0; i < tmp.points; ++i) tmp.data[i] = v[i] * T(10);  // the kernel reads the source
-        const int32_t delivered = tmp.points;
-        ASSERT_EQ(t_unstage(out, aliased, saved), 0);
-        EXPECT_TRUE(tmp.data == nullptr && v->points == delivered && v[0] == T(10) && v[1] == T(20));
-    }
-    // two empty vectors share a null data pointer
-    Vec<V> a, b;
-    V* out = b.get();
-    int32_t aliased = 0;
-    ASSERT_EQ(stage<V>(a.get(), &out, nullptr, nullptr, 0, VLX_STAGE_ALIAS), -1);
-    V tmp;
-    V* saved = nullptr;
-    ASSERT_EQ(stage<V>(a.get(), &out, nullptr, nullptr, 0, VLX_STAGE_ALIAS, &aliased, &tmp, &saved), 0);
-    EXPECT_TRUE(aliased == 1 && t_unstage(out, 1, static_cast<V*>(nullptr)) == -1 && t_unstage(out, 1, saved) == 0);
+    EXPECT_TRUE(has_shape(hist.get(), 5, 1, 0.25) && hist[2] == T(8) && hist[3] == T(0) && has_shape(out.get(), 2, 1, 0.25));
+    Vec<V> v({1, 2, 3});
+    v->points = 2, op = v.get();
+    int32_t aliased = -7;
+    ASSERT_TRUE(stage<V>(v.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS | VLX_STAGE_KEEP_POINTS, &aliased, &tmp, &saved) == 0 &&
+                aliased == 1 && saved == v.get() && op == &tmp && tmp.points == 2);
+    for (int32_t i = 0; i < 2; ++i) tmp.data[i] = v[i] * T(10);  // the kernel reads the source
+    ASSERT_EQ(t_unstage(op, aliased, saved), 0);
+    EXPECT_TRUE(tmp.data == nullptr && v->points == 2 && v[0] == T(10) && v[1] == T(20));
+    op = b.get();
+    ASSERT_EQ(stage<V>(a.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS), -1);
+    ASSERT_EQ(stage<V>(a.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS, &aliased, &tmp, &saved), 0);
+    EXPECT_TRUE(aliased == 1 && t_unstage(op, 1, static_cast<V*>(nullptr)) == -1 && t_unstage(op, 1, saved) == 0);
     EXPECT_EQ(t_unstage(a.get(), 0, static_cast<V*>(nullptr)), 0);
 }
 
-TYPED_TEST(Staging, AllocationFailure) {
-    using V = TypeParam; using T = real_of<V>;
-    Vec<V> in({1, 2, 3});
-    Vec<V> dst;
-    V* out = in.get();
-    V tmp;
-    V* saved = nullptr;
-    int32_t aliased = 0;
-    {
-        FailingAlloc<V> failing;
-        EXPECT_EQ(stage<V>(in.get(), &out, nullptr, nullptr, 0, VLX_STAGE_ALIAS, &aliased, &tmp, &saved), -1);
-        EXPECT_TRUE(t_deci(in.get(), dst.get(), 1, static_cast<V*>(nullptr)) == -1 && dst->points == 0);
-    }
-    EXPECT_EQ(in.values(), (std::vector<T>{1, 2, 3}));
-}
-
-TEST(PointCounts, NearlyEqual) {
-    struct Case { double a, b; int32_t want; };
-    const Case cases[] = {
-        {0.0, 1e-310, 1},   {1e-300, 0.0, 0}, {1.0, 1.0 + 4e-15, 1}, {1.0, 1.0 + 5e-15, 0},
-        {-2.0, -2.0, 1},    {2.0, -2.0, 0},   {NAN, NAN, 0},         {1.0, NAN, 0}, {4.4e-307, -4.4e-307, 1},
-    };
-    for (const Case& c : cases) EXPECT_EQ(vlx_nearly_equal(c.a, c.b), c.want) << c.a << " " << c.b;
+TEST(PointCounts, NearlyEqualCeilAndFloor) {
+    const struct { double a, b; int32_t want; } equal[] = {
+        {0.0, 1e-310, 1}, {1e-300, 0.0, 0}, {1.0, 1.0 + 4e-15, 1}, {1.0, 1.0 + 5e-15, 0}, {-2.0, -2.0, 1},
+        {2.0, -2.0, 0},   {NAN, NAN, 0},    {1.0, NAN, 0},         {4.4e-307, -4.4e-307, 1}};
+    for (const auto& c : equal) EXPECT_EQ(vlx_nearly_equal(c.a, c.b), c.want) << c.a << " " << c.b;
     // the float allowance is 7 epsilons
     EXPECT_TRUE(vlxf_nearly_equal(1.0f, 1.0000007f) == 1 && vlxf_nearly_equal(1.0f, 1.000001f) == 0);
     EXPECT_TRUE(vlxf_nearly_equal(0.0f, 2e-37f) == 1 && vlxf_nearly_equal(3e-37f, 0.0f) == 0);
-}
-
-TEST(PointCounts, CeilAndFloorForgiveNoise) {
     struct Case { double x; int32_t ceil, floor; };
     const Case cases[] = {
-        {2.0000000000000004, 2, 2}, {1.9999999999999998, 2, 2}, {2.0, 2, 2},  {2.01, 3, 2},
-        {1.99, 2, 1},               {0.0, 0, 0},                {1e-20, 0, 0}, {0.3, 1, 0},
-        {0.5, 1, 0},                {-0.1, 0, 0},               {-1e9, 0, 0},  {NAN, 0, 0},
-        {3e9, INT_MAX, INT_MAX},    {2147483647.0, INT_MAX, INT_MAX},
-    };
-    for (const Case& c : cases) {
-        EXPECT_TRUE(vlx_ceil_pts(c.x) == c.ceil && vlx_floor_pts(c.x) == c.floor) << c.x;
-    }
-    const Case fcases[] = {
-        {2.0000002, 2, 2},  {1.9999999, 2, 2}, {20000.004, 20000, 20000}, {20000.02, 20001, 20000},
-        {2147483648.0, INT_MAX, INT_MAX}, {1e10, INT_MAX, INT_MAX}, {-3.0, 0, 0}, {0.25, 1, 0},
-    };
-    for (const Case& c : fcases) {
-        EXPECT_TRUE(vlxf_ceil_pts(float(c.x)) == c.ceil && vlxf_floor_pts(float(c.x)) == c.floor) << c.x;
-    }
+        {2.0000000000000004, 2, 2}, {1.9999999999999998, 2, 2}, {2.01, 3, 2}, {1.99, 2, 1}, {1e-20, 0, 0},
+        {0.5, 1, 0}, {-0.1, 0, 0}, {-1e9, 0, 0}, {NAN, 0, 0}, {3e9, INT_MAX, INT_MAX}, {2147483647.0, INT_MAX, INT_MAX}};
+    for (const Case& c : cases) EXPECT_TRUE(vlx_ceil_pts(c.x) == c.ceil && vlx_floor_pts(c.x) == c.floor) << c.x;
+    const Case fcases[] = {{2.0000002, 2, 2}, {1.9999999, 2, 2}, {20000.004, 20000, 20000}, {20000.02, 20001, 20000},
+                           {2147483648.0, INT_MAX, INT_MAX}, {-3.0, 0, 0}, {0.25, 1, 0}};
+    for (const Case& c : fcases) EXPECT_TRUE(vlxf_ceil_pts(float(c.x)) == c.ceil && vlxf_floor_pts(float(c.x)) == c.floor) << c.x;
 }
 
 }  // namespace

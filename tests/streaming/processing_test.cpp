@@ -13,11 +13,9 @@ VLX_TWIN(h, fft) VLX_TWIN(i, window2)
 
 VLX_TYPED_SUITE(Measuring);
 
-// From an accumulator of zeros and a record of ones a linear step leaves
-// exactly its weight: fixed, 1/count, or with VLX_AVG_LIMITED at most 1/limit.
+// From zeros and a record of ones a linear step leaves its weight: fixed, 1/count, or with LIMITED at most 1/limit.
 TYPED_TEST(Measuring, WeightSchedule) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     const int32_t lin = VLX_AVG_LINEAR, lim = VLX_AVG_LINEAR | VLX_AVG_LIMITED;
     const struct { int32_t mode, count; T weight, limit, want; } cases[] = {
         {lin, 2, T(0.25), 0, T(0.25)}, {lin, 5, 0, 0, 0}, {lin, 7, -1, 8, T(1) / T(7)}, {lim, 7, -1, 8, T(1) / T(7)},
@@ -31,8 +29,7 @@ TYPED_TEST(Measuring, WeightSchedule) {
 
 // Twelve sweeps in each mode against the textbook result in long double.
 TYPED_TEST(Measuring, ModesOverSweeps) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     const int sweeps = 12, n = 9;
     std::vector<std::vector<T>> recs;
     for (int k = 0; k < sweeps; ++k) recs.push_back(random_values<T>(n, 100 + k, 0.5, 4.0));
@@ -59,12 +56,9 @@ TYPED_TEST(Measuring, ModesOverSweeps) {
         }
 }
 
-// Every lag against the direct sum in long double: the sample-type pairs,
-// power-of-2 and other lengths, every choice of work.
+// Every lag against the direct sum in long double: sample-type pairs, power-of-2 and other lengths, every work.
 TYPED_TEST(Measuring, CorrelationMatchesDirectSum) {
-    using V = TypeParam;
-    using T = real_of<V>;
-    using C = std::complex<long double>;
+    using V = TypeParam; using T = real_of<V>; using C = std::complex<long double>;
     const struct { int32_t n, m, ref_points; } cases[] = {{1, 1, 1}, {2, 1, 3}, {16, 16, 16}, {37, 5, 9}, {64, 7, 7}, {100, 33, 40}, {257, 256, 300}};
     for (const auto& c : cases)
         for (int run = 0; run < 16; ++run) {
@@ -96,25 +90,18 @@ TYPED_TEST(Measuring, CorrelationMatchesDirectSum) {
     EXPECT_EQ(out.values(), std::vector<T>{7});
 }
 
-// Forward then inverse gives the record times the window, in its own time
-// order: the window stays, the factor 2 and the padding's scaling go.  nfft 0
-// takes the record's power of 2; SUM, CENTRED, RAW ignore nfft and fraction.
+// Forward then inverse gives the record times the window, in its own time order: the window stays, the factor 2 and the
+// padding's scaling go.  nfft 0 takes the record's power of 2; SUM, CENTRED, RAW ignore nfft and fraction.
 TYPED_TEST(Measuring, SpectrumInverseRestoresWindowedRecord) {
-    using V = TypeParam;
-    using T = real_of<V>;
-    struct Case {
-        int32_t n, nfft;
-        T fraction;
-        int32_t window, flags;
-    };
+    using V = TypeParam; using T = real_of<V>;
     const int32_t two = VLX_SPEC_TWO_SIDED;
-    const Case cases[] = {
+    const struct { int32_t n, nfft; T fraction; int32_t window, flags; } cases[] = {
         {64, 0, 0, 0, 0}, {64, 0, 1, VLX_WINDOW_HANN, 0}, {64, 64, 2, VLX_WINDOW_FLATTOP, two},
         {64, 0, 0, 0, VLX_SPEC_CENTRED}, {64, 0, 0, VLX_WINDOW_HANN, VLX_SPEC_SUM}, {64, 0, 0, 3, VLX_SPEC_NO_WINDOW},
         {64, 0, 0, 0, VLX_SPEC_RAW}, {200, 128, 0, VLX_WINDOW_HANN, 0}, {50, 128, T(0.25), VLX_WINDOW_GAUSS70, 0},
         {100, 256, T(0.3), 0, two}, {37, 0, 0, VLX_WINDOW_BLACKMAN, 0},
     };
-    for (const Case& c : cases)
+    for (const auto& c : cases)
         for (int run = 0; run < 4; ++run) {  // complex record or not; vlxh_fft, or vlxh_dft on the whole record
             const bool cx = run & 1, pow2 = run < 2;
             if ((!pow2 && (c.nfft != 0 || c.fraction != 0)) || (pow2 && c.nfft == 0 && (c.n & (c.n - 1)))) continue;
@@ -122,13 +109,10 @@ TYPED_TEST(Measuring, SpectrumInverseRestoresWindowedRecord) {
             Vec<V> in(x, cx), spectrum, back;
             // complex records always take the two-sided way back
             const int32_t inv = VLX_SPEC_INVERSE | (cx ? VLX_SPEC_TWO_SIDED_IN : 0) | (c.n % 2 ? VLX_SPEC_ODD : 0);
-            if (pow2) {
-                ASSERT_EQ(t_fft(in.get(), spectrum.get(), c.nfft, c.fraction, c.window, c.flags), 0);
-                ASSERT_EQ(t_fft(spectrum.get(), back.get(), c.nfft, c.fraction, c.window, c.flags | inv), 0);
-            } else {
-                ASSERT_EQ(t_dft(in.get(), spectrum.get(), c.window, c.flags), 0);
-                ASSERT_EQ(t_dft(spectrum.get(), back.get(), c.window, c.flags | inv), 0);
-            }
+            auto run_one = [&](V* from, V* to, int32_t flags) {
+                return pow2 ? t_fft(from, to, c.nfft, c.fraction, c.window, flags) : t_dft(from, to, c.window, flags);
+            };
+            ASSERT_TRUE(run_one(in.get(), spectrum.get(), c.flags) == 0 && run_one(spectrum.get(), back.get(), c.flags | inv) == 0);
             const int32_t len = c.nfft ? c.nfft : c.n, one_sided = !cx && !(c.flags & (two | VLX_SPEC_RAW));
             EXPECT_EQ(spectrum->points, pow2 ? (one_sided ? len / 2 + 1 : len) : (one_sided ? c.n / 2 + 1 : c.n));
             // the record the forward path took, windowed as it did but not rotated

@@ -1,5 +1,5 @@
-// The streaming resampler: set-up, point counts, delay and start-up, a
-// stream run in blocks, and the road of one measurement, both families.
+// The streaming resampler: set-up, point counts, delay and start-up, a stream run in blocks, and the road of one
+// measurement, both families.
 #include "vlx_test.hpp"
 
 #include <complex>
@@ -29,8 +29,7 @@ VLX_RSMP_API(vlxh, vlx_t)
 VLX_RSMP_API(vlxfh, vlxf_t)
 #undef VLX_RSMP_API
 
-// A coefficient object set up for a ratio and one stream's state, armed
-// (start-up discards on).
+// A coefficient object set up for a ratio and one stream's state, armed (start-up discards on).
 template <class V, class R = Rsmp<V>>
 struct Stream {
     typename R::Coef coef;
@@ -49,19 +48,13 @@ struct Stream {
 
 VLX_TYPED_SUITE(StreamingResampler);
 
-// Ratio split, filter (half lengths 20, 38, 61), discards, delay and start-up;
-// one object through every set-up, reloading its filter as r crosses 1.5625.
+// Ratio split, filter (half lengths 20, 38, 61), discards, delay and start-up; one object through every set-up,
+// reloading its filter as r crosses 1.5625.
 TYPED_TEST(StreamingResampler, SetupAndArithmetic) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     using R = Rsmp<V>;
-    const struct {
-        T ratio;
-        int32_t forced, k;
-        T r;
-        int32_t half, skip_mid, skip_out;
-        T figures[3];  // -1: not checked
-    } cases[] = {
+    // figures: delay in input and output points, start-up; -1: not checked
+    const struct { T ratio; int32_t forced, k; T r; int32_t half, skip_mid, skip_out; T figures[3]; } cases[] = {
         {T(4), 0, 2, T(1), 20, 33, 0, {T(57), T(14.25), T(132)}},
         {T(3), 0, 1, T(1.5), 20, 33, 43, {T(82.5), T(27.5), T(195)}},  // 24 + 19 behind 35 / 1.5
         {T(-5), 1, 0, T(1), 20, 0, 54, {T(27), T(27), T(54)}},         // 0 or below reads as 1
@@ -106,12 +99,10 @@ TYPED_TEST(StreamingResampler, PointCountsAgree) {
     }
 }
 
-// Blocks of random sizes, each limited to the most it can give, continue one
-// stream: one call's points, up to the rounding that block boundaries change;
-// after the start-up each block gives at least the certain count.
+// Blocks of random sizes, each limited to the most it can give, continue one stream: one call's points, up to the
+// rounding that block boundaries change; after the start-up each block gives at least the certain count.
 TYPED_TEST(StreamingResampler, BlocksContinueOneStream) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     const int32_t total = 3000;
     for (double ratio : {0.1, 0.5, 0.97, 1.0, 1.088, 1.5, 2.0, 3.3, 4.0, 8.0})
         for (int64_t w : {1, 2}) {  // real, complex
@@ -142,8 +133,7 @@ TYPED_TEST(StreamingResampler, BlocksContinueOneStream) {
 
 // A tone comes out delayed by get_delay_pts, in input and in output points.
 TYPED_TEST(StreamingResampler, ToneDelay) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     for (double ratio : {0.1, 0.7, 0.97, 1.0, 1.088, 1.5, 2.0, 3.3, 8.0}) {
         Stream<V> s(ratio, ratio == 1.0);
         const double f = 0.01 / std::max(ratio, 1.0);
@@ -162,9 +152,8 @@ TYPED_TEST(StreamingResampler, ToneDelay) {
     }
 }
 
-// |sum of taps[i] e^(-j 2 pi f i / step)| / step: a filter's gain at f
-// cycles per sample, the table's kernel read at `step` entries a sample.
-// A half filter (centre tap last) counts its mirrored half too.
+// |sum of taps[i] e^(-j 2 pi f i / step)| / step: a filter's gain at f cycles per sample, the table's kernel read at
+// `step` entries a sample. A half filter (centre tap last) counts its mirrored half too.
 template <class V>
 double gain(const V* taps, double f, bool half, int64_t from = 0, double step = 1) {
     std::vector<double> t(taps->data + from, taps->data + taps->points);
@@ -174,12 +163,10 @@ double gain(const V* taps, double f, bool half, int64_t from = 0, double step = 
     return std::abs(z) / step;
 }
 
-// The road of one measurement: a tone with noise from the generators,
-// streamed through the resampler in blocks, turned into spectra, averaged
-// over sweeps and read by the peak search.
+// The road of one measurement: a tone with noise from the generators, streamed through the resampler in blocks, turned
+// into spectra, averaged over sweeps and read by the peak search.
 TYPED_TEST(StreamingResampler, MeasurementRoad) {
-    using V = TypeParam;
-    using T = real_of<V>;
+    using V = TypeParam; using T = real_of<V>;
     const double rate_in = 48000, rate_out = 44100, tone = 1000, amplitude = 0.5;
     const int32_t n = 4096, sweeps = 32;
 

@@ -1,20 +1,95 @@
-// The writers byte for byte, round trips through the reader in both families,
+// The sample files: the reader's text tokens, keys and line handling from a table, hand-made binary files in every
+// form and byte order, hostile headers; the writers byte for byte, round trips through the reader in both families,
 // the gnuplot script through gnuplot, and text under a decimal-comma locale.
-#include "fileio_support.hpp"
+#include "vlx_test.hpp"
 
+#include <climits>
 #include <clocale>
+#include <cstdio>
 #include <fstream>
+#include <string>
 #include <thread>
 
 using namespace vlxtest;
 
+VLX_TYPED_SUITE(Reader);
 VLX_TYPED_SUITE(Writers);
 
 namespace {
 
-// The value read is the value written in the reader's type: converted for
-// binary files, for text the value of the printed digits (16, or 7 for float
-// vectors) parsed independently.  Bit for bit, signs of zero and NaN included.
+VLX_TEST_TWIN(t_fread, vlxf_fread, vlxff_fread)
+inline int32_t t_fwrite2(const vlx_t* v, FILE* f, int32_t format) { return vlxf_fwrite2(v, f, format); }
+inline int32_t t_fwrite2(const vlxf_t* v, FILE* f, int32_t format) { return vlxff_fwrite2(v, f, format); }
+
+// Everything from the stream's position to its end; the stream is closed.
+std::string drain(FILE* f) {
+    std::string s;
+    for (int c; (c = std::getc(f)) != EOF;) s.push_back(static_cast<char>(c));
+    std::fclose(f);
+    return s;
+}
+
+// One read from a stream holding `bytes`; *rest gets what the next call finds.
+template <class V>
+int32_t read_from(V* v, const std::string& bytes, std::string* rest = nullptr) {
+    FILE* f = std::tmpfile();
+    std::fwrite(bytes.data(), 1, bytes.size(), f);
+    std::rewind(f);
+    const int32_t r = t_fread(v, f);
+    const std::string left = drain(f);
+    if (rest != nullptr) *rest = left;
+    return r;
+}
+
+// What one writer call puts into an empty stream.
+template <class V>
+std::string written(const V* v, int32_t format, int32_t* status = nullptr) {
+    FILE* f = std::tmpfile();
+    const int32_t r = t_fwrite2(v, f, format);
+    if (status != nullptr) *status = r;
+    std::rewind(f);
+    return drain(f);
+}
+
+struct TextCase { std::string input; int32_t status, points, is_complex; double delta; std::vector<double> values;
+                  std::string rest; /* what the next call finds */ };
+
+const std::vector<TextCase> text_cases = {
+    {"", 0, 0, 0, 1, {}, ""}, {" \n# only a comment\n", 1, 0, 0, 1, {}, ""}, {"abc", -1, 0, 0, 1, {}, "abc"},
+    {"#VLX points = 0\n1 2", 1, 0, 0, 1, {}, "1 2"}, {"#VLX points = 3\n1 2", -1, 2, 0, 1, {1, 2}, ""},
+    {"#VLX points = 3\n1 2 3 4 5", 1, 3, 0, 1, {1, 2, 3}, " 4 5"},
+    {"#VLX complex = 1\n1 2 3", 1, 2, 1, 1, {1, 2, 3, 0}, ""}, {"1 2 #VLX complex = 1\n", 1, 1, 1, 1, {1, 2}, ""},
+    {"#VLX complex = 1\n1 x", -1, 1, 0, 1, {1}, "x"}, {"#VLXpoints=2\n#VLX delta =0.5\n1 2 3", 1, 2, 0, 0.5, {1, 2}, " 3"},
+    // hexadecimal integers, by value: 32-bit words, signed, negated in 32 bits
+    {"0.0x10 00x10 -0x10 0xFFFFFFFF -0x80000000 0x1ffffffff 0", 1, 7, 0, 1, {16, 16, -16, -1, INT_MIN, -1, 0}, ""},
+    {"0x1p3", -1, 1, 0, 1, {1}, "p3"}, {"0xg", -1, 0, 0, 1, {}, ""},  // no hexadecimal floating notation
+    {"1#x\n2 -", 1, 2, 0, 1, {1, 2}, ""},  // a sign alone at the end is no token
+    {"0." + std::string(200, '0') + "1e201", 1, 1, 0, 1, {1}, ""},  // a token longer than any buffer
+    {"nan -inf INFINITY -0 1e-500 1e", 1, 6, 0, 1, {NAN, -INFINITY, INFINITY, -0.0, 0, 1}, ""},
+    // the last line without newline loses its last character: 1 point declared
+    {"7\n#VLX points = 12", 1, 1, 0, 1, {7}, ""},
+    // 255 characters fit the line buffer, the last of them is cut; the rest of a longer line is dropped
+    {"#VLX delta =" + std::string(238, ' ') + "0.255\n1\n#" + std::string(300, ' ') + "2\n3", 1, 2, 0, 0.25, {1, 3}, ""},
+};
+
+// A binary file: form 1 or 2 (width fixed) or 3 (width in the type word), delta 0.125, in either byte order.
+std::string binary_file(int form, bool swap, uint32_t width, int32_t points, int32_t is_complex,
+                        const std::vector<double>& scalars) {
+    std::string out;
+    auto put = [&](auto x) {
+        const std::string b(reinterpret_cast<const char*>(&x), sizeof x);
+        out += swap ? std::string(b.rbegin(), b.rend()) : b;
+    };
+    auto scalar = [&](double x) { width == 8 ? put(x) : put(static_cast<float>(x)); };
+    put(0xEB0000BEu | uint32_t(form) << 16 | uint32_t(form) << 12);
+    if (form == 3) put(0x400u | width);
+    put(points), put(is_complex), scalar(0.125);
+    for (double x : scalars) scalar(x);
+    return out;
+}
+
+// The value read is the value written in the reader's type: converted for binary files, for text the value of the
+// printed digits (16, or 7 for float vectors) parsed independently.  Bit for bit, signs of zero and NaN included.
 template <class R, class W>
 void expect_same(const std::vector<R>& got, const std::vector<W>& written, bool text) {
     std::vector<R> want;
@@ -60,6 +135,59 @@ void round_trip(int32_t format) {
 
 }  // namespace
 
+TYPED_TEST(Reader, TextTokensKeysAndLines) {
+    for (const TextCase& c : text_cases) {
+        SCOPED_TRACE(c.input.substr(0, 60));
+        Vec<TypeParam> v;
+        std::string rest;
+        EXPECT_TRUE(read_from(&v, c.input, &rest) == c.status && has_shape(v.get(), c.points, c.is_complex, c.delta));
+        const std::vector<real_of<TypeParam>> want(c.values.begin(), c.values.end());
+        EXPECT_TRUE(rest == c.rest && same_scalars(std::vector(v->data, v->data + want.size()), want)) << rest;
+    }
+}
+
+TYPED_TEST(Reader, BinaryFormsInBothOrdersAndWidths) {
+    using T = real_of<TypeParam>;
+    const std::vector<double> x = {1.5, -2.25, 3, -0.0};
+    for (const auto& [form, width] : {std::pair{1, 8u}, {2, 4u}, {3, 4u}, {3, 8u}})
+        for (bool swap : {false, true}) {
+            SCOPED_TRACE(::testing::Message() << "form " << form << " width " << width << " swap " << swap);
+            Vec<TypeParam> v;
+            std::string rest;  // complex kept as written
+            EXPECT_TRUE(read_from(&v, binary_file(form, swap, width, 2, 7, x) + "\xBE", &rest) == 1 && rest == "\xBE");
+            EXPECT_TRUE(has_shape(v.get(), 2, 7, 0.125) && same_scalars(v.values(), std::vector<T>(x.begin(), x.end())));
+        }
+}
+
+TYPED_TEST(Reader, BrokenAndHostileBinaryHeaders) {
+    Vec<TypeParam> v;
+    EXPECT_TRUE(read_from(&v, binary_file(3, false, 8, -5, 0, {})) == 1 && has_shape(v.get(), -5, 0, 0.125));  // no scalars
+    EXPECT_TRUE(read_from(&v, binary_file(3, true, 6, 1, 0, {})) == -1 && v->points == 1);  // width 6
+    EXPECT_EQ(read_from(&v, binary_file(3, false, 8, 1, 0, {}).substr(0, 10)), -1);  // short header
+    EXPECT_EQ(read_from(&v, "\xEB\x01\x10\xBF"), -1);                                  // no magic
+    EXPECT_TRUE(read_from(&v, binary_file(2, false, 4, 1000, 0, {1, 2})) == -1 && has_shape(v.get(), 1000, 0, 0.125));  // short data
+    // Counts the vector cannot hold fail in the allocation, not in arithmetic.
+    EXPECT_TRUE(read_from(&v, binary_file(3, false, 4, INT_MAX, 1, {1})) == -1 && v->alloc == 0 && v->points == 0);
+    FailingAlloc<TypeParam> no_memory;
+    EXPECT_TRUE(read_from(&v, binary_file(1, true, 8, INT_MAX, 0, {1})) == -1 && v->alloc == 0 && v->points == 0 && v->data == nullptr);
+    EXPECT_TRUE(read_from(&v, "1 2") == -1 && v->alloc == 0 && v->points == 0);  // text growth fails too
+}
+
+// Growth in blocks of 1024 scalars, never shrinking; a declared count ends the read exactly at a block boundary.
+TYPED_TEST(Reader, TextAcrossBlocks) {
+    std::string text = "#VLX points = 2048\n";
+    for (int i = 0; i < 2050; ++i) text += std::to_string(i) + "\n";
+    Vec<TypeParam> v;
+    std::string rest;
+    EXPECT_TRUE(read_from(&v, text, &rest) == 1 && v->points == 2048 && v->alloc == 2048 && v[2047] == 2047);
+    EXPECT_EQ(rest, "\n2048\n2049\n");
+}
+
+TEST(ReaderStreams, DashIsStandardStreamAndStaysOpen) {
+    EXPECT_TRUE(vlxf_fopen("-", "rb") == stdin && vlxff_fopen("-", "w+b") == stdout && vlxf_fopen("-", "a") == nullptr);
+    EXPECT_TRUE(vlxf_fclose(stdin) == 0 && vlxff_fclose(stdout) == 0);
+}
+
 TYPED_TEST(Writers, RoundTripsThroughTheReader) {
     for (int32_t format : {VLX_FORMAT_BINARY, VLX_FORMAT_ASCII}) {
         SCOPED_TRACE(format);
@@ -98,8 +226,7 @@ TYPED_TEST(Writers, EveryFormByteForByte) {
     const std::string bin = written(cx.get(), VLX_FORMAT_BINARY | VLX_FORMAT_NO_DATA);
     std::string head("\xBE\x30\x03\xEB\x08\x04\0\0\x02\0\0\0\x01\0\0\0", 16);  // magic, type 1032, 2, 1
     head[4] = d ? 8 : 4;
-    EXPECT_EQ(bin.substr(0, 16), head);
-    EXPECT_EQ(bin.size(), d ? 24u : 20u);
+    EXPECT_TRUE(bin.substr(0, 16) == head && bin.size() == (d ? 24u : 20u));
     EXPECT_EQ(written(cx.get(), VLX_FORMAT_BINARY | VLX_FORMAT_NO_HEADER).size(), d ? 32u : 16u);
     int32_t status = 0;
     for (int32_t bad : {5, 0x1FF}) EXPECT_TRUE(written(cx.get(), bad, &status).empty() && status == -1);
@@ -121,8 +248,7 @@ TYPED_TEST(Writers, SummaryNumbersAndRanges) {
     Vec<TypeParam> r33(ramp, false), r32(std::vector<T>(ramp.begin(), ramp.end() - 1), false);
     EXPECT_EQ(written(r32.get(), VLX_FORMAT_SUMMARY | VLX_FORMAT_NO_HEADER), line.substr(0, line.size() - 3) + "\n");
     EXPECT_EQ(written(r33.get(), VLX_FORMAT_SUMMARY), std::string("[33/1] ").append(line, 0, line.size() - 3) + " ...\n");
-    // The next of 1, 2, 4, 5, 10 in the decade; a rounding error above a step
-    // stays on it; at most the family's bound.
+    // The next of 1, 2, 4, 5, 10 in the decade; a rounding error above a step stays on it; at most the family's bound.
     const T bound = is_double<TypeParam> ? T(1e100) : T(1e15f), up = T(1) + 2 * std::numeric_limits<T>::epsilon();
     const std::vector<std::pair<T, T>> ranges = {{T(0), T(1)}, {T(-3), T(1)}, {T(1), T(1)}, {T(1.2), T(2)},
                                                  {T(3), T(4)}, {T(4.5), T(5)}, {T(6), T(10)}, {T(2) * up, T(2)},
@@ -140,8 +266,7 @@ TYPED_TEST(Writers, GnuplotDrawsTheScript) {
         FILE* f = std::fopen(script.c_str(), "w");
         ASSERT_EQ(t_fwrite2(v.get(), f, VLX_FORMAT_GNUPLOT), 0);
         std::fclose(f);
-        // A gnuplot without mouse support stops at the closing pause, after
-        // the plot is out.
+        // A gnuplot without mouse support stops at the closing pause, after the plot is out.
         (void)std::system(("gnuplot -e \"set terminal png; set output '" + png + "'\" " + script + " 2>/dev/null").c_str());
         char magic[4] = {};
         std::ifstream(png, std::ios::binary).read(magic, 4);
@@ -149,9 +274,8 @@ TYPED_TEST(Writers, GnuplotDrawsTheScript) {
     }
 }
 
-// Numbers are written and read in the C locale whatever the thread's or the
-// process's locale, with threads at work at once, and the caller's locale is
-// left as it was.
+// Numbers are written and read in the C locale whatever the thread's or the process's locale, with threads at work at
+// once, and the caller's locale is left as it was.
 TYPED_TEST(Writers, TextIsTheSameUnderADecimalComma) {
     locale_t german = newlocale(LC_ALL_MASK, "de_DE.UTF-8", static_cast<locale_t>(nullptr));
     if (german == static_cast<locale_t>(nullptr)) GTEST_SKIP() << "de_DE.UTF-8 is not available";
