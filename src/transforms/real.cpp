@@ -85,7 +85,7 @@ void real_block(real_t<V>* x, int64_t p, int64_t h, const real_t<V>* tw, int64_t
 #ifdef VLX_FFT_AVX
     using namespace fft_simd;
     // (no call where a kernel would find less than one vector of elements)
-    if (level == 2 && h / 2 > int64_t(Avx512<T>::width)) k = lanes512::real_elements_lanes<Avx512<T>>(e, h, st, k);
+    if (level == 2 && h / 2 > int64_t(Avx512<T>::width)) return lanes512::real_elements_all_lanes<Avx512<T>>(e, h, st);
     if (level >= 1 && h / 2 - k >= int64_t(Avx<T>::width)) k = lanes256::real_elements_lanes<Avx<T>>(e, h, st, k);
 #else
     (void)st;
@@ -313,10 +313,21 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
     // a: one leaf of 32, its points 0 .. 16 at scalars 0 .. 33; b: two of 16,
     // points 0 .. 8 and 16 .. 24.  Vectors 3 and 5 (scalars 24 .. 31 and
     // 40 .. 47) hold points of only one of them.
+    // The two share the subtree of 16 at 0 and the leaf of 8 at 16.
     lanes8 a[64], b[64];
-    real_leaf32<lanes8>(s, a, p4, p8, 1, r);
-    real_leaf16<lanes8>(s, b, p4, r);
-    real_leaf16<lanes8>(s + 16, b + 32, p4, r);
+    real_leaf16<lanes8>(s, a, p4, r);
+    real_leaf<lanes8>(s + 16, a + 32, 8, r);
+#pragma GCC unroll 18
+    for (int j = 0; j < 18; ++j) b[j] = a[j];
+#pragma GCC unroll 10
+    for (int j = 32; j < 42; ++j) b[j] = a[j];
+    real_leaf<lanes8>(s + 24, a + 48, 8, r);
+    real_edges<lanes8>(a, 8, r);
+    for (int64_t k = 1; k < 4; ++k) real_element<lanes8>(a, 8, k, p8 + 6 * (k - 1));
+    real_leaf<lanes8>(s + 28, b + 56, 4, r);
+    real_leaf<lanes8>(s + 24, b + 48, 4, r);
+    real_edges<lanes8>(b + 32, 4, r);
+    real_element<lanes8>(b + 32, 4, 1, p4);
     for (int j = 18; j < 24; ++j) b[j] = lanes8{};
     b[54] = b[55] = lanes8{};
     for (int q = 0; q < 7; ++q) {
@@ -362,7 +373,10 @@ VLX_LEAVES512 void real_leaves_lanes(double* x, int64_t n, const double* tw) {
     for (int64_t s = 0; s < stripes; ++s) {
         const int64_t image = reverse_index(s, bits);
         if (image < s) continue;
-        for (int64_t r = 0; r < 32; ++r) std::memcpy(aside + r * width, x + r * row + image * width, width * sizeof(double));
+        // (by vectors, as the subtrees load them back)
+        for (int64_t r = 0; r < 32; ++r)
+            for (int64_t j = 0; j < width; j += 8)
+                _mm512_store_pd(aside + r * width + j, _mm512_loadu_pd(x + r * row + image * width + j));
         if (image != s) stripe_lanes(x + s * width, row, s, width, x, n, tw);
         stripe_lanes(aside, width, image, width, x, n, tw);
     }
