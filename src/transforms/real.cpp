@@ -369,6 +369,8 @@ VLX_LEAVES512 void real_leaves_lanes(double* x, int64_t n, const double* tw) {
     const int64_t width = row < 64 ? row : 64;
     const int64_t stripes = row / width;
     const int32_t bits = log2_of(int32_t(stripes));
+    // One group reads all its samples before it writes.
+    if (row == 8) return stripe_lanes(x, row, 0, width, x, n, tw);
     alignas(64) double aside[32 * 64];
     for (int64_t s = 0; s < stripes; ++s) {
         const int64_t image = reverse_index(s, bits);
