@@ -351,7 +351,6 @@ int32_t bitrev_scale(V* v) {
 
 template <VlxVector V>
 int32_t bitrev_lists(int32_t n) {
-    TableReader reader;
     const int32_t m = log2_of(n);
     const uint32_t* swaps = swap_list<V>(m);
     return swaps != nullptr && fixed_list<V>(m) != nullptr ? 0 : -1;

@@ -394,18 +394,20 @@ int32_t fft_real_forward(V* v) {
     // pass.  The failures leave what the steps below would leave.
     if constexpr (std::is_same_v<V, vlx_t>) {
         if (v->points >= 256 && fft_simd::lanes() == 2) {
-            if (bitrev_lists<V>(v->points) < 0) return -1;
+            // The reordering's lists and the table under one hold of lock 0.
             const int64_t n = v->points;
-            v->complex = 1;
-            const bool grown = realloc(v, v->points, 0) >= 0;
+            bool grown = false;
             int32_t status = -1;
-            if (grown) {
+            {
                 TableReader reader;
                 const double* tw = nullptr;
                 const double* lanes = nullptr;
+                if (bitrev_lists<V>(v->points) < 0) return -1;
                 status = fft_table<V>(v->points, &tw, &lanes);
                 reader.release_lock();
-                if (status == 0) {
+                v->complex = 1;
+                grown = realloc(v, v->points, 0) >= 0;
+                if (grown && status == 0) {
                     real_leaves_lanes(v->data, n, tw);
                     real_tree<V>(v->data, 0, n, n, tw, lanes, lanes != nullptr ? 2 : 0, true);
                     v->points = static_cast<int32_t>(n / 2 + 1);
@@ -415,7 +417,8 @@ int32_t fft_real_forward(V* v) {
             v->complex = 0;
             bitrev_scale(v);
             v->complex = 1;
-            if (grown) spread(v->data, n);
+            if (!grown) return -1;
+            spread(v->data, n);
             return status;
         }
     }

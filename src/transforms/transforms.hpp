@@ -48,7 +48,8 @@ template <VlxVector V> int32_t fft(V* v, int32_t inverse);
 template <VlxVector V> int32_t bitrev(V* v);
 template <VlxVector V> int32_t bitrev_scale(V* v);
 // Finds or builds the lists of the scaled reordering of n points, so that a
-// path reordering by other means fails where the reordering would: 0 or -1.
+// path reordering by other means fails where the reordering would; lock 0
+// held.  0 or -1.
 template <VlxVector V> int32_t bitrev_lists(int32_t n);
 // Real power-of-two transform to the half spectrum, and back (vlxi_rfft, vlxi_irfft).
 template <VlxVector V> int32_t rfft(V* v);
