@@ -263,8 +263,8 @@ void spread(T* x, int64_t n) {
 
 
 #ifdef VLX_FFT_AVX
-// The reordering, the scaling and the subtrees of 32 points in one pass, on
-// AVX-512F lanes, one subtree a lane (doubles).  With N = 32 R, the subtree
+// The reordering, the scaling and the subtrees of 32 points in one pass, one
+// subtree a lane of eight: doubles on AVX-512F, floats on AVX.  With N = 32 R, the subtree
 // at point p = r(b) 32 (b < R, r the reversal of the index bits) reads its
 // sample t at b + r5(t) R, so the rows r5(t) of eight consecutive b hold the
 // samples of eight subtrees lane by lane: no transpose on the way in.  A
@@ -295,13 +295,38 @@ inline bool starts_after(int64_t c, int32_t from, int32_t to, bool start) {
     return start;
 }
 
+// The subtrees of eight lanes L from their samples s (scaled, in the order of
+// the points): a, one leaf of 32, its points 0 .. 16 at scalars 0 .. 33; b,
+// two of 16, points 0 .. 8 and 16 .. 24.  The two share the subtree of 16 at
+// 0 and the leaf of 8 at 16.  Vectors 3 and 5 of eight scalars (24 .. 31 and
+// 40 .. 47) hold points of only one of them; the others are set.
+template <class L>
+VLX_LEAF_STEP void leaf_pair(const L* s, L* a, L* b, const L* p4, const L* p8, const L& r) {
+    real_leaf16<L>(s, a, p4, r);
+    real_leaf<L>(s + 16, a + 32, 8, r);
+#pragma GCC unroll 18
+    for (int j = 0; j < 18; ++j) b[j] = a[j];
+#pragma GCC unroll 10
+    for (int j = 32; j < 42; ++j) b[j] = a[j];
+    real_leaf<L>(s + 24, a + 48, 8, r);
+    real_edges<L>(a, 8, r);
+    for (int64_t k = 1; k < 4; ++k) real_element<L>(a, 8, k, p8 + 6 * (k - 1));
+    real_leaf<L>(s + 28, b + 56, 4, r);
+    real_leaf<L>(s + 24, b + 48, 4, r);
+    real_edges<L>(b + 32, 4, r);
+    real_element<L>(b + 32, 4, 1, p4);
+    for (int j = 18; j < 24; ++j) b[j] = L{};
+    b[54] = b[55] = L{};
+}
+
+static constexpr uint8_t r5[32] = {0, 16, 8, 24, 4, 20, 12, 28, 2, 18, 10, 26, 6, 22, 14, 30,
+                                   1, 17, 9, 25, 5, 21, 13, 29, 3, 19, 11, 27, 7, 23, 15, 31};
+
 // Eight subtrees: rows of eight lanes from src, `row` scalars apart, times f;
 // to[i] the scalar offset of lane i's subtree, bit i of two16 set if it holds
-// two leaves of 16.
+// two leaves of 16.  Doubles on AVX-512F.
 VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* x, const int64_t* to,
-                              __mmask8 two16, const double* pair4, const double* pair8, int64_t stride8) {
-    static constexpr uint8_t r5[32] = {0, 16, 8, 24, 4, 20, 12, 28, 2, 18, 10, 26, 6, 22, 14, 30,
-                                       1, 17, 9, 25, 5, 21, 13, 29, 3, 19, 11, 27, 7, 23, 15, 31};
+                              uint32_t two16, const double* pair4, const double* pair8, int64_t stride8) {
     const lanes8 scale = _mm512_set1_pd(f);
     lanes8 s[32];
     for (int t = 0; t < 32; ++t) s[t] = lanes8(_mm512_loadu_pd(src + r5[t] * row)) * scale;
@@ -309,78 +334,112 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
     for (int i = 0; i < 6; ++i) p4[i] = _mm512_set1_pd(pair4[i]);
     for (int k = 0; k < 3; ++k)
         for (int i = 0; i < 6; ++i) p8[6 * k + i] = _mm512_set1_pd(pair8[6 * k * stride8 + i]);
-    const lanes8 r = _mm512_set1_pd(fft_sqrt_half<vlx_t>);
-    // a: one leaf of 32, its points 0 .. 16 at scalars 0 .. 33; b: two of 16,
-    // points 0 .. 8 and 16 .. 24.  Vectors 3 and 5 (scalars 24 .. 31 and
-    // 40 .. 47) hold points of only one of them.
-    // The two share the subtree of 16 at 0 and the leaf of 8 at 16.
     lanes8 a[64], b[64];
-    real_leaf16<lanes8>(s, a, p4, r);
-    real_leaf<lanes8>(s + 16, a + 32, 8, r);
-#pragma GCC unroll 18
-    for (int j = 0; j < 18; ++j) b[j] = a[j];
-#pragma GCC unroll 10
-    for (int j = 32; j < 42; ++j) b[j] = a[j];
-    real_leaf<lanes8>(s + 24, a + 48, 8, r);
-    real_edges<lanes8>(a, 8, r);
-    for (int64_t k = 1; k < 4; ++k) real_element<lanes8>(a, 8, k, p8 + 6 * (k - 1));
-    real_leaf<lanes8>(s + 28, b + 56, 4, r);
-    real_leaf<lanes8>(s + 24, b + 48, 4, r);
-    real_edges<lanes8>(b + 32, 4, r);
-    real_element<lanes8>(b + 32, 4, 1, p4);
-    for (int j = 18; j < 24; ++j) b[j] = lanes8{};
-    b[54] = b[55] = lanes8{};
+    leaf_pair<lanes8>(s, a, b, p4, p8, _mm512_set1_pd(fft_sqrt_half<vlx_t>));
+    const __mmask8 mask = __mmask8(two16);
     for (int q = 0; q < 7; ++q) {
         __m512d rows[8], column[8];
         for (int j = 0; j < 8; ++j)
-            rows[j] = q == 3 ? a[8 * q + j] : q == 5 ? b[8 * q + j] : _mm512_mask_blend_pd(two16, a[8 * q + j], b[8 * q + j]);
+            rows[j] = q == 3 ? a[8 * q + j] : q == 5 ? b[8 * q + j] : _mm512_mask_blend_pd(mask, a[8 * q + j], b[8 * q + j]);
         fft_simd::transpose8(rows, column);
         for (int i = 0; i < 8; ++i) _mm512_storeu_pd(x + to[i] + 8 * q, column[i]);
     }
 }
 
+// The 32 rows of `width` scalars at src, `row` apart, to dst, by the vectors
+// the subtrees load them back with (faster than a copy by bytes here).
+VLX_LEAVES512 void copy_rows(double* dst, int64_t width, const double* src, int64_t row) {
+    for (int64_t r = 0; r < 32; ++r)
+        for (int64_t j = 0; j < width; j += 8) _mm512_store_pd(dst + r * width + j, _mm512_loadu_pd(src + r * row + j));
+}
+
+// The same for floats on AVX, eight lanes of 32 bits.
+#define VLX_LEAVES256 __attribute__((target("avx")))
+using lanes8f = float __attribute__((vector_size(32)));
+
+VLX_LEAVES256 void leaf_lanes(const float* src, int64_t row, float f, float* x, const int64_t* to, uint32_t two16,
+                              const float* pair4, const float* pair8, int64_t stride8) {
+    const lanes8f scale = _mm256_set1_ps(f);
+    lanes8f s[32];
+    for (int t = 0; t < 32; ++t) s[t] = lanes8f(_mm256_loadu_ps(src + r5[t] * row)) * scale;
+    lanes8f p4[6], p8[18];
+    for (int i = 0; i < 6; ++i) p4[i] = _mm256_set1_ps(pair4[i]);
+    for (int k = 0; k < 3; ++k)
+        for (int i = 0; i < 6; ++i) p8[6 * k + i] = _mm256_set1_ps(pair8[6 * k * stride8 + i]);
+    lanes8f a[64], b[64];
+    leaf_pair<lanes8f>(s, a, b, p4, p8, _mm256_set1_ps(fft_sqrt_half<vlxf_t>));
+    auto lane = [two16](int i) { return ((two16 >> i) & 1u) != 0 ? -1 : 0; };
+    const __m256 mask = _mm256_castsi256_ps(
+        _mm256_setr_epi32(lane(0), lane(1), lane(2), lane(3), lane(4), lane(5), lane(6), lane(7)));
+    for (int q = 0; q < 7; ++q) {
+        __m256 r[8];
+        for (int j = 0; j < 8; ++j)
+            r[j] = q == 3 ? a[8 * q + j] : q == 5 ? b[8 * q + j] : _mm256_blendv_ps(a[8 * q + j], b[8 * q + j], mask);
+        // 8 x 8 transpose: pairs, then quads, then halves
+        __m256 t[8], u[8];
+        for (int j = 0; j < 8; j += 2) {
+            t[j] = _mm256_unpacklo_ps(r[j], r[j + 1]);
+            t[j + 1] = _mm256_unpackhi_ps(r[j], r[j + 1]);
+        }
+        for (int j = 0; j < 8; j += 4) {
+            u[j] = _mm256_shuffle_ps(t[j], t[j + 2], 0x44);
+            u[j + 1] = _mm256_shuffle_ps(t[j], t[j + 2], 0xEE);
+            u[j + 2] = _mm256_shuffle_ps(t[j + 1], t[j + 3], 0x44);
+            u[j + 3] = _mm256_shuffle_ps(t[j + 1], t[j + 3], 0xEE);
+        }
+        for (int i = 0; i < 4; ++i) {
+            _mm256_storeu_ps(x + to[i] + 8 * q, _mm256_permute2f128_ps(u[i], u[i + 4], 0x20));
+            _mm256_storeu_ps(x + to[i + 4] + 8 * q, _mm256_permute2f128_ps(u[i], u[i + 4], 0x31));
+        }
+    }
+}
+VLX_LEAVES256 void copy_rows(float* dst, int64_t width, const float* src, int64_t row) {
+    for (int64_t r = 0; r < 32; ++r)
+        for (int64_t j = 0; j < width; j += 8) _mm256_store_ps(dst + r * width + j, _mm256_loadu_ps(src + r * row + j));
+}
+#undef VLX_LEAVES256
+
 // The subtrees of stripe s, their rows at src, `row` scalars apart.  Group g
 // holds b = 8g + i, whose subtree is c = r3(i) 2^(bits-3) + r(g).
-VLX_LEAVES512 void stripe_lanes(const double* src, int64_t row, int64_t s, int64_t width, double* x, int64_t n,
-                                const double* tw) {
+template <class T>
+void stripe_lanes(const T* src, int64_t row, int64_t s, int64_t width, T* x, int64_t n, const T* tw) {
     static constexpr int64_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
     const int32_t bits = log2_of(int32_t(n / 32));
+    const T f = T(1) / static_cast<T>(n);
     for (int64_t j = 0; j < width / 8; ++j) {
         const int64_t g = s * (width / 8) + j;
         const int64_t low = reverse_index(g, bits - 3);
         // the walk over the digits below the top three, from either state
         const bool after[2] = {starts_after(low, bits - 4, 1, false), starts_after(low, bits - 4, 1, true)};
         int64_t to[8];
-        __mmask8 two16 = 0;
+        uint32_t two16 = 0;
         for (int i = 0; i < 8; ++i) {
             const int64_t c = (r3[i] << (bits - 3)) | low;
             to[i] = 64 * c;
             const bool start = bits > 3 ? after[starts_after(c, bits - 1, bits - 3, true)] : starts_after(c, 2, 1, true);
-            if (start && (c & 1) != 0) two16 = __mmask8(two16 | (1u << i));
+            if (start && (c & 1) != 0) two16 |= 1u << i;
         }
-        leaf_lanes(src + 8 * j, row, 1.0 / double(n), x, to, two16, tw + 6 * (n / 16), tw + 6 * (n / 32), n / 32);
+        leaf_lanes(src + 8 * j, row, f, x, to, two16, tw + 6 * (n / 16), tw + 6 * (n / 32), n / 32);
     }
 }
 
 // The real samples of n >= 256 points at x (2n scalars of room) to the
 // points of their subtrees of 32, reordered and scaled on the way.
-VLX_LEAVES512 void real_leaves_lanes(double* x, int64_t n, const double* tw) {
+template <class T>
+void real_leaves_lanes(T* x, int64_t n, const T* tw) {
     const int64_t row = n / 32;
     const int64_t width = row < 64 ? row : 64;
     const int64_t stripes = row / width;
     const int32_t bits = log2_of(int32_t(stripes));
     // One group reads all its samples before it writes.
-    if (row == 8) return stripe_lanes(x, row, 0, width, x, n, tw);
-    alignas(64) double aside[32 * 64];
+    if (row == 8) return stripe_lanes<T>(x, row, 0, width, x, n, tw);
+    alignas(64) T aside[32 * 64];
     for (int64_t s = 0; s < stripes; ++s) {
         const int64_t image = reverse_index(s, bits);
         if (image < s) continue;
-        // (by vectors, as the subtrees load them back)
-        for (int64_t r = 0; r < 32; ++r)
-            for (int64_t j = 0; j < width; j += 8)
-                _mm512_store_pd(aside + r * width + j, _mm512_loadu_pd(x + r * row + image * width + j));
-        if (image != s) stripe_lanes(x + s * width, row, s, width, x, n, tw);
-        stripe_lanes(aside, width, image, width, x, n, tw);
+        copy_rows(aside, width, x + image * width, row);
+        if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
+        stripe_lanes<T>(aside, width, image, width, x, n, tw);
     }
 }
 #undef VLX_LEAVES512
@@ -390,26 +449,28 @@ VLX_LEAVES512 void real_leaves_lanes(double* x, int64_t n, const double* tw) {
 template <VlxVector V>
 int32_t fft_real_forward(V* v) {
 #ifdef VLX_FFT_AVX
-    // Doubles on AVX-512F: the reordering, the spread and the leaves in one
-    // pass.  The failures leave what the steps below would leave.
-    if constexpr (std::is_same_v<V, vlx_t>) {
-        if (v->points >= 256 && fft_simd::lanes() == 2) {
+    // On lanes (doubles on AVX-512F, floats on AVX): the reordering, the
+    // spread and the leaves in one pass.  The failures leave what the steps below would leave.
+    {
+        const int32_t level = fft_simd::lanes();
+        if (v->points >= 256 && level >= (std::is_same_v<V, vlx_t> ? 2 : 1)) {
+            using T = real_t<V>;
             // The reordering's lists and the table under one hold of lock 0.
             const int64_t n = v->points;
             bool grown = false;
             int32_t status = -1;
             {
                 TableReader reader;
-                const double* tw = nullptr;
-                const double* lanes = nullptr;
+                const T* tw = nullptr;
+                const T* lanes = nullptr;
                 if (bitrev_lists<V>(v->points) < 0) return -1;
                 status = fft_table<V>(v->points, &tw, &lanes);
                 reader.release_lock();
                 v->complex = 1;
                 grown = realloc(v, v->points, 0) >= 0;
                 if (grown && status == 0) {
-                    real_leaves_lanes(v->data, n, tw);
-                    real_tree<V>(v->data, 0, n, n, tw, lanes, lanes != nullptr ? 2 : 0, true);
+                    real_leaves_lanes<T>(v->data, n, tw);
+                    real_tree<V>(v->data, 0, n, n, tw, lanes, lanes != nullptr ? level : 0, true);
                     v->points = static_cast<int32_t>(n / 2 + 1);
                     return 0;
                 }
