@@ -453,7 +453,8 @@ int32_t fft_real_forward(V* v) {
     // spread and the leaves in one pass.  The failures leave what the steps below would leave.
     {
         const int32_t level = fft_simd::lanes();
-        if (v->points >= 256 && level >= (std::is_same_v<V, vlx_t> ? 2 : 1)) {
+        // (own storage only: lent samples are reordered where they lie first)
+        if (v->points >= 256 && v->alloc > 0 && level >= (std::is_same_v<V, vlx_t> ? 2 : 1)) {
             using T = real_t<V>;
             // The reordering's lists and the table under one hold of lock 0.
             const int64_t n = v->points;
