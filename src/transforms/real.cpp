@@ -264,13 +264,13 @@ void spread(T* x, int64_t n) {
 
 #ifdef VLX_FFT_AVX
 // The reordering, the scaling and the subtrees of 32 points in one pass, one
-// subtree a lane of eight: doubles on AVX-512F, floats on AVX.  With N = 32 R, the subtree
-// at point p = r(b) 32 (b < R, r the reversal of the index bits) reads its
-// sample t at b + r5(t) R, so the rows r5(t) of eight consecutive b hold the
-// samples of eight subtrees lane by lane: no transpose on the way in.  A
-// subtree of 32 points is either one leaf of 32 or two of 16 (the quarters
-// of a block of 64); the lanes run both and keep what each subtree is.  The
-// results, transposed back, are the subtrees' points 0 .. 27.
+// subtree a lane of eight: doubles on AVX-512F, floats on AVX.  With N = 32 R,
+// the subtree at point p = r(b) 32 (b < R, r the reversal of the index bits)
+// reads its sample t at b + r5(t) R, so the rows r5(t) of eight consecutive b
+// hold the samples of eight subtrees lane by lane: no transpose on the way
+// in.  A subtree of 32 points is either one leaf of 32 or two of 16 (the
+// quarters of a block of 64); the lanes run both and keep what each subtree
+// is.  The results, transposed back, are the subtrees' points 0 .. 27.
 //
 // In place, the R b form stripes of 64 scalars a row (all of R below 2048
 // points), and the subtrees of stripe s write only into stripe r(s) of the 2N
@@ -340,7 +340,9 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
     for (int q = 0; q < 7; ++q) {
         __m512d rows[8], column[8];
         for (int j = 0; j < 8; ++j)
-            rows[j] = q == 3 ? a[8 * q + j] : q == 5 ? b[8 * q + j] : _mm512_mask_blend_pd(mask, a[8 * q + j], b[8 * q + j]);
+            rows[j] = q == 3   ? a[8 * q + j]
+                      : q == 5 ? b[8 * q + j]
+                               : _mm512_mask_blend_pd(mask, a[8 * q + j], b[8 * q + j]);
         fft_simd::transpose8(rows, column);
         for (int i = 0; i < 8; ++i) _mm512_storeu_pd(x + to[i] + 8 * q, column[i]);
     }
@@ -416,7 +418,8 @@ void stripe_lanes(const T* src, int64_t row, int64_t s, int64_t width, T* x, int
         for (int i = 0; i < 8; ++i) {
             const int64_t c = (r3[i] << (bits - 3)) | low;
             to[i] = 64 * c;
-            const bool start = bits > 3 ? after[starts_after(c, bits - 1, bits - 3, true)] : starts_after(c, 2, 1, true);
+            const bool start =
+                bits > 3 ? after[starts_after(c, bits - 1, bits - 3, true)] : starts_after(c, 2, 1, true);
             if (start && (c & 1) != 0) two16 |= 1u << i;
         }
         leaf_lanes(src + 8 * j, row, f, x, to, two16, tw + 6 * (n / 16), tw + 6 * (n / 32), n / 32);
