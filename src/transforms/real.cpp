@@ -220,6 +220,26 @@ void real_leaves(real_t<V>* x, int64_t p0, int64_t len, const real_t<V>* tw, int
 // stages from h = 16 up as the levels walk them within the block (its tree is
 // that of a transform of len points).  Each stage's stores are then long done
 // when the next stage loads them as vectors.
+#ifdef VLX_FFT_AVX
+// The stage of h = 16 within a block of len points, doubles on AVX-512F, in
+// one call: per block its edges and its elements 1 .. 4 and 4 .. 7 (the last
+// vector overlapping, as in real_elements_all_lanes).
+__attribute__((target("avx512f"))) void real_stage16(double* x, int64_t p0, int64_t len, const double* st) {
+    using S = fft_simd::Avx512<double>;
+    using Lanes = fft_simd::lanes512::RealLanes<S>;
+    for (int64_t pos = 0, spacing = 8, c = (len / 64 + 1) / 2; c > 0;
+         pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
+        for (int64_t i = 0, p = pos; i < c; ++i, p += spacing) {
+            double* e = x + 2 * (p0 + 16 * p);
+            real_edges<double>(e, 16, fft_sqrt_half<vlx_t>);
+            const Lanes tail(e, 16, st, 4);
+            Lanes(e, 16, st, 1).store(e, 16, 1);
+            tail.store(e, 16, 4);
+        }
+    }
+}
+#endif
+
 template <VlxVector V>
 void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<V>* tw, const real_t<V>* lanes,
                  int32_t level, bool leaves_done) {
@@ -227,6 +247,14 @@ void real_levels(real_t<V>* x, int64_t p0, int64_t len, int64_t n, const real_t<
     if (!leaves_done) real_leaves<V>(x, p0, len, tw, n);
     for (int64_t h = 16; 4 * h <= len; h *= 2) {
         const T* st = lanes != nullptr ? lanes + fft_simd::lane_offset(size_t(n), size_t(h)) : nullptr;
+#ifdef VLX_FFT_AVX
+        if constexpr (std::is_same_v<V, vlx_t>) {
+            if (h == 16 && st != nullptr && level == 2) {
+                real_stage16(x, p0, len, st);
+                continue;
+            }
+        }
+#endif
         for (int64_t pos = 0, spacing = 8, c = (len / (4 * h) + 1) / 2; c > 0;
              pos = 4 * pos + 12, spacing *= 4, c = (c + 2) / 4) {
             for (int64_t i = 0, p = pos; i < c; ++i, p += spacing)
