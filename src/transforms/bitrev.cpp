@@ -349,10 +349,19 @@ int32_t bitrev_scale(V* v) {
     return 0;
 }
 
+template <VlxVector V>
+int32_t bitrev_lists(int32_t n) {
+    const int32_t m = log2_of(n);
+    const uint32_t* swaps = swap_list<V>(m);
+    return swaps != nullptr && fixed_list<V>(m) != nullptr ? 0 : -1;
+}
+
 template int32_t bitrev<vlx_t>(vlx_t*);
 template int32_t bitrev<vlxf_t>(vlxf_t*);
 template int32_t bitrev_scale<vlx_t>(vlx_t*);
 template int32_t bitrev_scale<vlxf_t>(vlxf_t*);
+template int32_t bitrev_lists<vlx_t>(int32_t);
+template int32_t bitrev_lists<vlxf_t>(int32_t);
 
 }  // namespace vlx
 

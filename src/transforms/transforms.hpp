@@ -47,6 +47,10 @@ template <VlxVector V> int32_t fft(V* v, int32_t inverse);
 // Reorder into bit-reversed order (vlxi_bitrev); the same, times 1/N (vlxi_bitrev_scale).
 template <VlxVector V> int32_t bitrev(V* v);
 template <VlxVector V> int32_t bitrev_scale(V* v);
+// Finds or builds the lists of the scaled reordering of n points, so that a
+// path reordering by other means fails where the reordering would; lock 0
+// held.  0 or -1.
+template <VlxVector V> int32_t bitrev_lists(int32_t n);
 // Real power-of-two transform to the half spectrum, and back (vlxi_rfft, vlxi_irfft).
 template <VlxVector V> int32_t rfft(V* v);
 template <VlxVector V> int32_t irfft(V* v);

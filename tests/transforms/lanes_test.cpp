@@ -54,4 +54,39 @@ TYPED_TEST(Lanes, EveryPathMatchesScalarBitForBit) {
     vlx_transform_lanes(2);
 }
 
+// The real transform's one-pass leaves take the vector's storage in another
+// order than the scalar path (grown first, reordered on the way): lent
+// samples and a failed enlargement must still end as the scalar path leaves them.
+TYPED_TEST(Lanes, RealTransformLeavesStorageAsScalarPathDoes) {
+    using T = real_of<TypeParam>;
+    const int32_t widest = vlx_transform_lanes(2);
+    const std::vector<T> in = random_values<T>(512, 77);
+    auto run = [&](int32_t level) {
+        vlx_transform_lanes(level);
+        std::vector<T> lent = in, out;
+        TypeParam v;
+        t_init(&v);
+        v.data = lent.data(), v.points = 512, v.complex = 0, v.alloc = 0;
+        const int32_t status = t_rfft(&v);
+        out.assign(v.data, v.data + 2 * v.points);
+        t_destroy(&v);
+        Vec<TypeParam> failing(in, false);
+        int32_t failed;
+        {
+            FailingAlloc<TypeParam> no_storage;
+            failed = t_rfft(&failing);
+        }
+        out.insert(out.end(), lent.begin(), lent.end());
+        out.insert(out.end(), {T(status), T(failed), T(failing->points), T(failing->complex)});
+        return out;
+    };
+    const auto want = run(0);
+    for (int32_t level = 1; level <= widest; ++level) {
+        const auto got = run(level);
+        EXPECT_TRUE(got.size() == want.size() && std::memcmp(got.data(), want.data(), want.size() * sizeof(T)) == 0)
+            << "lanes " << level;
+    }
+    vlx_transform_lanes(2);
+}
+
 }  // namespace
