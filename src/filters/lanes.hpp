@@ -3,6 +3,11 @@
 // expression does.
 #pragma once
 
+#include "core/cpu.hpp"
+
+#include <atomic>
+#include <cstdint>
+
 #if defined(__x86_64__) && defined(__GNUC__)
 #define VLX_FILTER_LANES 1
 #include <immintrin.h>
@@ -38,6 +43,30 @@ struct Lanes<float> {
     }
 };
 
+// Sums and differences of two sample registers, for the symmetric kernels.
+__attribute__((target("avx2"))) inline __m256d lanes_add(__m256d a, __m256d b) { return _mm256_add_pd(a, b); }
+__attribute__((target("avx2"))) inline __m256d lanes_sub(__m256d a, __m256d b) { return _mm256_sub_pd(a, b); }
+__attribute__((target("avx2"))) inline __m256 lanes_add(__m256 a, __m256 b) { return _mm256_add_ps(a, b); }
+__attribute__((target("avx2"))) inline __m256 lanes_sub(__m256 a, __m256 b) { return _mm256_sub_ps(a, b); }
 
 }  // namespace vlx
 #endif
+
+namespace vlx {
+
+// Cap on the filter kernels' lanes: 0 scalar, 1 AVX2 where the processor has
+// it.  The tests lower it to run the scalar sums on the same machine; it never
+// changes a result.
+inline std::atomic<int32_t> filter_lane_cap{1};
+
+inline int32_t filter_lanes() {
+#ifdef VLX_FILTER_LANES
+    const int32_t have = cpu::has_avx2() ? 1 : 0;
+#else
+    const int32_t have = 0;
+#endif
+    const int32_t cap = filter_lane_cap.load(std::memory_order_relaxed);
+    return cap < have ? cap : have;
+}
+
+}  // namespace vlx
