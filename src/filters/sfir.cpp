@@ -198,13 +198,17 @@ int64_t third_range_lanes(const HalfFilter<T>& f, int64_t w, const T* x, T* y, i
         const int64_t c = count - i < chunk ? count - i : chunk;
         const int64_t k = first + i * step;
         const int64_t stride = (c + reach) * w;
+        const int64_t last = k + step * (c - 1);
+        int64_t dealt = 0;  // points of each phase already in place
+        if (step == 2)
+            dealt = deal_pairs(x + (k - N + 1) * w, deal, deal + stride, (last - k + N) / 2, w * int64_t(sizeof(T)));
         for (int64_t phase = 0; phase < step; ++phase) {
-            T* d = deal + phase * stride;
-            const int64_t last = k + step * (c - 1);
+            T* d = deal + phase * stride + dealt * w;
             if (w == 1) {
-                for (int64_t at = k - N + 1 + phase; at <= last; at += step) *d++ = x[at];
+                for (int64_t at = k - N + 1 + phase + dealt * step; at <= last; at += step) *d++ = x[at];
             } else {
-                for (int64_t at = k - N + 1 + phase; at <= last; at += step, d += 2) d[0] = x[2 * at], d[1] = x[2 * at + 1];
+                for (int64_t at = k - N + 1 + phase + dealt * step; at <= last; at += step, d += 2)
+                    d[0] = x[2 * at], d[1] = x[2 * at + 1];
             }
         }
         const int64_t done = run(deal, stride, y + i * w, c * w) / w;
