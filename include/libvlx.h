@@ -1324,11 +1324,12 @@ VLX_API float vlxff_auto_range(float value);
  * Returns the level in effect, limited by the processor. */
 VLX_API int32_t vlx_transform_lanes(int32_t lanes);
 
-/* --- resampler --- */
+/* --- filters --- */
 
-/* Caps the vector lanes of the polyphase resampler at lanes (0 scalar, 1 AVX2;
- * negative only asks); every level gives the same bits. Returns the level in effect. */
-VLX_API int32_t vlx_resample_lanes(int32_t lanes);
+/* Caps the vector lanes of the filter kernels (FIR, symmetric, decimating,
+ * resampler) at lanes (0 scalar, 1 AVX2; negative only asks); every level
+ * gives the same bits.  Returns the level in effect, limited by the processor. */
+VLX_API int32_t vlx_filter_lanes(int32_t lanes);
 
 #ifdef __cplusplus
 }

@@ -119,7 +119,7 @@ void direct_real_taps(const T* x, T* y, int64_t n, const T* h, int64_t m, const 
     }
     int64_t s = head;
 #ifdef VLX_FILTER_LANES
-    if (cpu::has_avx2()) s = real_taps_avx(x, y, s, end, h, m, w);
+    if (filter_lanes() > 0) s = real_taps_avx(x, y, s, end, h, m, w);
 #endif
     for (; s < end; ++s) y[s] = real_taps_at(x, h, m, w, s);
 }

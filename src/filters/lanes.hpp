@@ -3,11 +3,14 @@
 // expression does.
 #pragma once
 
+#include "core/cpu.hpp"
+
+#include <atomic>
+#include <cstdint>
+
 #if defined(__x86_64__) && defined(__GNUC__)
 #define VLX_FILTER_LANES 1
 #include <immintrin.h>
-
-#include <cstdint>
 
 namespace vlx {
 
@@ -90,6 +93,64 @@ struct Lanes<float> {
     }
 };
 
+// Sums and differences of two sample registers, for the symmetric kernels.
+__attribute__((target("avx2"))) inline __m256d lanes_add(__m256d a, __m256d b) { return _mm256_add_pd(a, b); }
+__attribute__((target("avx2"))) inline __m256d lanes_sub(__m256d a, __m256d b) { return _mm256_sub_pd(a, b); }
+__attribute__((target("avx2"))) inline __m256 lanes_add(__m256 a, __m256 b) { return _mm256_add_ps(a, b); }
+__attribute__((target("avx2"))) inline __m256 lanes_sub(__m256 a, __m256 b) { return _mm256_sub_ps(a, b); }
+
+// Splits pairs of elements of `bytes` bytes each (4, 8 or 16) into the even
+// and the odd ones, each side by side; plain moves, so every bit passes
+// unchanged.  Returns the pairs done: whole registers only.
+__attribute__((target("avx2"))) inline int64_t deal_pairs(const void* from, void* even, void* odd, int64_t pairs,
+                                                          int64_t bytes) {
+    const auto* x = static_cast<const char*>(from);
+    auto* e = static_cast<char*>(even);
+    auto* o = static_cast<char*>(odd);
+    const int64_t per = 32 / bytes;  // pairs of one step: two registers in, one out to each side
+    int64_t i = 0;
+    for (; i + per <= pairs; i += per, x += 64, e += 32, o += 32) {
+        if (bytes == 4) {
+            const __m256 a = _mm256_loadu_ps(reinterpret_cast<const float*>(x));
+            const __m256 b = _mm256_loadu_ps(reinterpret_cast<const float*>(x + 32));
+            // 0 2 | 8 10 | 4 6 | 12 14, then the middle quarters exchanged
+            const __m256d ev = _mm256_castps_pd(_mm256_shuffle_ps(a, b, 0x88));
+            const __m256d od = _mm256_castps_pd(_mm256_shuffle_ps(a, b, 0xDD));
+            _mm256_storeu_pd(reinterpret_cast<double*>(e), _mm256_permute4x64_pd(ev, 0xD8));
+            _mm256_storeu_pd(reinterpret_cast<double*>(o), _mm256_permute4x64_pd(od, 0xD8));
+        } else if (bytes == 8) {
+            const __m256d a = _mm256_loadu_pd(reinterpret_cast<const double*>(x));
+            const __m256d b = _mm256_loadu_pd(reinterpret_cast<const double*>(x + 32));
+            _mm256_storeu_pd(reinterpret_cast<double*>(e), _mm256_permute4x64_pd(_mm256_unpacklo_pd(a, b), 0xD8));
+            _mm256_storeu_pd(reinterpret_cast<double*>(o), _mm256_permute4x64_pd(_mm256_unpackhi_pd(a, b), 0xD8));
+        } else {
+            const __m256d a = _mm256_loadu_pd(reinterpret_cast<const double*>(x));
+            const __m256d b = _mm256_loadu_pd(reinterpret_cast<const double*>(x + 32));
+            _mm256_storeu_pd(reinterpret_cast<double*>(e), _mm256_permute2f128_pd(a, b, 0x20));
+            _mm256_storeu_pd(reinterpret_cast<double*>(o), _mm256_permute2f128_pd(a, b, 0x31));
+        }
+    }
+    return i;
+}
 
 }  // namespace vlx
 #endif
+
+namespace vlx {
+
+// Cap on the filter kernels' lanes: 0 scalar, 1 AVX2 where the processor has
+// it.  The tests lower it to run the scalar sums on the same machine; it never
+// changes a result.
+inline std::atomic<int32_t> filter_lane_cap{1};
+
+inline int32_t filter_lanes() {
+#ifdef VLX_FILTER_LANES
+    const int32_t have = cpu::has_avx2() ? 1 : 0;
+#else
+    const int32_t have = 0;
+#endif
+    const int32_t cap = filter_lane_cap.load(std::memory_order_relaxed);
+    return cap < have ? cap : have;
+}
+
+}  // namespace vlx

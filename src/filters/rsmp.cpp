@@ -7,25 +7,11 @@
 #include "filters/filters.hpp"
 #include "filters/lanes.hpp"
 
-#include <atomic>
 #include <cstdint>
 #include <limits>
 
 namespace vlx {
 namespace {
-
-// Lane levels: 0 scalar, 1 AVX2.  The cap lets the tests run both paths on one
-// machine; it never changes a result.
-std::atomic<int32_t> lane_cap{1};
-
-int32_t lanes_in_effect() {
-    int32_t have = 0;
-#ifdef VLX_FILTER_LANES
-    if (cpu::has_avx2()) have = 1;
-#endif
-    const int32_t cap = lane_cap.load(std::memory_order_relaxed);
-    return cap < have ? cap : have;
-}
 
 // Normalises mu to (-1, 0] by advancing the window.  False if mu is so large
 // (or infinite) that subtracting 1 no longer changes it.
@@ -194,7 +180,7 @@ int32_t rsmp_kernel(V* in, V* out, V* coef, real_t<V> ratio, V* hist, int64_t ta
     const T phases = static_cast<T>(P);
     // The lanes index the block with 32-bit integers, and take only windows
     // whose rounded-up reach stays inside the block.
-    const bool lanes = lanes_in_effect() > 0 && n * w <= std::numeric_limits<int32_t>::max();
+    const bool lanes = filter_lanes() > 0 && n * w <= std::numeric_limits<int32_t>::max();
     int64_t reach = 0;
 #ifdef VLX_FILTER_LANES
     reach = lane_reach<T>(taps, w);
@@ -324,10 +310,6 @@ VLX_API int32_t vlxd_rsmp(vlx_t* in, vlx_t* out, int32_t method, vlx_t* coef, do
 }
 VLX_API int32_t vlxfd_rsmp(vlxf_t* in, vlxf_t* out, int32_t method, vlxf_t* coef, float ratio, vlxf_t* hist) {
     return vlx::rsmp(in, out, method, coef, ratio, hist);
-}
-VLX_API int32_t vlx_resample_lanes(int32_t lanes) {
-    if (lanes >= 0) vlx::lane_cap.store(lanes, std::memory_order_relaxed);
-    return vlx::lanes_in_effect();
 }
 VLX_API int32_t vlxd_rsmp2(vlx_t* in, vlx_t* out, int32_t method, int32_t design, double ratio, vlx_t* hist) {
     return vlx::rsmp2(in, out, method, design, ratio, hist);

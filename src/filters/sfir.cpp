@@ -5,6 +5,7 @@
 #include "core/frame.hpp"
 #include "elementwise/elementwise.hpp"
 #include "filters/filters.hpp"
+#include "filters/lanes.hpp"
 
 #include <cstdint>
 #include <limits>
@@ -89,22 +90,152 @@ inline T sym_output(const HalfFilter<T>& f, const T* x, const T* hist, int64_t k
     return acc;
 }
 
-// Outputs i = 0 .. count-1 at k = first + i * step, of each of the w
-// streams (w a constant, so that the strides fold into the addressing).
+// Outputs i = from .. to-1 at k = first + i * step, of each of the w streams
+// (w a constant, so that the strides fold into the addressing).
 template <int64_t w, class T>
-void sym_outputs(const HalfFilter<T>& f, const T* x, const T* hist, T* y, int64_t count, int64_t first, int64_t step) {
+void sym_outputs(const HalfFilter<T>& f, const T* x, const T* hist, T* y, int64_t from, int64_t to, int64_t first,
+                 int64_t step) {
     for (int64_t c = 0; c < w; ++c)
-        for (int64_t i = 0; i < count; ++i)
+        for (int64_t i = from; i < to; ++i)
             y[i * w + c] = sym_output<w>(f, x + c, hist != nullptr ? hist + c : nullptr, first + i * step);
 }
+
+#ifdef VLX_FILTER_LANES
+// Most tap pairs the lanes take (the decimating kernel's limit gives 60).
+constexpr int64_t lane_pairs_max = 64;
+
+template <bool anti, class R>
+__attribute__((target("avx2"))) inline R pair_of(R newer, R older) {
+    if constexpr (anti)
+        return lanes_sub(newer, older);
+    else
+        return lanes_add(newer, older);
+}
+
+// Third-range outputs side by side, one scalar per lane: lane q starts from 0
+// and adds, pair by pair in order, h[j] times the sum (or difference) of
+// newest[j][q] and oldest[j][q], then h[m-1] times centre[q] if odd; the
+// scalar order, with a separate multiply and add.  Four registers at a time,
+// then one.  Returns the first scalar left over.
+template <bool anti, class T>
+__attribute__((target("avx2"))) int64_t pair_lanes(const HalfFilter<T>& f, const T* const* newest,
+                                                   const T* const* oldest, const T* centre, T* y, int64_t end) {
+    using L = Lanes<T>;
+    using R = typename L::reg;
+    constexpr int64_t n = L::width;
+    const T* h = f.h;
+    const int64_t p = f.p;
+    int64_t q = 0;
+    for (; q + 4 * n <= end; q += 4 * n) {
+        R a0 = L::zero(), a1 = a0, a2 = a0, a3 = a0;
+        for (int64_t j = 0; j < p; ++j) {
+            const R c = L::broadcast(h + j);
+            const T* u = newest[j] + q;
+            const T* v = oldest[j] + q;
+            a0 = L::add_product(a0, c, pair_of<anti>(L::load(u), L::load(v)));
+            a1 = L::add_product(a1, c, pair_of<anti>(L::load(u + n), L::load(v + n)));
+            a2 = L::add_product(a2, c, pair_of<anti>(L::load(u + 2 * n), L::load(v + 2 * n)));
+            a3 = L::add_product(a3, c, pair_of<anti>(L::load(u + 3 * n), L::load(v + 3 * n)));
+        }
+        if (f.odd) {
+            const R c = L::broadcast(h + f.m - 1);
+            const T* u = centre + q;
+            a0 = L::add_product(a0, c, L::load(u));
+            a1 = L::add_product(a1, c, L::load(u + n));
+            a2 = L::add_product(a2, c, L::load(u + 2 * n));
+            a3 = L::add_product(a3, c, L::load(u + 3 * n));
+        }
+        L::store(y + q, a0);
+        L::store(y + q + n, a1);
+        L::store(y + q + 2 * n, a2);
+        L::store(y + q + 3 * n, a3);
+    }
+    for (; q + n <= end; q += n) {
+        R a0 = L::zero();
+        for (int64_t j = 0; j < p; ++j)
+            a0 = L::add_product(a0, L::broadcast(h + j), pair_of<anti>(L::load(newest[j] + q), L::load(oldest[j] + q)));
+        if (f.odd) a0 = L::add_product(a0, L::broadcast(h + f.m - 1), L::load(centre + q));
+        L::store(y + q, a0);
+    }
+    return q;
+}
+
+// Outputs i .. count-1, all in the third range, through the lanes; returns
+// the first output left to the scalar sums.  Without decimation the lanes
+// read the source in place.  With it, the source is dealt chunk by chunk
+// into one array per phase of k on the stack, so that the samples of
+// consecutive kept outputs lie side by side.
+template <class T>
+int64_t third_range_lanes(const HalfFilter<T>& f, int64_t w, const T* x, T* y, int64_t i, int64_t count,
+                          int64_t first, int64_t step) {
+    const int64_t N = f.N;
+    if (f.p > lane_pairs_max || i >= count) return i;
+    const T* newest[lane_pairs_max];
+    const T* oldest[lane_pairs_max];
+    const T* centre = nullptr;
+    // t counts points from the oldest sample of an output's window
+    const auto point = [&](const T* base, int64_t t, int64_t stride) {
+        return base + (t % step) * stride + (t / step) * w;
+    };
+    const auto run = [&](const T* base, int64_t stride, T* out, int64_t scalars) {
+        for (int64_t j = 0; j < f.p; ++j) {
+            newest[j] = point(base, N - 1 - j, stride);
+            oldest[j] = point(base, j, stride);
+        }
+        centre = point(base, N - f.m, stride);
+        return f.anti ? pair_lanes<true>(f, newest, oldest, centre, out, scalars)
+                      : pair_lanes<false>(f, newest, oldest, centre, out, scalars);
+    };
+    if (step == 1) return i + run(x + (first + i - N + 1) * w, 0, y + i * w, (count - i) * w) / w;
+
+    constexpr int64_t room = 2048;  // scalars
+    T deal[room];
+    const int64_t reach = (N - 1) / step + 1;  // points of a phase array beyond the chunk's outputs
+    // a multiple of 32 outputs fills whole registers in either precision
+    const int64_t chunk = (room / w / step - reach) / 32 * 32;
+    if (chunk <= 0) return i;
+    while (i < count) {
+        const int64_t c = count - i < chunk ? count - i : chunk;
+        const int64_t k = first + i * step;
+        const int64_t stride = (c + reach) * w;
+        const int64_t last = k + step * (c - 1);
+        int64_t dealt = 0;  // points of each phase already in place
+        if (step == 2)
+            dealt = deal_pairs(x + (k - N + 1) * w, deal, deal + stride, (last - k + N) / 2, w * int64_t(sizeof(T)));
+        for (int64_t phase = 0; phase < step; ++phase) {
+            T* d = deal + phase * stride + dealt * w;
+            if (w == 1) {
+                for (int64_t at = k - N + 1 + phase + dealt * step; at <= last; at += step) *d++ = x[at];
+            } else {
+                for (int64_t at = k - N + 1 + phase + dealt * step; at <= last; at += step, d += 2)
+                    d[0] = x[2 * at], d[1] = x[2 * at + 1];
+            }
+        }
+        const int64_t done = run(deal, stride, y + i * w, c * w) / w;
+        i += done;
+        if (done < c) break;
+    }
+    return i;
+}
+#endif
 
 template <class T>
 void sym_outputs(const HalfFilter<T>& f, int64_t w, const T* x, const T* hist, T* y, int64_t count, int64_t first,
                  int64_t step) {
-    if (w == 2)
-        sym_outputs<2>(f, x, hist, y, count, first, step);
-    else
-        sym_outputs<1>(f, x, hist, y, count, first, step);
+    // outputs before mid reach into the history
+    int64_t mid = first >= f.N - 1 ? 0 : (f.N - 1 - first + step - 1) / step;
+    if (mid > count) mid = count;
+    int64_t done = mid;
+#ifdef VLX_FILTER_LANES
+    if (filter_lanes() > 0) done = third_range_lanes(f, w, x, y, mid, count, first, step);
+#endif
+    if (w == 2) {
+        sym_outputs<2>(f, x, hist, y, 0, mid, first, step);
+        sym_outputs<2>(f, x, hist, y, done, count, first, step);
+    } else {
+        sym_outputs<1>(f, x, hist, y, 0, mid, first, step);
+        sym_outputs<1>(f, x, hist, y, done, count, first, step);
+    }
 }
 
 template <class T>
@@ -273,5 +404,9 @@ VLX_API int32_t vlxd_sfir_deci(vlx_t* in, vlx_t* out, vlx_t* filter, int32_t odd
 VLX_API int32_t vlxfd_sfir_deci(vlxf_t* in, vlxf_t* out, vlxf_t* filter, int32_t odd, int32_t anti, int32_t factor,
                                 vlxf_t* hist) {
     return vlx::sfir_deci(in, out, filter, odd, anti, factor, hist);
+}
+VLX_API int32_t vlx_filter_lanes(int32_t lanes) {
+    if (lanes >= 0) vlx::filter_lane_cap.store(lanes, std::memory_order_relaxed);
+    return vlx::filter_lanes();
 }
 }

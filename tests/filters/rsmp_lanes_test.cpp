@@ -24,7 +24,7 @@ TYPED_TEST(ResampleLanes, SameBitsAsScalar) {
         const auto x = random_values<T>(size_t(3000 * (cx ? 2 : 1)), uint32_t(trial));
         std::vector<T> got[2], past[2];
         for (int32_t lanes : {0, 1}) {
-            EXPECT_LE(vlx_resample_lanes(lanes), lanes);
+            EXPECT_LE(vlx_filter_lanes(lanes), lanes);
             Vec<V> hist;
             got[lanes] = in_blocks<V>(x, cx, uint32_t(trial), [&](V* in, V* out) {
                 out->points = trial % 5 ? 100000 : cap;
@@ -34,7 +34,7 @@ TYPED_TEST(ResampleLanes, SameBitsAsScalar) {
         }
         EXPECT_TRUE(same_scalars(got[1], got[0]) && same_scalars(past[1], past[0])) << "trial " << trial;
     }
-    vlx_resample_lanes(1);
+    vlx_filter_lanes(1);
 }
 
 }  // namespace
