@@ -67,33 +67,31 @@ struct ShapeCase {
     std::function<Sample<real_of<V>>(Sample<real_of<V>>, Sample<real_of<V>>, bool, bool)> ref;
 };
 
+// A two-source operation with its destination.
+#define BOP(fn) [](V* a, V* b, V* d) { return fn(a, b, d); }
+
 TYPED_TEST(Binary, EveryShapeWithEveryAliasingMatchesTheStatedOrder) {
     using V = TypeParam; using T = real_of<V>;
     using S = Sample<T>;
     const T alpha = T(0.3);
     const std::vector<ShapeCase<V>> cases = {
-        {"add", [](V* a, V* b, V* d) { return t_add(a, b, d); },
-         [](S a, S b, bool, bool) { return S(a.real() + b.real(), a.imag() + b.imag()); }},
-        {"sub", [](V* a, V* b, V* d) { return t_sub(a, b, d); },
+        {"add", BOP(t_add), [](S a, S b, bool, bool) { return S(a.real() + b.real(), a.imag() + b.imag()); }},
+        {"sub", BOP(t_sub),
          [](S a, S b, bool ac, bool) { return S(a.real() - b.real(), ac ? a.imag() - b.imag() : -b.imag()); }},
-        {"mul", [](V* a, V* b, V* d) { return t_mul(a, b, d); },
-         [](S a, S b, bool ac, bool bc) {
+        {"mul", BOP(t_mul), [](S a, S b, bool ac, bool bc) {
              if (ac && bc) return S(b.real() * a.real() - b.imag() * a.imag(), a.imag() * b.real() + b.imag() * a.real());
              return ac ? S(a.real() * b.real(), a.imag() * b.real()) : S(a.real() * b.real(), a.real() * b.imag());
          }},
-        {"conj_mul", [](V* a, V* b, V* d) { return t_conj_mul(a, b, d); },
-         [](S a, S b, bool ac, bool bc) {
+        {"conj_mul", BOP(t_conj_mul), [](S a, S b, bool ac, bool bc) {
              if (ac && bc) return S(b.imag() * a.imag() + b.real() * a.real(), a.imag() * b.real() - b.imag() * a.real());
              return ac ? S(a.real() * b.real(), a.imag() * b.real()) : S(a.real() * b.real(), -(a.real() * b.imag()));
          }},
-        {"div", [](V* a, V* b, V* d) { return t_div(a, b, d); },
-         [](S a, S b, bool ac, bool bc) {
+        {"div", BOP(t_div), [](S a, S b, bool ac, bool bc) {
              if (!bc) {
                  const T r = T(1) / b.real();
                  return ac ? S(a.real() * r, a.imag() * r) : S(a.real() / b.real(), 0);
              }
-             const T m = b.imag() * b.imag() + b.real() * b.real();
-             const T r = T(1) / m;
+             const T m = b.imag() * b.imag() + b.real() * b.real(), r = T(1) / m;
              return S((b.imag() * a.imag() + b.real() * a.real()) * r, (a.imag() * b.real() - b.imag() * a.real()) * r);
          }},
         {"avg_add", [alpha](V* a, V* b, V* d) { return t_avg_add(a, b, d, alpha); },
@@ -102,13 +100,11 @@ TYPED_TEST(Binary, EveryShapeWithEveryAliasingMatchesTheStatedOrder) {
              if (ac && bc) return S(re, (a.imag() - b.imag()) * alpha + b.imag());
              return ac ? S(re, alpha * a.imag()) : S(re, b.imag() * (T(1) - alpha));
          }},
-        {"max", [](V* a, V* b, V* d) { return t_max(a, b, d); },
-         [](S a, S b, bool ac, bool bc) {
+        {"max", BOP(t_max), [](S a, S b, bool ac, bool bc) {
              if (!ac && !bc) return a.real() > b.real() ? a : b;
              return rank<V>(a) > rank<V>(b) ? a : b;
          }},
-        {"min", [](V* a, V* b, V* d) { return t_min(a, b, d); },
-         [](S a, S b, bool ac, bool bc) {
+        {"min", BOP(t_min), [](S a, S b, bool ac, bool bc) {
              if (!ac && !bc) return a.real() < b.real() ? a : b;
              return rank<V>(b) > rank<V>(a) ? a : b;
          }},

@@ -22,18 +22,11 @@ std::pair<real_of<V>, real_of<V>> sample(Vec<V>& v, int64_t k) {
 VLX_TYPED_SUITE(Layout);
 
 TYPED_TEST(Layout, RealAndImaginaryParts) {
-    using V = TypeParam;
-    using R = std::vector<real_of<V>>;
-    Vec<V> c({1, -2, 3, -4, 5, -6}, true), d({1, -2, 3, -4, 5, -6}, true), r({7, 8, 9});
-    ASSERT_TRUE(t_real(&c) == 0 && t_imag(&d) == 0);
-    EXPECT_EQ(c.values(), (R{1, 3, 5}));
-    EXPECT_EQ(c->alloc, 6);
-    EXPECT_EQ(d.values(), (R{-2, -4, -6}));
-    EXPECT_EQ(d->complex, 0);
-    ASSERT_EQ(t_real(&r), 0);
-    EXPECT_EQ(r.values(), (R{7, 8, 9}));
-    ASSERT_EQ(t_imag(&r), 0);  // the imaginary part of a real signal
-    EXPECT_EQ(r.values(), (R{0, 0, 0}));
+    using R = std::vector<real_of<TypeParam>>;
+    Vec<TypeParam> c({1, -2, 3, -4, 5, -6}, true), d({1, -2, 3, -4, 5, -6}, true), r({7, 8, 9}), q({7, 8, 9});
+    ASSERT_TRUE(t_real(&c) == 0 && t_imag(&d) == 0 && t_real(&r) == 0 && t_imag(&q) == 0);
+    EXPECT_TRUE(c.values() == (R{1, 3, 5}) && c->alloc == 6 && d.values() == (R{-2, -4, -6}) && d->complex == 0);
+    EXPECT_TRUE(r.values() == (R{7, 8, 9}) && q.values() == (R{0, 0, 0}));  // the imaginary part of a real signal is 0
 }
 
 // Reversal, the two half rotations and the shift against their index formulas, on both parities and lengths past the
@@ -114,17 +107,13 @@ TYPED_TEST(Layout, InvalidFlagsAreSeenAfterGrowingAndBeforeUnpadding) {
     }
 }
 
+// Zeros between the samples halve delta; the complex form scales, into itself or into another vector.
 TYPED_TEST(Layout, ZeroInterleave) {
     using V = TypeParam; using T = real_of<V>;
-    Vec<V> r({1, 2});
+    Vec<V> r({1, 2}), c({1, 2, 3, 4}, true), d;
     r->delta = 3;
-    ASSERT_EQ(t_zinter(&r), 0);
-    EXPECT_EQ(r.values(), (std::vector<T>{1, 0, 2, 0}));
-    EXPECT_EQ(r->delta, T(1.5));
-    // complex, into itself and into another vector
-    Vec<V> c({1, 2, 3, 4}, true);
-    Vec<V> d;
-    ASSERT_TRUE(t_uzinter(&c, &d, T(2)) == 0 && t_uzinter(&c, &c, T(2)) == 0);
+    ASSERT_TRUE(t_zinter(&r) == 0 && t_uzinter(&c, &d, T(2)) == 0 && t_uzinter(&c, &c, T(2)) == 0);
+    EXPECT_TRUE(r.values() == (std::vector<T>{1, 0, 2, 0}) && r->delta == T(1.5));
     const std::vector<T> want{2, 4, 0, 0, 6, 8, 0, 0};
     EXPECT_TRUE(c.values() == want && d.values() == want && d->complex == 1);
 }

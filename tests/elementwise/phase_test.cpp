@@ -58,16 +58,8 @@ TYPED_TEST(Phase, FixedCases) {
     const T b = bound_of<TypeParam>();
     const T nan = std::numeric_limits<T>::quiet_NaN();
     int32_t clipped = -5;
-    struct Row {
-        const char* what;
-        std::function<int32_t(TypeParam*)> op;
-        std::vector<T> in;
-        bool complex;
-        T delta;
-        std::vector<T> out;
-        int32_t points, out_complex;
-        T out_delta = -1;  // -1: the input's
-    };
+    struct Row { const char* what; std::function<int32_t(TypeParam*)> op; std::vector<T> in; bool complex; T delta;
+                 std::vector<T> out; int32_t points, out_complex; T out_delta = -1; };  // out_delta -1: the input's
     const T two_pi = T(6.283185307179586);
     const Row rows[] = {
         {"unwrap", [](auto* v) { return t_unwrap(v); }, {3, -3}, false, 1, {3, T(-3) + two_pi}, 2, 0},
