@@ -115,6 +115,7 @@ TYPED_TEST(Binary, EveryShapeWithEveryAliasingMatchesTheStatedOrder) {
     }
 }
 
+// The shorter source counts as zeros up to the longer's length, also when it is the destination; delta is the mean.
 TYPED_TEST(Binary, UnequalLengthsZeroExtendInAddAndSub) {
     using V = TypeParam; using T = real_of<V>;
     struct Row { bool a_shorter, dst_is_shorter, sub; std::vector<T> want; };
@@ -125,17 +126,11 @@ TYPED_TEST(Binary, UnequalLengthsZeroExtendInAddAndSub) {
     };
     for (const Row& r : rows) {
         Vec<V> s({1, 2, 3}), l({10, 20, 30, 40, 50}), out;
-        s->delta = 1;
-        l->delta = 3;
-        V* a = r.a_shorter ? s.get() : l.get();
-        V* b = r.a_shorter ? l.get() : s.get();
-        V* d = r.dst_is_shorter ? s.get() : out.get();
+        s->delta = 1, l->delta = 3;
+        V *a = r.a_shorter ? s.get() : l.get(), *b = r.a_shorter ? l.get() : s.get(), *d = r.dst_is_shorter ? s.get() : out.get();
         ASSERT_EQ(r.sub ? t_sub(a, b, d) : t_add(a, b, d), 0);
-        EXPECT_TRUE(d->points == 5 && d->delta == T(2));
-        EXPECT_EQ(std::vector<T>(d->data, d->data + 5), r.want) << r.a_shorter << r.dst_is_shorter << r.sub;
-        if (!r.dst_is_shorter) {
-            EXPECT_EQ(s.values(), (std::vector<T>{1, 2, 3}));
-        }
+        EXPECT_TRUE(d->points == 5 && d->delta == T(2) && std::vector<T>(d->data, d->data + 5) == r.want);
+        EXPECT_TRUE(r.dst_is_shorter || s.values() == (std::vector<T>{1, 2, 3})) << r.a_shorter << r.dst_is_shorter << r.sub;
     }
 }
 
@@ -192,49 +187,40 @@ TYPED_TEST(Binary, InterleaveAndRitoc) {
     using V = TypeParam; using T = real_of<V>;
     for (int alias = 0; alias < 3; ++alias) {
         Vec<V> a({1, 2, 3}), b({10, 11, 20, 21, 30, 31}, true), third;
-        a->delta = 1;
-        b->delta = 1;
+        a->delta = b->delta = 1;
         V* d = alias == 0 ? third.get() : alias == 1 ? a.get() : b.get();
-        ASSERT_EQ(t_inter(a.get(), b.get(), d), 0);
-        EXPECT_TRUE(has_shape(d, 6, 1, 0.5));
+        ASSERT_TRUE(t_inter(a.get(), b.get(), d) == 0 && has_shape(d, 6, 1, 0.5));
         EXPECT_EQ(std::vector<T>(d->data, d->data + 12), (std::vector<T>{1, 0, 10, 11, 2, 0, 20, 21, 3, 0, 30, 31}));
     }
-    Vec<V> a({1, 2, 3}), b({4, 5, 6}), c({1, 0}, true), shorter({1});
+    Vec<V> a({1, 2, 3}), b({4, 5, 6}), c({1, 0}, true), shorter({1}), re({1, 2, 3}), im({4, 5, 6});
     ASSERT_EQ(t_inter(a.get(), a.get(), a.get()), 0);
     EXPECT_EQ(a.values(), (std::vector<T>{1, 1, 2, 2, 3, 3}));
     EXPECT_TRUE(t_inter(b.get(), shorter.get(), b.get()) == -1 && b->points == 3);
-
     EXPECT_TRUE(t_ritoc(c.get(), shorter.get(), b.get()) == -1 && t_ritoc(b.get(), shorter.get(), b.get()) == -1);
     EXPECT_EQ(b->complex, 0);
-    Vec<V> re({1, 2, 3}), im({4, 5, 6});
     ASSERT_EQ(t_ritoc(re.get(), im.get(), im.get()), 0);
     EXPECT_EQ(im.values(), (std::vector<T>{1, 4, 2, 5, 3, 6}));
 }
 
 TYPED_TEST(Binary, PolynomialProductAgainstDirectConvolution) {
     using V = TypeParam; using T = real_of<V>;
-    for (int shape = 0; shape < 4; ++shape) {
-        const bool ac = shape & 1, bc = shape & 2;
+    using LC = std::complex<long double>;
+    const int na = 9, nb = 5;
+    for (int shape = 0; shape < 4; ++shape)
         for (bool alias : {false, true}) {
-            const int na = 9, nb = 5;
-            Vec<V> a(random_values<T>(na * (ac ? 2 : 1), 5 + shape), ac);
-            Vec<V> b(random_values<T>(nb * (bc ? 2 : 1), 7 + shape), bc);
-            std::vector<std::complex<long double>> want(na + nb - 1);
+            const bool ac = shape & 1, bc = shape & 2;
+            Vec<V> a(random_values<T>(na * (ac ? 2 : 1), 5 + shape), ac), b(random_values<T>(nb * (bc ? 2 : 1), 7 + shape), bc), out;
+            std::vector<LC> want(na + nb - 1);
             for (int i = 0; i < na; ++i)
-                for (int j = 0; j < nb; ++j) want[i + j] += std::complex<long double>(at(a.get(), i)) * std::complex<long double>(at(b.get(), j));
-            Vec<V> out;
+                for (int j = 0; j < nb; ++j) want[i + j] += LC(at(a.get(), i)) * LC(at(b.get(), j));
             V* d = alias ? b.get() : out.get();
-            ASSERT_TRUE(t_pmul(a.get(), b.get(), d) == 0 && d->points == na + nb - 1);
-            EXPECT_EQ(d->complex, (ac || bc) ? 1 : 0);
+            ASSERT_TRUE(t_pmul(a.get(), b.get(), d) == 0 && d->points == na + nb - 1 && d->complex == ((ac || bc) ? 1 : 0));
             const long double tol = 16 * std::numeric_limits<T>::epsilon();
-            for (int k = 0; k < na + nb - 1; ++k) {
+            for (int k = 0; k < na + nb - 1; ++k)
                 EXPECT_TRUE(near(at(d, k).real(), want[k].real(), tol) && near(at(d, k).imag(), want[k].imag(), tol)) << k;
-            }
         }
-    }
     Vec<V> a({1, 2}), empty, d({7});
-    ASSERT_EQ(t_pmul(a.get(), empty.get(), d.get()), 0);
-    EXPECT_EQ(d->points, 0);
+    EXPECT_TRUE(t_pmul(a.get(), empty.get(), d.get()) == 0 && d->points == 0);
 }
 
 TYPED_TEST(Binary, DotSumsEveryPointWithLanePartialSums) {

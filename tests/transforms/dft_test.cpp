@@ -17,8 +17,7 @@ void literal_mul(std::vector<T>& v, bool& cplx, const std::vector<T>& c) {
     std::vector<T> out(c.size());
     for (size_t i = 0; i < c.size() / 2; ++i) {
         const T ar = cplx ? v[2 * i] : v[i], ai = cplx ? v[2 * i + 1] : 0, br = c[2 * i], bi = c[2 * i + 1];
-        out[2 * i] = cplx ? br * ar - bi * ai : ar * br;
-        out[2 * i + 1] = cplx ? ai * br + bi * ar : ar * bi;
+        out[2 * i] = cplx ? br * ar - bi * ai : ar * br, out[2 * i + 1] = cplx ? ai * br + bi * ar : ar * bi;
     }
     v = out, cplx = true;
 }
