@@ -1,5 +1,4 @@
-// Two-operand operations through the C interface: every shape with every aliasing of the destination, against
-// per-sample references in the stated order of operations, plus the fixed values of the zero rule and the clamps.
+// Two-operand operations: every shape and aliasing against the stated order bit for bit, the zero rule, the clamps.
 #include "vlx_test.hpp"
 
 #include <complex>

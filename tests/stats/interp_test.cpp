@@ -1,5 +1,4 @@
-// Interpolation: splines reproduce a cubic under every end condition that can, the lower methods reproduce their own
-// polynomials, and failures leave what they should.
+// Interpolation: splines reproduce a cubic, the lower methods their own polynomials, failures leave what they should.
 #include "stats_support.hpp"
 
 using namespace vlxtest;

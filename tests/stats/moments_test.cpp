@@ -1,5 +1,4 @@
-// Moments against long-double references, the block order of the sums bit for bit, and the fixed results of
-// degenerate, huge and NaN inputs.
+// Moments: long-double references, the block order of the sums bit for bit, degenerate, huge and NaN inputs.
 #include "stats_support.hpp"
 
 #include <functional>

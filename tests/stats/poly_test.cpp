@@ -1,5 +1,4 @@
-// Polynomials: roots checked against their polynomial in long double, the expansion back to coefficients, the closed
-// forms' layout, the single-root searches' fixed cases, the bounds, and allocation failure.
+// Polynomials: roots against their polynomial in long double, expansion back, closed forms, single-root searches.
 #include "stats_support.hpp"
 
 #include <algorithm>

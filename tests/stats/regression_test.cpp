@@ -1,5 +1,4 @@
-// Regression: the twenty-number record against the closed-form least squares in long double, and the settled results
-// of degenerate vectors.
+// Regression: the twenty-number record against least squares in long double, and degenerate vectors.
 #include "stats_support.hpp"
 
 using namespace vlxtest;

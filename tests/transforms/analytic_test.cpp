@@ -1,5 +1,4 @@
-// Analytic signal and Hilbert transform: tones turn cos into sin, DC and Nyquist have no quadrature part, and the
-// short lengths keep their shape.
+// Analytic signal and Hilbert transform: tones, the DC and Nyquist bins, short lengths.
 #include "fft_reference.hpp"
 
 using namespace vlxtest;

@@ -1,5 +1,4 @@
-// Cosine transform: against its definition in long double, bit for bit against the reordering, table and rotation
-// written out on the library's real transforms, round trips, and the edges of length and flags.
+// Cosine transform: its definition in long double, the literal recipe bit for bit, round trips, edges.
 #include "fft_reference.hpp"
 
 using namespace vlxtest;

@@ -1,5 +1,4 @@
-// Transforms of any length: accuracy against long double, the chirp path bit for bit against a literal chirp-z on the
-// literal power-of-two engine (through cache turns), delta, and the real forms.
+// Transforms of any length: long-double accuracy, the chirp path bit for bit through cache turns, delta, real forms.
 #include "fft_reference.hpp"
 
 using namespace vlxtest;

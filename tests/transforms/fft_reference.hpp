@@ -1,5 +1,4 @@
-// References for the power-of-two transforms: a literal stage-by-stage split-radix engine (the bit-exactness
-// yardstick for the library's reordered engine), and long-double transforms for accuracy.
+// References for the power-of-two transforms: the literal split-radix recipes, bit for bit, and a long-double sum.
 #pragma once
 
 #include "vlx_test.hpp"
