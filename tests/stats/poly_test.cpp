@@ -239,12 +239,3 @@ TYPED_TEST(Poly, SkippedCyclesChangeNoBit) {
         }
     }
 }
-
-TYPED_TEST(Poly, AllocationFailure) {
-    using T = real_of<TypeParam>;
-    Vec<TypeParam> quartic{1, 0, 0, 0, 1}, dst, list{1, 2, 3}, coefficients{2, -3, 1};
-    FailingAlloc<TypeParam> failing;
-    EXPECT_TRUE(t_proots(quartic.get(), dst.get()) == -1 && t_pcsolve(quartic.get(), dst.get(), T(0), T(0)) == -1);
-    EXPECT_TRUE(t_peval(quartic.get(), dst.get(), T(0)) == -1 && t_pztoc(list.get()) < 0);
-    EXPECT_LT(iproots(coefficients.get()), 0);
-}
