@@ -58,13 +58,11 @@ TYPED_TEST(Peak, FixedCases) {
             << row.what << ": " << r.value;
         EXPECT_EQ(r.position, row.position) << row.what;
     }
-    // three equal samples: the parabola divides by zero and still succeeds
-    Vec<TypeParam> flat{1, 1, 1};
-    const auto r = run_peak(flat, VLX_PEAK_PARABOLA | VLX_PEAK_AT_INDEX, 1);
+    // three equal samples: the parabola divides by zero and still succeeds; the last sample as maximum uses the pair
+    // points-2, points-1
+    Vec<TypeParam> flat{1, 1, 1}, rising{1, 2, 3, 4};
+    const auto r = run_peak(flat, VLX_PEAK_PARABOLA | VLX_PEAK_AT_INDEX, 1), lr = run_peak(rising, VLX_PEAK_LOG_RATIO);
     EXPECT_TRUE(r.status == 0 && std::isnan(r.position));
-    // the last sample as maximum uses the pair points-2, points-1
-    Vec<TypeParam> rising{1, 2, 3, 4};
-    const auto lr = run_peak(rising, VLX_PEAK_LOG_RATIO);
     EXPECT_TRUE(lr.status == 0 && lr.position > T(2.5) && lr.position < T(3));
 }
 
