@@ -113,8 +113,6 @@ FAULTS = [
     ("poly-skip-overrun", "src/stats/poly.cpp", "const int64_t skip = (end - i) / period * period;",
      "const int64_t skip = (end - i + period - 1) / period * period;", "stats",
      "root search skips one cycle past the end of its kind of round"),
-    ("poly-skip-straddle", "src/stats/poly.cpp", "(i - period >= relative_rounds ? rounds : i)",
-     "(i >= relative_rounds ? rounds : i)", "stats", "root search skips a cycle that straddles the change of round kind"),
     ("hilbert-nyquist", "src/transforms/analytic.cpp", "const int64_t h = (n + 1) / 2;", "const int64_t h = n / 2 + 1;",
      "transforms", "Hilbert transform turns the Nyquist bin as a positive frequency"),
     ("avg-mixed-weight", "src/elementwise/binary.cpp", "bi * (T(1) - alpha)", "(bi - bi * alpha)", "elementwise",
