@@ -164,19 +164,6 @@ TYPED_TEST(Moments, InPlaceAndComplexShape) {
     EXPECT_TRUE(r.complex == 0 && near(r.re, T(8) / 3 + T(200), 1e-4));
 }
 
-// A failed allocation is a status: dst is left empty, nothing is written.
-TEST(MomentsHooks, AllocationFailureIsReported) {
-    vlx_t src{1.0, nullptr, 0, 3, 0, 0};
-    double lent[3] = {1, 2, 3};
-    src.data = lent;  // lent storage: no allocation needed to read it
-    Vec<vlx_t> dst;
-    FailingAlloc<vlx_t> failing;
-    EXPECT_TRUE(vlxs_sum(&src, dst.get()) == -1 && dst->points == 0 && dst->data == nullptr);
-    EXPECT_TRUE(vlxs_median(&src, dst.get()) == -1 && vlxs_hist(&src, dst.get(), 0, 1, 4) == -1);
-    EXPECT_EQ(vlxs_peak(&src, dst.get(), VLX_PEAK_SAMPLE, 0), -1);
-    EXPECT_EQ(vlxs_peak(&src, &src, VLX_PEAK_SAMPLE, 0), -1);
-}
-
 namespace {
 VLX_TWIN(s, lin_regres) VLX_TWIN(s, lin_regres2)
 
