@@ -98,9 +98,7 @@ TYPED_TEST(Layout, InvalidFlagsAreSeenAfterGrowingAndBeforeUnpadding) {
         Vec<V> v({1, 2, 3});
         EXPECT_EQ(t_zpad2(&v, 3, flags), 0);  // nothing to do comes first
         EXPECT_TRUE(t_unzpad(&v, 3, flags) == 0 && v->points == 3 && t_zpad2(&v, 5, flags) == -1);
-        EXPECT_EQ(v->points, 5);  // grown, new samples unset
-        EXPECT_GE(v->alloc, 5);
-        EXPECT_EQ((std::vector<T>{v[0], v[1], v[2]}), (std::vector<T>{1, 2, 3}));
+        EXPECT_TRUE(v->points == 5 && v->alloc >= 5 && (std::vector<T>{v[0], v[1], v[2]}) == (std::vector<T>{1, 2, 3}));  // grown
         const auto before = v.values();
         EXPECT_TRUE(t_unzpad(&v, 2, flags) == -1 && v->points == 5 && v.values() == before);
     }
@@ -203,7 +201,4 @@ TYPED_TEST(Layout, PhaseFixedCases) {
     Vec<TypeParam> cx({1, 2}, true);
     EXPECT_TRUE(t_edge(cx.get(), 1, T(0)) == -1 && t_unwrap(cx.get()) == -1 && t_unwrap_wnd(cx.get(), 2) == -1);
     EXPECT_TRUE(t_unwrap_wnd(inside.get(), -1) == -1 && same_scalars(inside.values(), {0.5, -1}));
-    Vec<TypeParam> grow{1, 2, 3};
-    FailingAlloc<TypeParam> failing;
-    EXPECT_TRUE(t_rtop(grow.get()) == -1 && grow->points == 0);
 }

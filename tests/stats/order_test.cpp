@@ -27,27 +27,23 @@ TYPED_TEST(Order, SortOrders) {
 // keep every sample, and must still order the samples without NaN.
 TYPED_TEST(Order, SortSurvivesNaN) {
     using T = real_of<TypeParam>;
-    const T nan = std::numeric_limits<T>::quiet_NaN();
-    auto multiset = [](std::vector<T> s) {
+    auto multiset = [](std::vector<T> s) {  // NaN counted as +inf
         for (auto& e : s) e = std::isnan(e) ? std::numeric_limits<T>::infinity() : e;
         std::sort(s.begin(), s.end());
         return s;
     };
-    for (const bool is_complex : {false, true}) {
-        for (const int n : {1, 2, 17, 100, 4000}) {
+    for (const bool is_complex : {false, true})
+        for (const int n : {1, 2, 17, 100, 4000})
             for (const size_t every : {1, 2, 3, 7}) {
                 auto x = random_values<T>(static_cast<size_t>(is_complex ? 2 * n : n), uint32_t(n + every));
-                for (size_t i = 0; i < x.size(); i += every) x[i] = nan;
+                for (size_t i = 0; i < x.size(); i += every) x[i] = std::numeric_limits<T>::quiet_NaN();
                 Vec<TypeParam> v(x, is_complex);
                 ASSERT_EQ(t_sort(v.get()), 0);
-                EXPECT_EQ(multiset(v.values()), multiset(x)) << "samples lost, n=" << n;
-                if (is_complex) continue;
                 auto y = v.values();
+                EXPECT_EQ(multiset(y), multiset(x)) << "samples lost, n=" << n;
                 y.erase(std::remove_if(y.begin(), y.end(), [](T e) { return std::isnan(e); }), y.end());
-                EXPECT_TRUE(std::is_sorted(y.begin(), y.end()));
+                EXPECT_TRUE(is_complex || std::is_sorted(y.begin(), y.end()));
             }
-        }
-    }
 }
 
 TYPED_TEST(Order, Median) {
