@@ -23,10 +23,8 @@ Sample<real_of<V>> at(V* v, int64_t i) {
     return v->complex ? Sample<real_of<V>>(v->data[2 * i], v->data[2 * i + 1]) : Sample<real_of<V>>(v->data[i], 0);
 }
 
-// Runs `op` on random sources of every shape with dst a third vector, a, or b, and compares each result sample bit
-// for bit with ref(a_i, b_i).  The third-vector case takes the library's vectorised loops, the aliased ones the
-// scalar order, so both meet the same reference; a real source that is dst grows (and may move) into the complex
-// result.
+// `op` on sources of every shape, dst a third vector (the vector loops), a or b (the scalar order, a real dst
+// growing into the complex result), each sample bit for bit against ref(a_i, b_i).
 template <class V, class Op, class Ref>
 void check_shapes(Op op, Ref ref, int32_t n = 67) {
     using T = real_of<V>;

@@ -33,8 +33,7 @@ TYPED_TEST(Layout, RealAndImaginaryParts) {
     EXPECT_TRUE(r.values() == (R{7, 8, 9}) && q.values() == (R{0, 0, 0}));  // the imaginary part of a real signal is 0
 }
 
-// Reversal, the two half rotations and the shift against their index formulas, on both parities and lengths past the
-// vector loops' widths.
+// Reversal, half rotations and shift against their index formulas, both parities, lengths past the vector widths.
 TYPED_TEST(Layout, PermutationsAndShiftMatchIndexFormulas) {
     using V = TypeParam;
     struct Case { const char* name; int32_t (*op)(V*); int64_t (*from)(int64_t j, int64_t n); };  // from: j's source
@@ -61,8 +60,7 @@ TYPED_TEST(Layout, PermutationsAndShiftMatchIndexFormulas) {
         }
 }
 
-// Padding then unpadding restores the input for every layout, scale mode and a grid of lengths; on the way the padded
-// samples sit where a spectrum or a centred record expects them.
+// Padding puts the samples where a spectrum or a centred record expects them, unpadding restores them; all modes.
 TYPED_TEST(Layout, PadAndUnpadAreInverse) {
     using V = TypeParam; using T = real_of<V>;
     for (bool cx : {false, true})

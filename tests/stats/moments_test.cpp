@@ -30,9 +30,8 @@ T saturated(T x, T b) { return x > b ? b : (x < -b ? -b : x); }
 
 }  // namespace
 
-// Tolerance: a sequential sum's rounding grows like the square root of the adds in a block, so 2 sqrt(adds) ulps, plus
-// 8 for what follows the sums; the excess kurtosis in ulps of m4/m2^2, the quantity computed.  A wrong divisor, a lost
-// block or a wrong pivot is off by far more.  The plain sums are checked bit for bit below.
+// Tolerance 2 sqrt(adds per block) ulps plus 8 for what follows the sums (the excess kurtosis in ulps of m4/m2^2); a
+// wrong divisor, a lost block or a wrong pivot is off by far more.  The plain sums are checked bit for bit below.
 TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     using T = real_of<TypeParam>;
     for (const int64_t n : {int64_t(7), int64_t(1000), int64_t(5000), int64_t(2 * 8 * kBlock + 700)}) {
@@ -69,8 +68,7 @@ TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     }
 }
 
-// Bit for bit against the literal blockwise order, on lengths that end inside a block, on a block edge, and past
-// several groups of blocks (a running sum rounds differently).
+// Bit for bit against the blockwise order (not a running sum's), ending inside a block, on its edge, and far past.
 TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
     using T = real_of<TypeParam>;
     constexpr T b = bound_of<TypeParam>();

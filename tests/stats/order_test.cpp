@@ -11,8 +11,7 @@ VLX_TYPED_SUITE(Order);
 TYPED_TEST(Order, SortOrders) {
     using T = real_of<TypeParam>;
     constexpr T b = bound_of<TypeParam>();
-    // Beyond the bound every component counts as +bound in the power, so the two huge samples tie with each other
-    // (and outrank (b, 1)); the raw real part breaks the tie.  Equal powers 25 fall back to re, then im.
+    // Huge parts count as +bound in the power, the raw real part breaks that tie; equal powers 25 go by re, then im.
     Vec<TypeParam> c({10 * b, 0, -10 * b, 0, 3, 4, 4, 3, 0, 5, 3, -4, 1, 1, 0, 0}, true);
     ASSERT_EQ(t_sort(c.get()), 0);
     const std::vector<T> expected{0, 0, 1, 1, 0, 5, 3, -4, 3, 4, 4, 3, -10 * b, 0, 10 * b, 0};
@@ -23,8 +22,7 @@ TYPED_TEST(Order, SortOrders) {
     EXPECT_EQ(t_sort(empty.get()), 0);
 }
 
-// NaN compares equal to everything; the sort must neither crash nor leave the vector (run under the sanitizer), must
-// keep every sample, and must still order the samples without NaN.
+// With NaN (equal to everything) the sort stays inside the vector, keeps every sample and still orders the others.
 TYPED_TEST(Order, SortSurvivesNaN) {
     using T = real_of<TypeParam>;
     auto multiset = [](std::vector<T> s) {  // NaN counted as +inf
@@ -183,9 +181,8 @@ TYPED_TEST(Peak, ParabolaIsExact) {
 // Hann window spectrum, amplitude at f bins from the centre.
 double hann_lobe(double f) { return std::fabs(f) < 1e-9 ? 1.0 : std::sin(M_PI * f) / (M_PI * f) / (1.0 - f * f); }
 
-// The log ratio puts the Gaussian lobe of its constant at its true position. On a Hann window's main-lobe power,
-// sampled where one sample off the top matches that Gaussian, both forms move monotonically with the true position
-// (across a change of bracketing pair too) and stay near it.  Complex sources are refined on their power.
+// The log ratio puts the Gaussian lobe of its constant (and a complex source's power) at its true position; on a Hann
+// main lobe so sampled both forms move monotonically with it, across a change of bracketing pair too, and stay near.
 TYPED_TEST(Peak, LogRatioFollowsTheLobe) {
     using T = real_of<TypeParam>;
     const long double width = 0.792233201343665L;

@@ -40,8 +40,7 @@ std::vector<long double> expand(const std::vector<LC>& roots, long double lead) 
     return out;
 }
 
-// |p(z)| over the sum of |a_k| |z|^k: the residual relative to the size of the terms, which is what a backward-stable
-// root can promise.
+// |p(z)| over the sum of |a_k| |z|^k: what a backward-stable root can promise.
 template <class T>
 long double relative_residual(const std::vector<T>& a, LC z) {
     LC p = 0;
@@ -53,8 +52,7 @@ long double relative_residual(const std::vector<T>& a, LC z) {
     return std::abs(p) / scale;
 }
 
-// Root sets, apart from each other: random real roots and conjugate pairs; the same with each real root doubled 1e-3
-// away (clusters); a triple and a double root among them; real roots over four decades.
+// Root sets: reals and conjugate pairs apart; with each real doubled 1e-3 away; a triple and a double root; 4 decades.
 std::vector<LC> root_set(int kind, int degree, uint32_t seed) {
     std::mt19937 rng(seed);
     std::uniform_real_distribution<double> u(-2, 2);
@@ -75,8 +73,7 @@ std::vector<LC> root_set(int kind, int degree, uint32_t seed) {
     return r;
 }
 
-// vlxs_pcsolve rebuilt from the exported layers.  The library does not know these step pointers as its own, so it
-// runs every round of every search instead of skipping the cycles it recognises.
+// vlxs_pcsolve rebuilt from the exported layers, whose step pointers the library runs without skipping cycles.
 template <class V>
 int32_t pcsolve_every_round(V* src, V* dst, real_of<V> re, real_of<V> im) {
     using T = real_of<V>;
@@ -115,8 +112,7 @@ TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialAndExpandBack) {
             ASSERT_TRUE(has_shape(v.get(), degree, 1, 1));
             for (int i = 0; i < degree; ++i) {
                 const LC z(v[2 * i], v[2 * i + 1]);
-                // Each root comes from a deflated polynomial, so earlier deflations' rounding adds up; clusters take
-                // the most.
+                // deflation rounding adds up from root to root, clusters the most
                 EXPECT_LT(relative_residual(a, z), 256 * degree * eps) << "kind " << kind << ", degree " << degree << ", root " << z;
                 // sorted by power first
                 EXPECT_TRUE(i == 0 || std::norm(LC(v[2 * i - 2], v[2 * i - 1])) <= std::norm(z) * (1 + 4 * eps));

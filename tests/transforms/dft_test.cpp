@@ -23,8 +23,7 @@ void literal_mul(std::vector<T>& v, bool& cplx, const std::vector<T>& c) {
     v = out, cplx = true;
 }
 
-// The chirp-z transform from its recipe, in the last direction of `dirs`, on a cache built for the first one and
-// turned at every change since.
+// The chirp-z recipe in the last direction of `dirs`, on a cache built for the first and turned at each change.
 template <class T>
 std::vector<T> literal_chirp_z(std::vector<T> x, bool cplx, const std::vector<int>& dirs) {
     constexpr bool dbl = std::is_same_v<T, double>;
@@ -113,10 +112,8 @@ std::vector<real_of<V>> literal_dct(std::vector<real_of<V>> d, uint32_t flags) {
 
 }  // namespace
 
-// Relative L2 error against a long-double sum, then the inverse restores the input.  Powers of two run the engine
-// itself; the chirp path is two of its transforms of length L < 4N between unit-modulus products, so twice its bound
-// for length L.  That bound is not eps sqrt(log2 L): the twiddle recurrence adds up to min(L/8, 256) eps and dominates
-// from L = 1024 (measured about 85 eps at L = 4096 against a bound of 540 eps).
+// Relative L2 error against a long-double sum, then the round trip.  The chirp path is two power-of-two transforms of
+// length L < 4N between unit-modulus products: twice their bound (measured about 85 eps at L = 4096, bound 540).
 TYPED_TEST(DftTest, MatchesLongDoubleSumAndRoundTrips) {
     using T = real_of<TypeParam>;
     for (int32_t n : {1, 2, 3, 4, 5, 6, 7, 8, 12, 17, 31, 33, 60, 64, 97, 127, 129, 255, 257, 360, 1000, 1023, 1024, 1025,
@@ -156,8 +153,7 @@ TYPED_TEST(DftTest, ChirpPathIsBitExactThroughCacheTurns) {
     }
 }
 
-// delta is 1/(N delta) of the delta at entry, either way, the fallback for a zero of either sign, 1/delta below 2
-// points (no error for 0 points).
+// delta becomes 1/(N delta) either way, the fallback for a zero of either sign, 1/delta below 2 points.
 TYPED_TEST(DftTest, DeltaFollowsTheEntryValue) {
     using T = real_of<TypeParam>;
     for (int32_t n : {0, 1, 2, 6, 7, 8})
@@ -172,8 +168,7 @@ TYPED_TEST(DftTest, DeltaFollowsTheEntryValue) {
             }
 }
 
-// rdft keeps the first N/2 + 1 bins of the complex transform (the same bits off the powers of two, where the real
-// engine stands in, and within a few eps on them); irdft gives back N real samples and delta 1/(N delta).
+// rdft keeps the first N/2 + 1 bins of the complex transform (bit for bit off the powers of two); irdft inverts it.
 TYPED_TEST(DftTest, RealFormsOfAnyLength) {
     using T = real_of<TypeParam>;
     for (int32_t n : {1, 2, 3, 4, 6, 7, 8, 15, 16, 100, 101, 1024}) {
@@ -191,9 +186,8 @@ TYPED_TEST(DftTest, RealFormsOfAnyLength) {
     EXPECT_EQ(t_rdft(&c), -1);
 }
 
-// Against the definition (1/N sum x[n] cos(pi k (2n+1) / 2N); the scaled form doubled, bin 0 times sqrt(1/2)): one
-// real transform plus a rotation, so the bound of the transform of any length applies (above).  Bit for bit
-// against the literal recipe both ways; the inverse restores samples and delta.
+// The definition (1/N sum x[n] cos(pi k (2n+1) / 2N); scaled: doubled, bin 0 times sqrt(1/2)) within the real
+// transform's bound; the literal recipe bit for bit both ways; the inverse restores samples and delta.
 TYPED_TEST(DftTest, DctForwardAndInverseForAnyLength) {
     using T = real_of<TypeParam>;
     for (int32_t n : {1, 2, 3, 6, 7, 8, 17, 64, 600, 1201}) {
@@ -230,9 +224,8 @@ TYPED_TEST(DftTest, DctEdges) {
     EXPECT_TRUE(t_dct(&empty, 0u) == 0 && same_bits(empty->delta, bound_of<TypeParam>()) && t_dct(&c, 0u) == -1);
 }
 
-// x = a cos(w i) + DC + Nyquist (even N): the analytic signal is x + j a sin(w i), the Hilbert transform a sin(w i),
-// for real input and for complex input with zero imaginary parts.  Tolerance as for the transforms of any length up
-// to L = 1024.
+// x = a cos(w i) + DC + Nyquist (even N), real or complex with zero imaginary parts: the analytic signal is
+// x + j a sin(w i), the Hilbert transform a sin(w i), within the bound of the transforms up to L = 1024.
 TYPED_TEST(DftTest, AnalyticTonesAndEdgeBins) {
     using T = real_of<TypeParam>;
     const double tol = 2 * fftref::transform_tolerance(std::numeric_limits<T>::epsilon(), 10);

@@ -175,9 +175,8 @@ inline std::vector<cld> exact_dft(const std::vector<cld>& x, bool inverse) {
     return y;
 }
 
-// Error bound of a transform of 2^m points against long double.  The butterflies alone stay within a few eps sqrt(m),
-// but the twiddle tables come from a recurrence restarted only every 256 steps, whose rounding grows along a run: up
-// to about one eps per step in the table values.
+// Error bound of a transform of 2^m points: a few eps sqrt(m) for the butterflies, plus up to one eps per step of the
+// twiddle recurrence's runs (restarted every 256).
 inline double transform_tolerance(double eps, int m) {
     const double steps = m >= 3 ? std::min(double(size_t(1) << (m - 3)), 256.0) : 0.0;
     return eps * (4 * std::sqrt(std::max(1.0, double(m))) + steps);

@@ -8,8 +8,7 @@ namespace {
 
 VLX_TYPED_SUITE(Fft);
 
-// The reordered, vectorised engines do exactly the arithmetic of the literal recipes: every scalar matches bit for bit,
-// also for lengths whose tables restart the recurrence (n/8 > 257).
+// The vectorised engines do the literal recipes' arithmetic bit for bit, also where the tables restart (n/8 > 257).
 TYPED_TEST(Fft, MatchesLiteralEnginesBitForBit) {
     using T = real_of<TypeParam>;
     for (int m = 2; m <= 16; ++m) {
@@ -60,8 +59,7 @@ TYPED_TEST(Fft, ExactSmallLengths) {
     EXPECT_TRUE(r->alloc == 16 && r->points == 5 && f->alloc == 16 && f->points == 8);
 }
 
-// Not a power of two: -1 with the vector untouched, real or complex, for the transforms and the reorderings alike;
-// the real transform also refuses complex input.
+// Not a power of two: -1 and the vector untouched, for transforms and reorderings; rfft also refuses complex input.
 TYPED_TEST(Fft, RejectsOtherLengths) {
     using T = real_of<TypeParam>;
     for (int points : {0, 3, 6, 12, 1000}) {
