@@ -1,5 +1,4 @@
-// The in-place arithmetic and math family: clamps at and just beyond their limits, fixed values, the real-only
-// refusal, the one-source forms with every aliasing, the tone adder, the I0 kernel.
+// The in-place arithmetic and math family: clamps at and beyond their limits, refusals, aliasing, tone adder, I0 kernel.
 #include "vlx_test.hpp"
 
 #include <cmath>
@@ -40,59 +39,56 @@ template <class V>
 struct Row { std::string name; std::function<int32_t(V*)> op; std::vector<real_of<V>> in; bool is_complex;
              std::vector<real_of<V>> want; double ulps; int want_complex = -1; };
 
+// Builds a one-vector operation from a call on v.
+#define OP(call) std::function<int32_t(V*)>([](V* v) { return call; })
+
 TYPED_TEST(Arith, ClampsAndFixedValues) {
     using V = TypeParam; using T = real_of<V>;
     using L = Limits<V>;
-    const T B = L::big, E = L::e;
+    const T B = L::big, E = L::e, ten = T(2.302585092994046);
     const T ln_t = std::log(L::tiny), log10_t = std::log10(L::tiny);
     const T nan = std::numeric_limits<T>::quiet_NaN();
     const T log10e = is_double<V> ? T(0.4342944819032518) : T(0.4342945f);
-    auto f = [](auto fn) { return std::function<int32_t(V*)>(fn); };
     const std::vector<Row<V>> rows = {
-        {"exp at E", f([](V* v) { return t_exp(v); }), {E, above(E), T(-1000), nan}, false, {std::exp(E), B, 0, nan}, 0},
-        {"exp complex", f([](V* v) { return t_exp(v); }), {above(E), 0, 0, T(M_PI / 2)}, true,
-         {B, 0, std::cos(T(M_PI / 2)), 1}, 0},
-        {"exp10 stops below -B", f([](V* v) { return t_exp10(v); }),
-         {2, L::exp10_max, above(L::exp10_max), -B, -above(B), 3}, false,
-         {std::exp(T(2) * T(2.302585092994046)), std::exp(L::exp10_max * T(2.302585092994046)), B, 0, -above(B), 3}, 0},
-        {"exp10 complex lower clamp is negative", f([](V* v) { return t_exp10(v); }), {-above(B), 0}, true, {-B, T(-0.0)}, 0},
-        {"log below T", f([](V* v) { return t_log(v); }), {0, -1, L::tiny, nan}, false, {ln_t, ln_t, ln_t, nan}, 0},
-        {"log complex", f([](V* v) { return t_log(v); }), {0, 0, 0, 1, above(B), 1}, true,
+        {"exp at E", OP(t_exp(v)), {E, above(E), T(-1000), nan}, false, {std::exp(E), B, 0, nan}, 0},
+        {"exp complex", OP(t_exp(v)), {above(E), 0, 0, T(M_PI / 2)}, true, {B, 0, std::cos(T(M_PI / 2)), 1}, 0},
+        {"exp10 stops below -B", OP(t_exp10(v)), {2, L::exp10_max, above(L::exp10_max), -B, -above(B), 3}, false,
+         {std::exp(T(2) * ten), std::exp(L::exp10_max * ten), B, 0, -above(B), 3}, 0},
+        {"exp10 complex lower clamp is negative", OP(t_exp10(v)), {-above(B), 0}, true, {-B, T(-0.0)}, 0},
+        {"log below T", OP(t_log(v)), {0, -1, L::tiny, nan}, false, {ln_t, ln_t, ln_t, nan}, 0},
+        {"log complex", OP(t_log(v)), {0, 0, 0, 1, above(B), 1}, true,
          {ln_t, 0, 0, T(M_PI / 2), std::log(B) * T(0.5), std::atan2(T(1), above(B))}, 0},
-        {"log10 complex clamps parts", f([](V* v) { return t_log10(v); }), {-above(B), 0}, true,
+        {"log10 complex clamps parts", OP(t_log10(v)), {-above(B), 0}, true,
          {std::log10(B * B) * T(0.5), std::atan2(T(0), -B) * log10e}, 0},
-        {"db real", f([](V* v) { return t_db(v, T(20)); }), {T(0.1), 0}, false, {-20, T(20) * log10_t}, 2},
-        {"db complex", f([](V* v) { return t_db(v, T(20)); }), {1, 1, 0, 0}, true,
+        {"db real", OP(t_db(v, T(20))), {T(0.1), 0}, false, {-20, T(20) * log10_t}, 2},
+        {"db complex", OP(t_db(v, T(20))), {1, 1, 0, 0}, true,
          {T(10 * std::log10(2.0L)), T(M_PI / 4 * 20 * 0.43429448190325182765L), T(20) * log10_t, 0}, 2},
-        {"recip", f([](V* v) { return t_recip(v); }), {0, 4, T(-0.0)}, false, {B, T(0.25), B}, 0},
-        {"recip complex", f([](V* v) { return t_recip(v); }), {0, 0, 0, 2, above(B), 0}, true,
+        {"recip", OP(t_recip(v)), {0, 4, T(-0.0)}, false, {B, T(0.25), B}, 0},
+        {"recip complex", OP(t_recip(v)), {0, 0, 0, 2, above(B), 0}, true,
          {0, T(-0.0), 0, T(-0.5), above(B) * (T(1) / B), T(-0.0)}, 0},
-        {"sqrt", f([](V* v) { return t_sqrt(v); }), {-4, 4, T(-0.0)}, false, {0, 2, T(-0.0)}, 0},
-        {"sqrt complex", f([](V* v) { return t_sqrt(v); }), {-4, 0, 0, 0}, true,
-         {T(2) * std::cos(T(M_PI / 2)), 2, 0, 0}, 0},
-        {"magsq", f([](V* v) { return t_magsq(v); }), {B, above(B), -above(B), 3}, false, {B * B, B, B, 9}, 0, 0},
-        {"magsq complex", f([](V* v) { return t_magsq(v); }), {above(B), 0, 3, 4}, true, {B, 25}, 0, 0},
-        {"mag complex", f([](V* v) { return t_mag(v); }), {3, 4, -1, 0}, true, {5, 1}, 0, 0},
-        {"square", f([](V* v) { return t_square(v); }), {above(B), -3}, false, {B, 9}, 0},
-        {"square complex clamps parts", f([](V* v) { return t_square(v); }), {above(B), 0, 1, 2}, true,
-         {B * B, 0, -3, 4}, 0},
-        {"timesi", f([](V* v) { return t_timesi(v); }), {2, -1}, false, {0, 2, 0, -1}, 0, 1},
-        {"timesi complex", f([](V* v) { return t_timesi(v); }), {1, 2}, true, {-2, 1}, 0},
-        {"cscale", f([](V* v) { return t_cscale(v, T(2), T(3)); }), {1, 2}, false, {2, 3, 4, 6}, 0, 1},
-        {"cscale complex", f([](V* v) { return t_cscale(v, T(2), T(3)); }), {1, 1}, true, {-1, 5}, 0},
-        {"offset complex", f([](V* v) { return t_offset(v, T(5)); }), {1, 1}, true, {6, 1}, 0},
-        {"conj", f([](V* v) { return t_conj(v); }), {1, 0, 2, -3}, true, {1, T(-0.0), 2, 3}, 0},
-        {"conj real", f([](V* v) { return t_conj(v); }), {1, -2}, false, {1, -2}, 0},
-        {"ptor real", f([](V* v) { return t_ptor(v); }), {1, -2}, false, {1, -2}, 0},
-        {"ptor", f([](V* v) { return t_ptor(v); }), {2, T(M_PI / 3)}, true,
-         {T(2) * std::cos(T(M_PI / 3)), T(2) * std::sin(T(M_PI / 3))}, 0},
-        {"neg", f([](V* v) { return t_neg(v); }), {0, 1}, true, {T(-0.0), -1}, 0},
-        {"acos", f([](V* v) { return t_acos(v); }), {T(1.5), 1, above(T(1)), -1}, false, {0, 0, 0, T(M_PI)}, 1},
-        {"cosh", f([](V* v) { return t_cosh(v); }), {-above(E), 0}, false, {B, 1}, 0},
-        {"sinh", f([](V* v) { return t_sinh(v); }), {above(E), -above(E), 0}, false, {B, -B, 0}, 0},
-        {"sinc", f([](V* v) { return t_sinc(v); }), {0, T(M_PI / 2)}, false, {1, T(2 / M_PI)}, 1},
-        {"besi0", f([](V* v) { return t_besi0(v); }), {above(E), -above(E), 0}, false, {B, B, 1}, 0},
-        {"besy1", f([](V* v) { return t_besy1(v); }), {0, -1}, false, {0, 0}, 0},
+        {"sqrt", OP(t_sqrt(v)), {-4, 4, T(-0.0)}, false, {0, 2, T(-0.0)}, 0},
+        {"sqrt complex", OP(t_sqrt(v)), {-4, 0, 0, 0}, true, {T(2) * std::cos(T(M_PI / 2)), 2, 0, 0}, 0},
+        {"magsq", OP(t_magsq(v)), {B, above(B), -above(B), 3}, false, {B * B, B, B, 9}, 0, 0},
+        {"magsq complex", OP(t_magsq(v)), {above(B), 0, 3, 4}, true, {B, 25}, 0, 0},
+        {"mag complex", OP(t_mag(v)), {3, 4, -1, 0}, true, {5, 1}, 0, 0},
+        {"square", OP(t_square(v)), {above(B), -3}, false, {B, 9}, 0},
+        {"square complex clamps parts", OP(t_square(v)), {above(B), 0, 1, 2}, true, {B * B, 0, -3, 4}, 0},
+        {"timesi", OP(t_timesi(v)), {2, -1}, false, {0, 2, 0, -1}, 0, 1},
+        {"timesi complex", OP(t_timesi(v)), {1, 2}, true, {-2, 1}, 0},
+        {"cscale", OP(t_cscale(v, T(2), T(3))), {1, 2}, false, {2, 3, 4, 6}, 0, 1},
+        {"cscale complex", OP(t_cscale(v, T(2), T(3))), {1, 1}, true, {-1, 5}, 0},
+        {"offset complex", OP(t_offset(v, T(5))), {1, 1}, true, {6, 1}, 0},
+        {"conj", OP(t_conj(v)), {1, 0, 2, -3}, true, {1, T(-0.0), 2, 3}, 0},
+        {"conj real", OP(t_conj(v)), {1, -2}, false, {1, -2}, 0},
+        {"ptor real", OP(t_ptor(v)), {1, -2}, false, {1, -2}, 0},
+        {"ptor", OP(t_ptor(v)), {2, T(M_PI / 3)}, true, {T(2) * std::cos(T(M_PI / 3)), T(2) * std::sin(T(M_PI / 3))}, 0},
+        {"neg", OP(t_neg(v)), {0, 1}, true, {T(-0.0), -1}, 0},
+        {"acos", OP(t_acos(v)), {T(1.5), 1, above(T(1)), -1}, false, {0, 0, 0, T(M_PI)}, 1},
+        {"cosh", OP(t_cosh(v)), {-above(E), 0}, false, {B, 1}, 0},
+        {"sinh", OP(t_sinh(v)), {above(E), -above(E), 0}, false, {B, -B, 0}, 0},
+        {"sinc", OP(t_sinc(v)), {0, T(M_PI / 2)}, false, {1, T(2 / M_PI)}, 1},
+        {"besi0", OP(t_besi0(v)), {above(E), -above(E), 0}, false, {B, B, 1}, 0},
+        {"besy1", OP(t_besy1(v)), {0, -1}, false, {0, 0}, 0},
     };
     for (const Row<V>& r : rows) {
         Vec<V> v(r.in, r.is_complex);
@@ -102,27 +98,23 @@ TYPED_TEST(Arith, ClampsAndFixedValues) {
     }
 }
 
-TYPED_TEST(Arith, RealOnlyRefusalStubsAndEmptyVectors) {
+// Real-only operations refuse complex input, even empty; the stubs always fail.  On empty vectors mag and magsq still
+// turn real, cscale and timesi stay real.
+TYPED_TEST(Arith, RefusalsAndEmptyVectors) {
     using V = TypeParam; using T = real_of<V>;
-    // Real-only operations refuse complex input, even empty; the stubs always fail.
     const std::vector<std::pair<bool, std::function<int32_t(V*)>>> refusing = {
-        {true, [](V* v) { return t_abs(v); }},    {true, [](V* v) { return t_sin(v); }},
-        {true, [](V* v) { return t_acos(v); }},   {true, [](V* v) { return t_cosh(v); }},
-        {true, [](V* v) { return t_sinh(v); }},   {true, [](V* v) { return t_sinc(v); }},
-        {true, [](V* v) { return t_besi0(v); }},  {true, [](V* v) { return t_besj0(v); }},
-        {true, [](V* v) { return t_besy1(v); }},  {false, [](V* v) { return t_erf(v); }},
-        {false, [](V* v) { return t_erfc(v); }},  {false, [](V* v) { return t_gamma(v); }},
-        {false, [](V* v) { return t_lgamma(v); }},
+        {true, OP(t_abs(v))},    {true, OP(t_sin(v))},     {true, OP(t_acos(v))},  {true, OP(t_cosh(v))},
+        {true, OP(t_sinh(v))},   {true, OP(t_sinc(v))},    {true, OP(t_besi0(v))}, {true, OP(t_besj0(v))},
+        {true, OP(t_besy1(v))},  {false, OP(t_erf(v))},    {false, OP(t_erfc(v))}, {false, OP(t_gamma(v))},
+        {false, OP(t_lgamma(v))},
     };
     for (const auto& [cx, op] : refusing) {
         Vec<V> v({1, 2}, cx), empty({}, cx);
         EXPECT_TRUE(op(v.get()) == -1 && op(empty.get()) == -1);
         EXPECT_EQ(v.values(), (std::vector<T>{1, 2}));
     }
-    // Empty vectors: mag and magsq still turn real, cscale and timesi stay real.
     const std::vector<std::pair<bool, std::function<int32_t(V*)>>> empty_ok = {
-        {true, [](V* v) { return t_mag(v); }}, {true, [](V* v) { return t_magsq(v); }},
-        {false, [](V* v) { return t_cscale(v, T(1), T(1)); }}, {false, [](V* v) { return t_timesi(v); }}};
+        {true, OP(t_mag(v))}, {true, OP(t_magsq(v))}, {false, OP(t_cscale(v, T(1), T(2)))}, {false, OP(t_timesi(v))}};
     for (const auto& [cx, op] : empty_ok) {
         Vec<V> empty({}, cx);
         EXPECT_TRUE(op(empty.get()) == 0 && empty->complex == 0);
@@ -133,11 +125,9 @@ TYPED_TEST(Arith, RealOnlyRefusalStubsAndEmptyVectors) {
 TYPED_TEST(Arith, OneSourceFormsWithEveryAliasing) {
     using V = TypeParam; using T = real_of<V>;
     using Ops = std::pair<std::function<int32_t(V*, V*)>, std::function<int32_t(V*)>>;
-    const std::vector<Ops> ops = {
-        {[](V* s, V* d) { return t_umag(s, d); }, [](V* v) { return t_mag(v); }},
-        {[](V* s, V* d) { return t_umagsq(s, d); }, [](V* v) { return t_magsq(v); }},
-        {[](V* s, V* d) { return t_usqrt(s, d); }, [](V* v) { return t_sqrt(v); }},
-    };
+    const std::vector<Ops> ops = {{[](V* s, V* d) { return t_umag(s, d); }, OP(t_mag(v))},
+                                  {[](V* s, V* d) { return t_umagsq(s, d); }, OP(t_magsq(v))},
+                                  {[](V* s, V* d) { return t_usqrt(s, d); }, OP(t_sqrt(v))}};
     for (size_t k = 0; k < ops.size(); ++k) {
         for (bool cplx : {false, true}) {
             const std::vector<T> in = random_values<T>(cplx ? 202 : 101, 9 + k, -4, 4);
@@ -151,10 +141,8 @@ TYPED_TEST(Arith, OneSourceFormsWithEveryAliasing) {
                 V shared = *src.get();  // lends src's data
                 shared.alloc = 0;
                 V* dst = alias == 0 ? third.get() : alias == 1 ? src.get() : &shared;
-                ASSERT_EQ(ops[k].first(src.get(), dst), 0);
-                EXPECT_TRUE(has_shape(dst, expected->points, expected->complex, 0.25));
-                for (int64_t i = 0; i < expected.scalars(); ++i)
-                    ASSERT_TRUE(same_bits(dst->data[i], expected[i])) << i;
+                ASSERT_TRUE(ops[k].first(src.get(), dst) == 0 && has_shape(dst, expected->points, expected->complex, 0.25));
+                EXPECT_TRUE(same_scalars(std::vector<T>(dst->data, dst->data + expected.scalars()), expected.values()));
                 EXPECT_TRUE(alias == 1 || src.values() == in);
                 if (alias == 2) t_destroy(&shared);
             }
@@ -167,16 +155,13 @@ TYPED_TEST(Arith, StreamingLoopsMatchScalarOrder) {
     using V = TypeParam; using T = real_of<V>;
     std::vector<T> in = random_values<T>(2 * 1003, 3, -1e3, 1e3);
     const T big = Limits<V>::big;
-    in[1000] = above(big);  // parts beyond the bound, either one, in a long vector
-    in[1401] = -above(big);
-    in[1500] = big;
+    in[1000] = above(big), in[1401] = -above(big), in[1500] = big;  // parts at and beyond the bound, either one
     Vec<V> v(in, true), power;
     ASSERT_TRUE(t_umagsq(v.get(), power.get()) == 0 && t_scale(v.get(), T(0.7)) == 0 && t_conj(v.get()) == 0);
     for (int64_t i = 0; i < 1003; ++i) {
         const T a = in[2 * i], b = in[2 * i + 1];
         const T want = std::fabs(a) > big || std::fabs(b) > big ? big : b * b + a * a;
-        ASSERT_TRUE(same_bits(power[i], want) && same_bits(v[2 * i], a * T(0.7))) << i;
-        ASSERT_TRUE(same_bits(v[2 * i + 1], -(b * T(0.7)))) << i;
+        ASSERT_TRUE(same_bits(power[i], want) && same_bits(v[2 * i], a * T(0.7)) && same_bits(v[2 * i + 1], -(b * T(0.7)))) << i;
     }
 }
 
@@ -184,10 +169,8 @@ TYPED_TEST(Arith, StreamingLoopsMatchScalarOrder) {
 TEST(ArithFloat, FunctionsThroughDouble) {
     const std::vector<float> xs = random_values<float>(64, 17, 0.1, 30);
     struct Case { int32_t (*op)(vlxf_t*); double (*ref)(double); };
-    const Case cases[] = {{vlxfi_cosh, [](double x) { return std::cosh(x); }},
-                          {vlxfi_sinh, [](double x) { return std::sinh(x); }},
-                          {vlxfi_besj0, [](double x) { return j0(x); }},
-                          {vlxfi_besy1, [](double x) { return y1(x); }}};
+    const Case cases[] = {{vlxfi_cosh, [](double x) { return std::cosh(x); }}, {vlxfi_sinh, [](double x) { return std::sinh(x); }},
+                          {vlxfi_besj0, [](double x) { return j0(x); }}, {vlxfi_besy1, [](double x) { return y1(x); }}};
     for (const Case& c : cases) {
         Vec<vlxf_t> v(xs, false);
         ASSERT_EQ(c.op(v.get()), 0);
@@ -225,34 +208,14 @@ TYPED_TEST(Arith, AddcosFollowsTheRecurrence) {
             }
         }
     Vec<V> flat({1, 2, 3});
-    ASSERT_EQ(t_addcos(flat.get(), 0u, T(0), T(1), T(0)), 0);
-    EXPECT_EQ(flat.values(), (std::vector<T>{2, 3, 4}));
-}
-
-// Growth fails in the operations that make a real vector complex: -1 and an empty vector.
-TYPED_TEST(Arith, GrowthFailureLeavesAnEmptyVector) {
-    using V = TypeParam; using T = real_of<V>;
-    const std::vector<std::function<int32_t(V*)>> growing = {
-        [](V* v) { return t_cscale(v, T(1), T(2)); }, [](V* v) { return t_timesi(v); }};
-    for (const auto& op : growing) {
-        Vec<V> v({1, 2, 3});
-        int32_t r;
-        {
-            FailingAlloc<V> failing;
-            r = op(v.get());
-        }
-        EXPECT_TRUE(r == -1 && (v->points == 0 && v->alloc == 0 && v->data == nullptr));
-    }
+    EXPECT_TRUE(t_addcos(flat.get(), 0u, T(0), T(1), T(0)) == 0 && flat.values() == (std::vector<T>{2, 3, 4}));
 }
 
 // I0 by its power series summed in long double to convergence.
 long double besi0_reference(long double x) {
     const long double u = x * x / 4;
     long double term = 1, sum = 1;
-    for (int k = 1; k < 500 && term > sum * 1e-22L; ++k) {
-        term *= u / ((long double)k * k);
-        sum += term;
-    }
+    for (int k = 1; k < 500 && term > sum * 1e-22L; ++k) term *= u / ((long double)k * k), sum += term;
     return sum;
 }
 
@@ -261,10 +224,7 @@ TYPED_TEST(Arith, Besi0KernelAgainstLongDoubleSeries) {
     const T edge = is_double<V> ? T(20) : T(16);
     std::vector<T> xs = {0, T(0.5), 1, 5, T(-7.25), edge, above(edge), T(25), T(34.5), Limits<V>::e};
     for (T x : random_values<T>(200, 4, 0, double(Limits<V>::e))) xs.push_back(x);
-    for (T x : xs) {
-        const T want = static_cast<T>(besi0_reference(std::fabs((long double)x)));
-        EXPECT_LE(ulp_distance(kernel(x), want), 8.0) << x << ": " << kernel(x) << " vs " << want;
-    }
+    for (T x : xs) EXPECT_LE(ulp_distance(kernel(x), T(besi0_reference(std::fabs((long double)x)))), 8.0) << x;
     EXPECT_TRUE(same_bits(kernel(T(0)), T(1)) && std::isnan(kernel(std::numeric_limits<T>::quiet_NaN())));
 }
 

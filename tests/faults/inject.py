@@ -117,6 +117,13 @@ FAULTS = [
     ("corr-work-alias", "src/streaming/corr.cpp", "if (work != nullptr && work != ref && work != out) return correlate",
      "if (work != nullptr && work != ref) return correlate", "streaming",
      "correlation work given as the output used in place instead of a temporary"),
+    ("poly-skip-overrun", "src/stats/poly.cpp", "const int64_t skip = (end - i) / period * period;",
+     "const int64_t skip = (end - i + period - 1) / period * period;", "stats",
+     "root search skips one cycle past the end of its kind of round"),
+    ("hilbert-nyquist", "src/transforms/analytic.cpp", "const int64_t h = (n + 1) / 2;", "const int64_t h = n / 2 + 1;",
+     "transforms", "Hilbert transform turns the Nyquist bin as a positive frequency"),
+    ("avg-mixed-weight", "src/elementwise/binary.cpp", "bi * (T(1) - alpha)", "(bi - bi * alpha)", "elementwise",
+     "weighted average of a real and a complex source: imaginary weight distributed"),
     # sample files
     ("file-float-digits", "src/fileio/writers.cpp", 'static constexpr const char* line = "%.7g\\n";',
      'static constexpr const char* line = "%.6g\\n";', "fileio", "float text lines written with a digit too few"),

@@ -1,5 +1,5 @@
-// Moments against long-double references, the block order of the sums bit for bit, and the fixed results of
-// degenerate, huge and NaN inputs.
+// Moments: long-double references, the block order of the sums bit for bit, degenerate, huge and NaN inputs; the
+// regression record against least squares.
 #include "stats_support.hpp"
 
 #include <functional>
@@ -30,38 +30,25 @@ T saturated(T x, T b) { return x > b ? b : (x < -b ? -b : x); }
 
 }  // namespace
 
-// Tolerance: rounding errors of a sequential sum grow like the square root of the adds in one block, so 2 * sqrt(adds
-// per block) ulps, plus 8 for the divisions, root and pivoted combination after the sums.  The excess kurtosis is
-// measured in ulps of m4/m2^2, the quantity actually computed.  A wrong divisor (n against n - 1), a lost block or a
-// wrong pivot is off by far more.
+// Tolerance 2 sqrt(adds per block) ulps plus 8 for what follows the sums (the excess kurtosis in ulps of m4/m2^2); a
+// wrong divisor, a lost block or a wrong pivot is off by far more.  The plain sums are checked bit for bit below.
 TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     using T = real_of<TypeParam>;
     for (const int64_t n : {int64_t(7), int64_t(1000), int64_t(5000), int64_t(2 * 8 * kBlock + 700)}) {
         std::vector<T> x = random_values<T>(static_cast<size_t>(n), 11u + static_cast<uint32_t>(n), -1.0, 1.0);
         for (auto& v : x) v = static_cast<T>(std::exp(static_cast<double>(v)));  // skewed, positive
         Vec<TypeParam> src(x, false);
-        long double s1 = 0, s2 = 0, s3 = 0, s4 = 0, sq = 0, inv = 0, logs = 0;
+        long double s1 = 0, s2 = 0, s3 = 0, s4 = 0, inv = 0, logs = 0;
         for (T v : x) s1 += v;
         const long double m = s1 / n;
         for (T v : x) {
             const long double d = v - m;
-            s2 += d * d;
-            s3 += d * d * d;
-            s4 += d * d * d * d;
-            sq += (long double)v * v;
-            inv += 1.0L / v;
-            logs += std::log((long double)v);
+            s2 += d * d, s3 += d * d * d, s4 += d * d * d * d, inv += 1.0L / v, logs += std::log((long double)v);
         }
         const long double var = s2 / n;
-        struct Row {
-            const char* name;
-            StatFn<TypeParam> fn;
-            long double expected;
-            long double scale = 0;  // what the ulps are counted in, if not the result
-        };
+        // name, statistic, expected, what the ulps are counted in if not the result
+        struct Row { const char* name; StatFn<TypeParam> fn; long double expected, scale = 0; };
         const Row rows[] = {
-            {"sum", STAT(t_sum), s1}, {"mean", STAT(t_mean), m}, {"magsq_sum", STAT(t_magsq_sum), sq},
-            {"rms", STAT(t_rms), std::sqrt(sq / n)}, {"pop_var", STAT(t_pop_var), var},
             {"samp_var", STAT(t_samp_var), s2 / (n - 1)}, {"pop_stddev", STAT(t_pop_stddev), std::sqrt(var)},
             {"samp_stddev", STAT(t_samp_stddev), std::sqrt(s2 / (n - 1))},
             {"skew", STAT(t_skew), (s3 / n) / (var * std::sqrt(var))},
@@ -81,24 +68,10 @@ TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     }
 }
 
-// Bit for bit against the literal blockwise order, on lengths that end inside a block, on a block edge, and past
-// several groups of blocks.
+// Bit for bit against the blockwise order (not a running sum's), ending inside a block, on its edge, and far past.
 TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
     using T = real_of<TypeParam>;
     constexpr T b = bound_of<TypeParam>();
-    // A running sum loses the small tail against the leading 1; in blocks the tail sums exactly to 2048 * tiny and
-    // survives.
-    {
-        const T tiny = std::numeric_limits<T>::epsilon() / 2;
-        std::vector<T> x(2 * kBlock, T(0));
-        x[0] = T(1);
-        for (int64_t i = kBlock; i < 2 * kBlock; ++i) x[i] = tiny;
-        Vec<TypeParam> src(x, false);
-        T running = T(0);
-        for (T v : x) running += v;
-        ASSERT_EQ(running, T(1));
-        EXPECT_TRUE(same_bits(STAT(t_sum)(src).re, T(1) + T(kBlock) * tiny));
-    }
     for (const int64_t n : {int64_t(1), int64_t(kBlock), int64_t(kBlock + 1), int64_t(8 * kBlock),
                             int64_t(19 * kBlock + 333)}) {
         auto x = random_values<T>(static_cast<size_t>(2 * n), 3u + static_cast<uint32_t>(n), -3.0, 5.0);
@@ -119,10 +92,7 @@ TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
         const T third = is_double<TypeParam> ? T(0.3333333333333333) : T(0.33333334f);
         const T p = (v[n / 2] + v[0] + v[n - 1]) * third;
         const T S1 = blockwise<T>(n, [&](int64_t i) { return saturated(v[i] - p, b); });
-        const T S2 = blockwise<T>(n, [&](int64_t i) {
-            const T d = saturated(v[i] - p, b);
-            return d * d;
-        });
+        const T S2 = blockwise<T>(n, [&](int64_t i) { return saturated(v[i] - p, b) * saturated(v[i] - p, b); });
         EXPECT_TRUE(same_bits(STAT(t_pop_var)(re).re, r * S2 - (r * S1) * (r * S1))) << n;
     }
 }
@@ -175,10 +145,8 @@ TYPED_TEST(Moments, FixedResults) {
     Vec<TypeParam> with_nan{1, nan, 3};
     EXPECT_TRUE(std::isnan(STAT(t_mean)(with_nan).re) && std::isnan(STAT(t_pop_var)(with_nan).re));
     // Complex input to skew and excess is refused, dst untouched.
-    Vec<TypeParam> cx({1, 2, 3, 4}, true);
-    Vec<TypeParam> dst{42};
-    EXPECT_TRUE(t_skew(cx.get(), dst.get()) == -1 && t_excess(cx.get(), dst.get()) == -1 && dst->points == 1);
-    EXPECT_EQ(dst[0], T(42));
+    Vec<TypeParam> cx({1, 2, 3, 4}, true), dst{42};
+    EXPECT_TRUE(t_skew(cx.get(), dst.get()) == -1 && t_excess(cx.get(), dst.get()) == -1 && dst->points == 1 && dst[0] == T(42));
 }
 
 // dst may be src: the statistic is read before the vector becomes one point.
@@ -186,8 +154,7 @@ TYPED_TEST(Moments, InPlaceAndComplexShape) {
     using T = real_of<TypeParam>;
     Vec<TypeParam> v({1, 2, 3, 4, 5, 6}, true);
     v->delta = T(0.25);
-    ASSERT_EQ(t_mean(v.get(), v.get()), 0);
-    EXPECT_TRUE(has_shape(v.get(), 1, 1, 0.25));
+    ASSERT_TRUE(t_mean(v.get(), v.get()) == 0 && has_shape(v.get(), 1, 1, 0.25));
     EXPECT_EQ(v.values(), (std::vector<T>{3, 4}));
     // complex variance is that of re plus that of im; the result is real
     Vec<TypeParam> c({1, 10, 3, 10, 5, 40}, true);
@@ -195,15 +162,85 @@ TYPED_TEST(Moments, InPlaceAndComplexShape) {
     EXPECT_TRUE(r.complex == 0 && near(r.re, T(8) / 3 + T(200), 1e-4));
 }
 
-// A failed allocation is a status: dst is left empty, nothing is written.
-TEST(MomentsHooks, AllocationFailureIsReported) {
-    vlx_t src{1.0, nullptr, 0, 3, 0, 0};
-    double lent[3] = {1, 2, 3};
-    src.data = lent;  // lent storage: no allocation needed to read it
-    Vec<vlx_t> dst;
-    FailingAlloc<vlx_t> failing;
-    EXPECT_TRUE(vlxs_sum(&src, dst.get()) == -1 && dst->points == 0 && dst->data == nullptr);
-    EXPECT_TRUE(vlxs_median(&src, dst.get()) == -1 && vlxs_hist(&src, dst.get(), 0, 1, 4) == -1);
-    EXPECT_EQ(vlxs_peak(&src, dst.get(), VLX_PEAK_SAMPLE, 0), -1);
-    EXPECT_EQ(vlxs_peak(&src, &src, VLX_PEAK_SAMPLE, 0), -1);
+namespace {
+VLX_TWIN(s, lin_regres) VLX_TWIN(s, lin_regres2)
+
+using LD = long double;
+
+LD clamp1(LD v) { return v > 1 ? 1 : v < -1 ? -1 : v; }
+
+// The record from its definitions, with means and moments taken directly.
+std::vector<LD> reference(const std::vector<LD>& x, const std::vector<LD>& y) {
+    const LD n = x.size();
+    LD mx = 0, my = 0, vx = 0, vy = 0, c = 0;
+    for (size_t i = 0; i < x.size(); ++i) mx += x[i] / n, my += y[i] / n;
+    for (size_t i = 0; i < x.size(); ++i)
+        vx += (x[i] - mx) * (x[i] - mx) / n, vy += (y[i] - my) * (y[i] - my) / n, c += (x[i] - mx) * (y[i] - my) / n;
+    const LD rho = clamp1(c / std::sqrt(vx * vy)), f = n / (n - 2), h = n / (n - 1);
+    std::vector<LD> r(20);  // y on x, then x on y, then the sample statistics
+    auto one_way = [&](LD* o, LD ma, LD mb, LD va, LD vb) {
+        const LD resid = (1 - rho * rho) * vb, g = resid / (n * va), e = ma * ma + va;
+        o[0] = c / va, o[1] = mb - c * ma / va, o[2] = resid * f, o[3] = g * f, o[4] = g * e * f, o[5] = -g * ma * f;
+        o[6] = clamp1(-ma / std::sqrt(e));
+    };
+    one_way(&r[0], mx, my, vx, vy);
+    one_way(&r[7], my, mx, vy, vx);
+    r[14] = mx, r[15] = my, r[16] = h * vx, r[17] = h * vy, r[18] = h * c, r[19] = rho;
+    return r;
+}
+
+}  // namespace
+
+VLX_TYPED_SUITE(Regression);
+
+// Real vectors (one crossing the 2048-point block, where x starts again at 0) and a complex scatter far from the
+// origin, against the long double fit.
+TYPED_TEST(Regression, MatchesLeastSquares) {
+    using T = real_of<TypeParam>;
+    const LD tol = is_double<TypeParam> ? 1e-9L : 3e-3L;
+    for (const int n : {600, 2500, -777}) {
+        const bool cx = n < 0;  // a negative count marks the complex scatter
+        const int pts = cx ? -n : n;
+        const auto noise = random_values<T>(2 * pts, 17 + pts, -3.0, 3.0);
+        std::vector<T> in;
+        std::vector<LD> xs, ys;
+        for (int i = 0; i < pts; ++i) {
+            const T x = cx ? T(100) + noise[2 * i] : T((i % 2048) * 0.25);
+            // a moderate correlation, so that float's rounding of rho is not magnified in 1 - rho^2
+            const T y = T(5) - (cx ? T(0.7) : T(0.02)) * x + noise[2 * i + 1];
+            if (cx) in.push_back(x);
+            in.push_back(y);
+            xs.push_back(x), ys.push_back(y);
+        }
+        Vec<TypeParam> src(in, cx), dst;
+        src->delta = T(0.25);  // the record's x comes from delta
+        ASSERT_TRUE(t_lin_regres2(src.get(), dst.get()) == 0 && has_shape(dst.get(), 20, 0, 1.0));
+        const std::vector<LD> want = reference(xs, ys);
+        for (int k = 0; k < 20; ++k)
+            EXPECT_TRUE(near(dst[k], want[k], tol * (std::fabs(want[k]) + 1e-3L))) << "n " << n << " entry " << k;
+        EXPECT_TRUE(t_lin_regres(src.get(), dst.get()) == 0 && dst->points == 2 &&
+                    near(dst[1], want[1], tol * std::fabs(want[1])));
+    }
+}
+
+TYPED_TEST(Regression, DegenerateVectors) {
+    using T = real_of<TypeParam>;
+    const T b = bound_of<TypeParam>();
+    struct Row { const char* what; std::vector<T> in; T delta; std::vector<std::pair<int, T>> entries; };
+    const Row rows[] = {
+        {"line, delta 0 taken as 1", {1, 3, 5}, 0, {{0, 2}, {1, 1}, {2, 0}, {19, 1}, {14, 1}, {15, 3}}},
+        {"constant", {4, 4, 4, 4}, 1, {{0, 0}, {1, 4}, {7, b}, {8, b}, {10, 2 * b}, {19, 0}}},
+        {"two points: f is 0", {1, 5}, 1, {{0, 4}, {2, 0}, {3, 0}, {4, 0}, {5, 0}, {9, 0}, {12, 0}, {16, 0.5}}},
+        {"one point", {7}, 1, {{0, 0}, {1, 7}, {15, 7}, {8, 0}, {14, 0}, {19, 0}, {2, 0}}},
+        {"empty", {}, 1, {{0, 0}, {1, 0}, {8, 0}, {14, 0}, {15, 0}, {19, 0}}},
+    };
+    for (const Row& row : rows) {
+        Vec<TypeParam> v(row.in, false);
+        v->delta = row.delta;
+        // dst may be src
+        ASSERT_TRUE(t_lin_regres2(v.get(), v.get()) == 0 && has_shape(v.get(), 20, 0, 1.0)) << row.what;
+        for (const auto& [k, want] : row.entries)
+            EXPECT_TRUE(near(v[k], want, 4 * std::numeric_limits<T>::epsilon() * std::fabs(want)))
+                << row.what << ": entry " << k << " is " << v[k];
+    }
 }

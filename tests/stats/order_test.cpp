@@ -1,4 +1,4 @@
-// Sort orders, NaN safety of the sort, the median, and the histogram's edges.
+// Sort orders, NaN safety of the sort, the median, the histogram's edges, and the peak search with its refinements.
 #include "stats_support.hpp"
 
 #include <algorithm>
@@ -7,18 +7,11 @@ using namespace vlxtest;
 
 VLX_TYPED_SUITE(Order);
 
-// Real ascending; complex by clamped power, then re, then im.
+// Complex by clamped power, then re, then im (real ascending order is checked with the NaN below).
 TYPED_TEST(Order, SortOrders) {
     using T = real_of<TypeParam>;
     constexpr T b = bound_of<TypeParam>();
-    auto x = random_values<T>(3001, 5);
-    Vec<TypeParam> v(x, false);
-    ASSERT_EQ(t_sort(v.get()), 0);
-    std::sort(x.begin(), x.end());
-    EXPECT_EQ(v.values(), x);
-
-    // Beyond the bound every component counts as +bound in the power, so the two huge samples tie with each other
-    // (and outrank (b, 1)); the raw real part breaks the tie.  Equal powers 25 fall back to re, then im.
+    // Huge parts count as +bound in the power, the raw real part breaks that tie; equal powers 25 go by re, then im.
     Vec<TypeParam> c({10 * b, 0, -10 * b, 0, 3, 4, 4, 3, 0, 5, 3, -4, 1, 1, 0, 0}, true);
     ASSERT_EQ(t_sort(c.get()), 0);
     const std::vector<T> expected{0, 0, 1, 1, 0, 5, 3, -4, 3, 4, 4, 3, -10 * b, 0, 10 * b, 0};
@@ -29,31 +22,26 @@ TYPED_TEST(Order, SortOrders) {
     EXPECT_EQ(t_sort(empty.get()), 0);
 }
 
-// NaN compares equal to everything; the sort must neither crash nor leave the vector (run under the sanitizer), must
-// keep every sample, and must still order the samples without NaN.
+// With NaN (equal to everything) the sort stays inside the vector, keeps every sample and still orders the others.
 TYPED_TEST(Order, SortSurvivesNaN) {
     using T = real_of<TypeParam>;
-    const T nan = std::numeric_limits<T>::quiet_NaN();
-    auto multiset = [](std::vector<T> s) {
+    auto multiset = [](std::vector<T> s) {  // NaN counted as +inf
         for (auto& e : s) e = std::isnan(e) ? std::numeric_limits<T>::infinity() : e;
         std::sort(s.begin(), s.end());
         return s;
     };
-    for (const bool is_complex : {false, true}) {
-        for (const int n : {1, 2, 17, 100, 4000}) {
+    for (const bool is_complex : {false, true})
+        for (const int n : {1, 2, 17, 100, 4000})
             for (const size_t every : {1, 2, 3, 7}) {
                 auto x = random_values<T>(static_cast<size_t>(is_complex ? 2 * n : n), uint32_t(n + every));
-                for (size_t i = 0; i < x.size(); i += every) x[i] = nan;
+                for (size_t i = 0; i < x.size(); i += every) x[i] = std::numeric_limits<T>::quiet_NaN();
                 Vec<TypeParam> v(x, is_complex);
                 ASSERT_EQ(t_sort(v.get()), 0);
-                EXPECT_EQ(multiset(v.values()), multiset(x)) << "samples lost, n=" << n;
-                if (is_complex) continue;
                 auto y = v.values();
+                EXPECT_EQ(multiset(y), multiset(x)) << "samples lost, n=" << n;
                 y.erase(std::remove_if(y.begin(), y.end(), [](T e) { return std::isnan(e); }), y.end());
-                EXPECT_TRUE(std::is_sorted(y.begin(), y.end()));
+                EXPECT_TRUE(is_complex || std::is_sorted(y.begin(), y.end()));
             }
-        }
-    }
 }
 
 TYPED_TEST(Order, Median) {
@@ -74,9 +62,7 @@ TYPED_TEST(Order, Median) {
     const auto r = STAT(t_median)(src);
     EXPECT_EQ(src.values(), x);
     std::sort(x.begin(), x.end());
-    EXPECT_EQ(r.re, (x[499] + x[500]) * T(0.5));
-    ASSERT_EQ(t_median(src.get(), src.get()), 0);
-    EXPECT_TRUE(src->points == 1 && src[0] == r.re);
+    EXPECT_TRUE(r.re == (x[499] + x[500]) * T(0.5) && t_median(src.get(), src.get()) == 0 && src->points == 1 && src[0] == r.re);
 }
 
 TYPED_TEST(Order, HistogramEdges) {
@@ -84,14 +70,7 @@ TYPED_TEST(Order, HistogramEdges) {
     constexpr T b = bound_of<TypeParam>();
     const T nan = std::numeric_limits<T>::quiet_NaN();
     const T eps = std::numeric_limits<T>::epsilon();
-    struct Row {
-        const char* what;
-        std::vector<T> in;
-        bool complex;
-        T origin, width;
-        int32_t bins;
-        std::vector<T> counts;
-    };
+    struct Row { const char* what; std::vector<T> in; bool complex; T origin, width; int32_t bins; std::vector<T> counts; };
     const Row rows[] = {
         {"lower edges included", {0, 1, 2, 3, 0.5, 3.999f}, false, 0, 1, 4, {2, 1, 1, 2}},
         {"top edge lands in the top bin", {4}, false, 0, 1, 4, {0, 0, 0, 1}},
@@ -104,29 +83,153 @@ TYPED_TEST(Order, HistogramEdges) {
         {"no bins", {1, 2}, false, 0, 1, 0, {}},
     };
     for (const Row& row : rows) {
-        Vec<TypeParam> src(row.in, row.complex);
-        Vec<TypeParam> dst;
+        Vec<TypeParam> src(row.in, row.complex), dst;
         ASSERT_EQ(t_hist(src.get(), dst.get(), row.origin, row.width, row.bins), 0) << row.what;
-        EXPECT_EQ(dst->complex, 0);
-        EXPECT_TRUE(dst->delta == row.width && dst.values() == row.counts) << row.what;
+        EXPECT_TRUE(dst->complex == 0 && dst->delta == row.width && dst.values() == row.counts) << row.what;
     }
     // delta becomes the width also for an empty source; in place works
-    Vec<TypeParam> empty;
-    Vec<TypeParam> dst;
-    ASSERT_EQ(t_hist(empty.get(), dst.get(), T(0), T(0.25), 2), 0);
-    EXPECT_EQ(dst->delta, T(0.25));
-    EXPECT_EQ(dst.values(), (std::vector<T>{0, 0}));
-    Vec<TypeParam> v{0.5, 1.5, 1.7f};
-    ASSERT_EQ(t_hist(v.get(), v.get(), T(0), T(1), 2), 0);
-    EXPECT_EQ(v.values(), (std::vector<T>{1, 2}));
-    EXPECT_EQ(v->delta, T(1));
+    Vec<TypeParam> empty, dst, v{0.5, 1.5, 1.7f};
+    ASSERT_TRUE(t_hist(empty.get(), dst.get(), T(0), T(0.25), 2) == 0 && t_hist(v.get(), v.get(), T(0), T(1), 2) == 0);
+    EXPECT_TRUE(dst->delta == T(0.25) && dst.values() == (std::vector<T>{0, 0}));
+    EXPECT_TRUE(v->delta == T(1) && v.values() == (std::vector<T>{1, 2}));
 }
 
 // With a million bins the float tolerance spans more than one bin: a value there still goes to the top bin, never
 // past the vector.
 TEST(OrderFloat, HistogramToleranceNeverWritesPastTheTop) {
-    Vec<vlxf_t> src{1000000.0f, 1000001.0f};
-    Vec<vlxf_t> dst;
+    Vec<vlxf_t> src{1000000.0f, 1000001.0f}, dst;
     ASSERT_EQ(vlxfs_hist(src.get(), dst.get(), 0.0f, 1.0f, 1000000), 0);
     EXPECT_EQ(dst[999999], 2.0f);
+}
+
+VLX_TYPED_SUITE(Peak);
+
+namespace {
+
+template <class V>
+struct PeakResult { int32_t status; real_of<V> value, position; };
+
+template <class V>
+PeakResult<V> run_peak(Vec<V>& src, int32_t flags, int32_t index = 0) {
+    Vec<V> dst;
+    const int32_t status = t_peak(src.get(), dst.get(), flags, index);
+    EXPECT_TRUE(has_shape(dst.get(), 2, 0, 1));
+    return {status, dst[0], dst[1]};
+}
+
+}  // namespace
+
+TYPED_TEST(Peak, FixedCases) {
+    using T = real_of<TypeParam>;
+    constexpr T b = bound_of<TypeParam>();
+    const T nan = std::numeric_limits<T>::quiet_NaN();
+    const T big = is_double<TypeParam> ? T(1e60) : T(1e10);  // power above the bound
+    const T h = is_double<TypeParam> ? T(0.315563649157834) : T(0.31556365f);
+    struct Row { const char* what; std::vector<T> in; bool complex; int32_t flags, index, status; T value, position; };
+    const std::vector<T> ten{1, 2, 3, 4, 5, 6, 7, 8, 9, 10};
+    const Row rows[] = {
+        {"empty, invalid refinement", {}, false, 0x700, 0, 0, 0, 0},
+        {"empty, parabola", {}, true, VLX_PEAK_PARABOLA, 0, 0, 0, 0},
+        {"one point, log ratio", {5}, false, VLX_PEAK_LOG_RATIO, 0, 0, 5, 0},
+        {"index below 0", ten, false, VLX_PEAK_AT_INDEX, -3, 0, 1, 0},
+        {"index beyond the end", ten, false, VLX_PEAK_AT_INDEX, 1000, 0, 10, 9},
+        {"at index wins over min", ten, false, VLX_PEAK_AT_INDEX | VLX_PEAK_MIN, 4, 0, 5, 4},
+        {"max at the last sample: parabola unrefined", {1, 2, 3, 4}, false, VLX_PEAK_PARABOLA, 0, 0, 4, 3},
+        {"first of equal maxima", {1, 5, 2, 5, 1}, false, VLX_PEAK_SAMPLE, 0, 0, 5, 1},
+        {"first of equal minima", {3, 1, 2, 1}, false, VLX_PEAK_MIN, 0, 0, 1, 1},
+        {"NaN never taken", {nan, 1, nan}, false, VLX_PEAK_SAMPLE, 0, 0, 1, 1},
+        {"all at or below -bound", {-2 * b, -b}, false, VLX_PEAK_SAMPLE, 0, 0, -2 * b, 0},
+        {"complex by power", {1, 0, 3, 4, 0, 1}, true, VLX_PEAK_SAMPLE, 0, 0, 25, 1},
+        {"huge component ranks at the bound", {10 * b, 0, big, 0}, true, VLX_PEAK_SAMPLE, 0, 0, big * big, 1},
+        {"invalid refinement", {1, 2, 1}, false, 0x400, 0, -1, 0, 0},
+        {"offset above its range", {T(1e-6), 1, T(1e-7)}, false, VLX_PEAK_LOG_RATIO, 0, -1,
+         std::exp(h * T(1.5) * T(1.5)) * T(1e-6), 1.5},
+        {"offset below its range", {1, T(1e-6), 0}, false, VLX_PEAK_LOG_RATIO, 0, -1,
+         std::exp(h * T(-0.5) * T(-0.5)), -0.5},
+        {"equal pair", {2, 2}, false, VLX_PEAK_LOG_RATIO, 0, 0, std::exp(h * T(0.5) * T(0.5)) * 2, 0.5},
+    };
+    for (const Row& row : rows) {
+        Vec<TypeParam> src(row.in, row.complex);
+        const auto r = run_peak(src, row.flags, row.index);
+        ASSERT_EQ(r.status, row.status) << row.what;
+        if (row.flags == 0x400) continue;  // values unset
+        EXPECT_TRUE(near(r.value, row.value, std::fabs(row.value) * 8 * std::numeric_limits<T>::epsilon()))
+            << row.what << ": " << r.value;
+        EXPECT_EQ(r.position, row.position) << row.what;
+    }
+    // three equal samples: the parabola divides by zero and still succeeds; the last sample as maximum uses the pair
+    // points-2, points-1
+    Vec<TypeParam> flat{1, 1, 1}, rising{1, 2, 3, 4};
+    const auto r = run_peak(flat, VLX_PEAK_PARABOLA | VLX_PEAK_AT_INDEX, 1), lr = run_peak(rising, VLX_PEAK_LOG_RATIO);
+    EXPECT_TRUE(r.status == 0 && std::isnan(r.position));
+    EXPECT_TRUE(lr.status == 0 && lr.position > T(2.5) && lr.position < T(3));
+}
+
+// Samples of a parabola give back its vertex exactly (dyadic data, so every step of the refinement is exact).
+TYPED_TEST(Peak, ParabolaIsExact) {
+    using T = real_of<TypeParam>;
+    for (int s = -8; s <= 8; ++s) {
+        const T x0 = T(10) + T(s) / 16;
+        std::vector<T> y(21);
+        for (int i = 0; i < 21; ++i) y[i] = T(3) - T(0.25) * (T(i) - x0) * (T(i) - x0);
+        Vec<TypeParam> src(y, false);
+        const auto r = run_peak(src, VLX_PEAK_PARABOLA);
+        EXPECT_TRUE(r.status == 0 && r.position == x0 && r.value == T(3));
+    }
+}
+
+// Hann window spectrum, amplitude at f bins from the centre.
+double hann_lobe(double f) { return std::fabs(f) < 1e-9 ? 1.0 : std::sin(M_PI * f) / (M_PI * f) / (1.0 - f * f); }
+
+// The log ratio puts the Gaussian lobe of its constant (and a complex source's power) at its true position; on a Hann
+// main lobe so sampled both forms move monotonically with it, across a change of bracketing pair too, and stay near.
+TYPED_TEST(Peak, LogRatioFollowsTheLobe) {
+    using T = real_of<TypeParam>;
+    const long double width = 0.792233201343665L;
+    const double tol = is_double<TypeParam> ? 1e-12 : 2e-5;
+    for (int s = 0; s <= 20; ++s) {
+        const long double x0 = 15.0L + s / 20.0L;
+        std::vector<T> re(64), cx(128);
+        for (int i = 0; i < 64; ++i) {
+            re[i] = static_cast<T>(std::exp(-(i - x0) * (i - x0) / (2 * width)));
+            cx[2 * i] = static_cast<T>(std::sqrt(static_cast<long double>(re[i])) * 0.6L);
+            cx[2 * i + 1] = static_cast<T>(std::sqrt(static_cast<long double>(re[i])) * 0.8L);
+        }
+        Vec<TypeParam> src(re, false), csrc(cx, true);
+        const auto r = run_peak(src, VLX_PEAK_LOG_RATIO), c = run_peak(csrc, VLX_PEAK_LOG_RATIO);
+        EXPECT_TRUE(r.status == 0 && near(r.position, x0, 16 * tol) && near(c.position, x0, 1e3 * tol)) << x0;
+    }
+    double lo = 0.5, hi = 0.9;  // spacing in bins
+    for (int it = 0; it < 60; ++it) {
+        const double mid = (lo + hi) / 2;
+        (hann_lobe(mid) > std::exp(-0.25 / static_cast<double>(width)) ? lo : hi) = mid;
+    }
+    for (const int32_t method : {VLX_PEAK_LOG_RATIO, VLX_PEAK_LOG_RATIO_CORRECTED}) {
+        T last = -1;
+        for (int s = 0; s <= 100; ++s) {
+            const double x0 = 20.0 + s / 50.0;
+            std::vector<T> y(48);
+            for (int i = 0; i < 48; ++i) y[i] = static_cast<T>(hann_lobe(lo * (i - x0)) * hann_lobe(lo * (i - x0)));
+            Vec<TypeParam> src(y, false);
+            const auto r = run_peak(src, method);
+            EXPECT_TRUE(r.status == 0 && r.position > last && near(r.position, x0, 0.1)) << "not monotonic or off at " << x0;
+            last = r.position;
+        }
+    }
+}
+
+// dst may be src: the result goes through a fresh vector, so a complex source becomes two real points with delta 1;
+// elsewhere dst's delta stays.
+TYPED_TEST(Peak, InPlaceFrame) {
+    using T = real_of<TypeParam>;
+    Vec<TypeParam> v({1, 0, 1e-3f, 0, 0, 2}, true);
+    v->delta = T(0.5);
+    // log-ratio warning status, result filled through the copy
+    EXPECT_EQ(t_peak(v.get(), v.get(), VLX_PEAK_LOG_RATIO | VLX_PEAK_AT_INDEX, 0), -1);
+    EXPECT_TRUE(has_shape(v.get(), 2, 0, 1) && v[1] == T(-0.5));
+
+    Vec<TypeParam> src{1, 3, 2}, dst{9, 9, 9};
+    dst->delta = T(0.125);
+    ASSERT_EQ(t_peak(src.get(), dst.get(), VLX_PEAK_SAMPLE, 0), 0);
+    EXPECT_TRUE(dst->delta == T(0.125) && dst.values() == (std::vector<T>{3, 1}));
 }

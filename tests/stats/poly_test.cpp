@@ -1,5 +1,5 @@
-// Polynomials: roots checked against their polynomial in long double, the expansion back to coefficients, the closed
-// forms' layout, the single-root searches' fixed cases, the bounds, and allocation failure.
+// Polynomials: roots against their polynomial in long double, expansion back, closed forms, single-root searches;
+// interpolation: splines reproduce a cubic, the lower methods their own polynomials.
 #include "stats_support.hpp"
 
 #include <algorithm>
@@ -40,8 +40,7 @@ std::vector<long double> expand(const std::vector<LC>& roots, long double lead) 
     return out;
 }
 
-// |p(z)| over the sum of |a_k| |z|^k: the residual relative to the size of the terms, which is what a backward-stable
-// root can promise.
+// |p(z)| over the sum of |a_k| |z|^k: what a backward-stable root can promise.
 template <class T>
 long double relative_residual(const std::vector<T>& a, LC z) {
     LC p = 0;
@@ -53,8 +52,7 @@ long double relative_residual(const std::vector<T>& a, LC z) {
     return std::abs(p) / scale;
 }
 
-// Root sets, apart from each other: random real roots and conjugate pairs; the same with each real root doubled 1e-3
-// away (clusters); a triple and a double root among them; real roots over four decades.
+// Root sets: reals and conjugate pairs apart; with each real doubled 1e-3 away; a triple and a double root; 4 decades.
 std::vector<LC> root_set(int kind, int degree, uint32_t seed) {
     std::mt19937 rng(seed);
     std::uniform_real_distribution<double> u(-2, 2);
@@ -75,8 +73,7 @@ std::vector<LC> root_set(int kind, int degree, uint32_t seed) {
     return r;
 }
 
-// vlxs_pcsolve rebuilt from the exported layers.  The library does not know these step pointers as its own, so it
-// runs every round of every search instead of skipping the cycles it recognises.
+// vlxs_pcsolve rebuilt from the exported layers, whose step pointers the library runs without skipping cycles.
 template <class V>
 int32_t pcsolve_every_round(V* src, V* dst, real_of<V> re, real_of<V> im) {
     using T = real_of<V>;
@@ -115,8 +112,7 @@ TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialAndExpandBack) {
             ASSERT_TRUE(has_shape(v.get(), degree, 1, 1));
             for (int i = 0; i < degree; ++i) {
                 const LC z(v[2 * i], v[2 * i + 1]);
-                // Each root comes from a deflated polynomial, so earlier deflations' rounding adds up; clusters take
-                // the most.
+                // deflation rounding adds up from root to root, clusters the most
                 EXPECT_LT(relative_residual(a, z), 256 * degree * eps) << "kind " << kind << ", degree " << degree << ", root " << z;
                 // sorted by power first
                 EXPECT_TRUE(i == 0 || std::norm(LC(v[2 * i - 2], v[2 * i - 1])) <= std::norm(z) * (1 + 4 * eps));
@@ -133,26 +129,16 @@ TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialAndExpandBack) {
     }
 }
 
+// Up to degree 5 the closed forms: real roots stay real (imaginary part exactly 0) and come first, ascending, then
+// the conjugate pairs.
 TYPED_TEST(Poly, ClosedFormsKeepRealRootsReal) {
     using T = real_of<TypeParam>;
     const long double eps = std::numeric_limits<T>::epsilon();
-    std::mt19937 rng(5);
-    std::uniform_real_distribution<double> u(-3, 3);
     for (int trial = 0; trial < 200; ++trial) {
         const int degree = 1 + trial % 5;
-        const bool pairs = trial % 3 == 0 && degree >= 2;
-        std::vector<LC> r;
-        while (static_cast<int>(r.size()) < degree) {
-            if (pairs && degree - r.size() >= 2) {
-                const LC z(u(rng), 0.5 + std::fabs(u(rng)));
-                r.push_back(z), r.push_back(std::conj(z));
-            } else {
-                const LC x(u(rng));
-                // well apart, so that rounding cannot turn a pair of reals complex
-                if (std::none_of(r.begin(), r.end(), [&](const LC& y) { return std::abs(x - y) < 0.2L; })) r.push_back(x);
-            }
-        }
-        std::vector<T> a = rounded<TypeParam>(expand(r, u(rng) > 0 ? 2.5L : -0.75L));
+        const std::vector<LC> r = root_set(0, degree, 1000 + trial);
+        const bool pairs = std::any_of(r.begin(), r.end(), [](const LC& z) { return z.imag() != 0; });
+        std::vector<T> a = rounded<TypeParam>(expand(r, trial % 2 ? 2.5L : -0.75L));
         a.resize(6, T(0));  // leading zeros lower the degree
         Vec<TypeParam> src(a, false), dst;
         ASSERT_TRUE(t_proots(src.get(), dst.get()) == 0 && dst->points == degree);
@@ -164,7 +150,7 @@ TYPED_TEST(Poly, ClosedFormsKeepRealRootsReal) {
             EXPECT_LT(relative_residual(a, z), (degree <= 3 ? 64 : 4096) * eps) << "trial " << trial << ", root " << z;
             EXPECT_TRUE(i == 0 || (pairs && dst[w * i + 1] != T(0)) || dst[w * (i - 1)] <= dst[w * i]) << "trial " << trial;
         }
-        if (pairs) {  // real roots (imaginary part exactly 0) first, then conjugate pairs
+        if (pairs) {
             int i = 0;
             while (i < degree && dst[2 * i + 1] == T(0)) ++i;
             EXPECT_EQ((degree - i) % 2, 0) << "trial " << trial;
@@ -193,15 +179,11 @@ TYPED_TEST(Poly, FixedCases) {
         EXPECT_EQ(t_proots(src.get(), src.get()), 0);
         EXPECT_TRUE(same_scalars(src.values(), row.roots)) << row.what;
     }
-    Vec<TypeParam> cx({1, 0, 1, 0}, true), out;
+    Vec<TypeParam> cx({1, 0, 1, 0}, true), out, constant{4, 0, 0}, list{1, 2}, none;
     EXPECT_TRUE(t_proots(cx.get(), out.get()) == -1 && iproots(cx.get()) == -1);
-    Vec<TypeParam> constant{4, 0, 0};
     EXPECT_TRUE(iproots(constant.get()) == 0 && constant->points == 0);
-    Vec<TypeParam> list{1, 2}, none;
-    ASSERT_EQ(t_pztoc(list.get()), 0);
-    EXPECT_TRUE(same_scalars(list.values(), {2, -3, 1}));
-    ASSERT_EQ(t_pztoc(none.get()), 0);
-    EXPECT_TRUE(same_scalars(none.values(), {1}));
+    ASSERT_TRUE(t_pztoc(list.get()) == 0 && t_pztoc(none.get()) == 0);
+    EXPECT_TRUE(same_scalars(list.values(), {2, -3, 1}) && same_scalars(none.values(), {1}));
 }
 
 TYPED_TEST(Poly, SingleRootSearches) {
@@ -210,17 +192,15 @@ TYPED_TEST(Poly, SingleRootSearches) {
     EXPECT_TRUE(t_peval(empty.get(), dst.get(), T(3)) == 0 && same_scalars(dst.values(), {0}));
     EXPECT_TRUE(t_psolve(empty.get(), dst.get(), T(3)) == 0 && same_scalars(dst.values(), {0}));
     EXPECT_TRUE(t_pcsolve(empty.get(), dst.get(), T(3), T(1)) == 0 && dst->complex == 0 && dst[0] == T(0));
-    EXPECT_EQ(t_psolve(constant.get(), dst.get(), T(0)), -1);
-    EXPECT_EQ(t_pcsolve(constant.get(), dst.get(), T(0), T(0)), -1);
+    EXPECT_TRUE(t_psolve(constant.get(), dst.get(), T(0)) == -1 && t_pcsolve(constant.get(), dst.get(), T(0), T(0)) == -1);
     // the zero polynomial passes at once, from the start moved onto the bound 1
     EXPECT_TRUE(t_psolve(zero.get(), dst.get(), T(7)) == 0 && dst[0] == T(1));
     EXPECT_EQ(t_psolve(unit_circle.get(), dst.get(), T(0)), -1);
     ASSERT_EQ(t_pcsolve(unit_circle.get(), dst.get(), T(0), T(0)), 0);
-    EXPECT_TRUE(dst->complex == 1 && near(std::fabs(dst[1]), 1, 4 * std::numeric_limits<T>::epsilon()));
-    EXPECT_TRUE(near(dst[0], 0, 4 * std::numeric_limits<T>::epsilon()));
+    const T e4 = 4 * std::numeric_limits<T>::epsilon();
+    EXPECT_TRUE(dst->complex == 1 && near(std::fabs(dst[1]), 1, e4) && near(dst[0], 0, e4));
     // constant term 0: always classed real
-    ASSERT_EQ(t_pcsolve(origin.get(), dst.get(), T(0.3), T(0.7)), 0);
-    EXPECT_EQ(dst->complex, 0);
+    EXPECT_TRUE(t_pcsolve(origin.get(), dst.get(), T(0.3), T(0.7)) == 0 && dst->complex == 0);
     // in place, on odd degrees with a real root somewhere in the bounds
     const long double eps = std::numeric_limits<T>::epsilon();
     for (int degree = 1; degree <= 19; degree += 2) {
@@ -229,8 +209,7 @@ TYPED_TEST(Poly, SingleRootSearches) {
         const T lo = t_root_lower_bound(v.get()), hi = t_root_upper_bound(v.get());
         for (const LC& z : root_set(0, degree, degree))
             EXPECT_TRUE(z.imag() != 0 || (lo <= z.real() && z.real() <= hi)) << z;
-        ASSERT_EQ(t_psolve(v.get(), v.get(), T(0.25)), 0) << degree;
-        ASSERT_TRUE(has_shape(v.get(), 1, 0, 1));
+        ASSERT_TRUE(t_psolve(v.get(), v.get(), T(0.25)) == 0 && has_shape(v.get(), 1, 0, 1)) << degree;
         EXPECT_TRUE(relative_residual(a, LC(v[0])) < (64 * degree * eps) && (v[0] >= lo && v[0] <= hi));
     }
 }
@@ -251,11 +230,121 @@ TYPED_TEST(Poly, SkippedCyclesChangeNoBit) {
     }
 }
 
-TYPED_TEST(Poly, AllocationFailure) {
+namespace {
+VLX_TEST_TWIN(t_interp, vlx_interp, vlxf_interp) VLX_TEST_TWIN(t_cspline, vlx_cspline, vlxf_cspline)
+VLX_TEST_TWIN(t_cspline_2d, vlxb_cspline_2d, vlxfb_cspline_2d)
+
+using LD = long double;
+LD cubic(LD x) { return ((0.5L * x - 2) * x + 1) * x + 3; }
+LD cubic_d1(LD x) { return (1.5L * x - 4) * x + 1; }
+LD cubic_d2(LD x) { return 3 * x - 4; }
+
+template <class V, class F>
+Vec<V> table(const std::vector<LD>& xs, F f) {
+    std::vector<real_of<V>> v;
+    for (LD x : xs) v.push_back(static_cast<real_of<V>>(f(x)));
+    return Vec<V>(v, false);
+}
+}  // namespace
+
+VLX_TYPED_SUITE(Interp);
+
+// Second derivatives and values of a cubic, in and beyond the table, for the four-point closed form and the
+// tridiagonal path; y comes back unchanged.
+TYPED_TEST(Interp, SplineReproducesCubic) {
     using T = real_of<TypeParam>;
-    Vec<TypeParam> quartic{1, 0, 0, 0, 1}, dst, list{1, 2, 3}, coefficients{2, -3, 1};
-    FailingAlloc<TypeParam> failing;
-    EXPECT_TRUE(t_proots(quartic.get(), dst.get()) == -1 && t_pcsolve(quartic.get(), dst.get(), T(0), T(0)) == -1);
-    EXPECT_TRUE(t_peval(quartic.get(), dst.get(), T(0)) == -1 && t_pztoc(list.get()) < 0);
-    EXPECT_LT(iproots(coefficients.get()), 0);
+    const LD tol = is_double<TypeParam> ? 1e-11L : 2e-4L;
+    const std::vector<LD> four{-1.5L, -0.25L, 0.5L, 2}, nine{-2, -1.75L, -1, 0, 0.25L, 1, 1.5L, 2.5L, 3};
+    std::vector<T> q;  // in and beyond the tables
+    for (LD v = -3; v <= 4; v += 0.125L) q.push_back(T(v));
+    struct Row { const std::vector<LD>* xs; int32_t end0, endn; };
+    for (const Row& row : {Row{&four, 0, 0}, Row{&four, 1, 2}, Row{&nine, 0, 0}, Row{&nine, 1, 1}, Row{&nine, 2, 0},
+                           Row{&nine, 0, 2}, Row{&nine, 2, 1}}) {
+        const auto& xs = *row.xs;
+        auto x = table<TypeParam>(xs, [](LD v) { return v; }), y = table<TypeParam>(xs, cubic);
+        Vec<TypeParam> y2;
+        auto end_value = [](int32_t cond, LD at) { return T(cond == 1 ? cubic_d1(at) : cubic_d2(at)); };
+        ASSERT_EQ(t_cspline_2d(x.get(), y.get(), y2.get(), end_value(row.end0, xs.front()),
+                               end_value(row.endn, xs.back()), row.end0, row.endn), 0);
+        ASSERT_TRUE(same_scalars(y.values(), table<TypeParam>(xs, cubic).values()) && has_shape(y2.get(), int32_t(xs.size()), 0, 1.0));
+        for (size_t i = 0; i < xs.size(); ++i)
+            EXPECT_TRUE(near(y2[i], cubic_d2(xs[i]), 10 * tol)) << xs.size() << " points, knot " << i;
+        Vec<TypeParam> xi(q, false), yi;
+        xi->delta = T(0.125);
+        ASSERT_EQ(t_cspline(x.get(), y.get(), y2.get(), xi.get(), yi.get()), 0);
+        ASSERT_TRUE(has_shape(yi.get(), int32_t(q.size()), 0, 0.125));
+        for (size_t j = 0; j < q.size(); ++j) EXPECT_TRUE(near(yi[j], cubic(q[j]), tol * 50)) << "query " << q[j];
+    }
+    // no second derivatives given: not-a-knot, made on the spot; yi may be xi
+    auto x = table<TypeParam>(nine, [](LD v) { return v; }), y = table<TypeParam>(nine, cubic);
+    Vec<TypeParam> xi(std::vector<T>(x.values()), false);
+    ASSERT_EQ(t_cspline(x.get(), y.get(), nullptr, xi.get(), xi.get()), 0);
+    EXPECT_TRUE(same_scalars(xi.values(), y.values(), is_double<TypeParam> ? 64 : 16));
+}
+
+// Each lower method on its own polynomial, with and without held ends, and the method values without a formula.
+TYPED_TEST(Interp, LowerMethods) {
+    using T = real_of<TypeParam>;
+    const std::vector<LD> xs{0, 1, 2.5L, 3, 5};
+    auto x = table<TypeParam>(xs, [](LD v) { return v; }), line = table<TypeParam>(xs, [](LD v) { return 2 * v - 1; }),
+         parabola = table<TypeParam>(xs, [](LD v) { return v * v - 3 * v; });
+    const std::vector<T> q{-2, -0.5, 0, 0.75, 1, 2.5, 2.75, 4.5, 5, 6};
+    Vec<TypeParam> xi(q, false), yi;
+    auto run_on = [&](Vec<TypeParam>& at, Vec<TypeParam>& y, int32_t flags, TypeParam* y2 = nullptr) {
+        EXPECT_EQ(t_interp(at.get(), y.get(), y2, xi.get(), yi.get(), flags), 0);
+        return yi.values();
+    };
+    const T tol = is_double<TypeParam> ? T(1e-13) : T(2e-5);
+    for (const bool hold : {false, true}) {
+        const int32_t h = hold ? VLX_INTERP_HOLD_ENDS : 0;
+        const auto lin = run_on(x, line, VLX_INTERP_LINEAR | h);
+        const auto par = run_on(x, parabola, VLX_INTERP_QUADRATIC | h);
+        const auto stp = run_on(x, line, VLX_INTERP_STEP | h);
+        for (size_t j = 0; j < q.size(); ++j) {
+            const T c = hold ? std::min(std::max(q[j], T(0)), T(5)) : q[j];
+            EXPECT_TRUE(near(lin[j], 2 * c - 1, tol * 8)) << "linear at " << q[j];
+            EXPECT_TRUE(near(par[j], c * c - 3 * c, tol * 64)) << "quadratic at " << q[j];
+            size_t k = 0;  // the last abscissa at or below the query, the first one below the table
+            while (k + 1 < xs.size() && T(xs[k + 1]) <= q[j]) ++k;
+            EXPECT_EQ(stp[j], line[k]) << "step at " << q[j];
+        }
+    }
+    // values 2, 4, 6, 7: the first query's segment end for every query
+    for (const int32_t method : {2, 4, 6, 7})
+        EXPECT_TRUE(same_scalars(run_on(x, line, method), std::vector<T>(q.size(), line[1])));
+    EXPECT_TRUE(same_scalars(run_on(x, line, 2 | VLX_INTERP_HOLD_ENDS), {-1, -1, 1, 1, 1, 1, 1, 1, 1, 1}));
+    // a parabola needs three points, so two give the line
+    Vec<TypeParam> x2{0, 2}, y2v{1, 5}, x1{1}, y1{4}, d2{2};
+    EXPECT_TRUE(same_scalars(run_on(x2, y2v, VLX_INTERP_QUADRATIC | 8), run_on(x2, y2v, VLX_INTERP_LINEAR)));
+    // one point: a constant, or the parabola of its second derivative
+    EXPECT_TRUE(same_scalars(run_on(x1, y1, VLX_INTERP_LINEAR), std::vector<T>(q.size(), T(4))));
+    EXPECT_EQ(run_on(x1, y1, VLX_INTERP_SPLINE, d2.get())[0], T(13));
+}
+
+TYPED_TEST(Interp, Failures) {
+    using T = real_of<TypeParam>;
+    Vec<TypeParam> x{0, 1, 1, 2, 3}, y{5, 6, 7, 8, 9}, xi{0.5, 0.75, 1.5}, yi, y2;
+    // equal abscissas met on the way: the earlier values stay
+    ASSERT_EQ(t_interp(x.get(), y.get(), nullptr, xi.get(), yi.get(), VLX_INTERP_LINEAR), -1);
+    EXPECT_TRUE(yi[0] == T(5.5) && yi[1] == T(5.75));
+    Vec<TypeParam> rising{0, 1, 2, 4, 5}, cx({0, 1, 2, 3}, true), short_y{1, 2};
+    const std::vector<T> before = y.values();
+    // x not rising, or a bad end0: y untouched
+    EXPECT_TRUE(t_cspline_2d(x.get(), y.get(), y2.get(), T(0), T(0), 0, 0) == -1 && same_scalars(y.values(), before));
+    EXPECT_TRUE(t_cspline_2d(rising.get(), y.get(), y2.get(), T(0), T(0), 4, 0) == -1 && same_scalars(y.values(), before));
+    // a bad endn leaves the start's change of y: settled
+    EXPECT_TRUE(t_cspline_2d(rising.get(), y.get(), y2.get(), T(0), T(0), 0, 4) == -1 && y[1] == y[0]);
+    const int32_t refused[] = {
+        t_cspline_2d(cx.get(), y.get(), y2.get(), T(0), T(0), 3, 3),
+        t_cspline_2d(short_y.get(), short_y.get(), y2.get(), T(0), T(0), 3, 3),
+        t_cspline(short_y.get(), short_y.get(), nullptr, xi.get(), yi.get()),
+        t_interp(rising.get(), short_y.get(), nullptr, xi.get(), yi.get(), 1),
+        t_interp(rising.get(), y.get(), short_y.get(), xi.get(), yi.get(), VLX_INTERP_SPLINE),
+        t_interp(rising.get(), y.get(), nullptr, cx.get(), yi.get(), 1)};
+    for (const int32_t status : refused) EXPECT_EQ(status, -1);
+    Vec<TypeParam> empty;  // no table: zeros
+    EXPECT_TRUE(t_interp(empty.get(), empty.get(), nullptr, xi.get(), yi.get(), 1) == 0 && same_scalars(yi.values(), {0, 0, 0}));
+    // natural ends hold their second derivatives at exactly 0
+    ASSERT_EQ(t_cspline_2d(rising.get(), y.get(), y2.get(), T(5), T(5), VLX_SPLINE_NATURAL, VLX_SPLINE_NATURAL), 0);
+    EXPECT_TRUE(y2[0] == T(0) && y2[4] == T(0) && y2[2] != T(0));
 }

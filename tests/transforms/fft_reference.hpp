@@ -1,5 +1,4 @@
-// References for the power-of-two transforms: a literal stage-by-stage split-radix engine (the bit-exactness
-// yardstick for the library's reordered engine), and long-double transforms for accuracy.
+// References for the power-of-two transforms: the literal split-radix recipes, bit for bit, and a long-double sum.
 #pragma once
 
 #include "vlx_test.hpp"
@@ -35,27 +34,17 @@ template <class T>
 std::vector<T> literal_table(size_t n) {
     constexpr bool dbl = std::is_same_v<T, double>;
     std::vector<T> t(3 * n / 2, T(0));
-    const T p0[6] = {1, -1, -1, 1, -1, -1};
-    for (int i = 0; i < 6; ++i) t[i] = p0[i];
+    t[0] = t[3] = 1, t[1] = t[2] = t[4] = t[5] = -1;
     const T e = dbl ? T(6.283185307179586) / T(n) : T(6.2831855f) / T(n);
-    const T c1 = dbl ? T(std::cos(double(e))) : std::cos(float(e));
-    const T s1 = dbl ? T(std::sin(double(e))) : std::sin(float(e));
+    const T c1 = dbl ? T(std::cos(double(e))) : std::cos(float(e)), s1 = dbl ? T(std::sin(double(e))) : std::sin(float(e));
     T c = c1, s = s1;
-    size_t in_run = 0;
-    for (size_t k = 1; k < n / 8; ++k) {
-        if (in_run == 256) {
-            const T a = T(k) * e;
-            c = T(std::cos(double(a)));
-            s = T(std::sin(double(a)));
-            in_run = 0;
-        }
+    for (size_t k = 1, in_run = 0; k < n / 8; ++k, ++in_run) {
+        if (in_run == 256) c = T(std::cos(double(T(k) * e))), s = T(std::sin(double(T(k) * e))), in_run = 0;
         t[6 * k] = c, t[6 * k + 1] = -(c + s), t[6 * k + 2] = s - c;
         const size_t r = n / 4 - k;
         t[6 * r] = s, t[6 * r + 1] = -(c + s), t[6 * r + 2] = c - s;
-        ++in_run;
         const T cn = c1 * c - s1 * s;
-        const T sn = s * c1 + s1 * c;
-        c = cn, s = sn;
+        s = s * c1 + s1 * c, c = cn;
     }
     if (n > 4) {
         t[6 * (n / 8)] = dbl ? T(0.7071067811865476) : T(0.70710677f);
@@ -174,27 +163,20 @@ std::vector<T> literal_rfft(const std::vector<T>& in) {
 
 using cld = std::complex<long double>;
 
-// Unscaled long-double sum with exp(sign j 2 pi n k / N), naive.
-inline std::vector<cld> exact_sum(const std::vector<cld>& x, long double sign) {
+// The naive long-double sum with exp(-+j 2 pi n k / N); as the library's pair, forward carries 1/N, inverse nothing.
+inline std::vector<cld> exact_dft(const std::vector<cld>& x, bool inverse) {
     const size_t n = x.size();
     std::vector<cld> w(n), y(n);
-    for (size_t k = 0; k < n; ++k) w[k] = std::polar(1.0L, sign * 6.283185307179586476925286766559L * k / n);
-    for (size_t k = 0; k < n; ++k)
+    for (size_t k = 0; k < n; ++k) w[k] = std::polar(1.0L, (inverse ? 1 : -1) * 6.283185307179586476925286766559L * k / n);
+    for (size_t k = 0; k < n; ++k) {
         for (size_t j = 0; j < n; ++j) y[k] += x[j] * w[(j * k) % n];
+        if (!inverse) y[k] /= static_cast<long double>(n);
+    }
     return y;
 }
 
-// The library's pair: forward carries 1/N, inverse nothing.
-inline std::vector<cld> exact_dft(const std::vector<cld>& x, bool inverse) {
-    std::vector<cld> y = exact_sum(x, inverse ? 1.0L : -1.0L);
-    if (!inverse)
-        for (auto& v : y) v /= static_cast<long double>(x.size());
-    return y;
-}
-
-// Error bound of a transform of 2^m points against long double.  The butterflies alone stay within a few eps sqrt(m),
-// but the twiddle tables come from a recurrence restarted only every 256 steps, whose rounding grows along a run: up
-// to about one eps per step in the table values.
+// Error bound of a transform of 2^m points: a few eps sqrt(m) for the butterflies, plus up to one eps per step of the
+// twiddle recurrence's runs (restarted every 256).
 inline double transform_tolerance(double eps, int m) {
     const double steps = m >= 3 ? std::min(double(size_t(1) << (m - 3)), 256.0) : 0.0;
     return eps * (4 * std::sqrt(std::max(1.0, double(m))) + steps);

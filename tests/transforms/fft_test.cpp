@@ -1,8 +1,5 @@
-// The complex power-of-two transform through the public interface.
+// The power-of-two transforms, complex and real, the reorderings and the reconstruction of half spectra.
 #include "fft_reference.hpp"
-
-#include <cmath>
-#include <limits>
 
 using namespace vlxtest;
 using namespace fftref;
@@ -11,12 +8,8 @@ namespace {
 
 VLX_TYPED_SUITE(Fft);
 
-template <class V>
-double eps_of() { return std::numeric_limits<real_of<V>>::epsilon(); }
-
-// The reordered, depth-first engine does exactly the arithmetic of the literal stage-by-stage walk: every scalar must
-// match bit for bit, also for lengths whose tables restart the recurrence (n/8 > 257).
-TYPED_TEST(Fft, MatchesLiteralEngineBitForBit) {
+// The vectorised engines do the literal recipes' arithmetic bit for bit, also where the tables restart (n/8 > 257).
+TYPED_TEST(Fft, MatchesLiteralEnginesBitForBit) {
     using T = real_of<TypeParam>;
     for (int m = 2; m <= 16; ++m) {
         const size_t n = size_t(1) << m;
@@ -26,33 +19,17 @@ TYPED_TEST(Fft, MatchesLiteralEngineBitForBit) {
             literal_fft(want, inverse != 0);
             Vec<TypeParam> v(input, true);
             ASSERT_EQ(t_fft(&v, inverse), 0);
-            size_t mismatches = 0;
-            for (size_t i = 0; i < 2 * n; ++i) mismatches += !same_bits(v[i], want[i]);
-            EXPECT_EQ(mismatches, 0u) << "n = " << n << " inverse = " << inverse;
+            EXPECT_TRUE(same_scalars(v.values(), want)) << "n = " << n << " inverse = " << inverse;
         }
+        const std::vector<T> in = random_values<T>(n, 300 + m);
+        Vec<TypeParam> v(in, false);
+        ASSERT_EQ(t_rfft(&v), 0);
+        EXPECT_TRUE(same_scalars(v.values(), literal_rfft(in))) << "real, n = " << n;
     }
 }
 
-// Relative L2 error against long double within a small multiple of eps sqrt(log2 N), forward and after a round trip;
-// this also vouches for the literal engine above.
-TYPED_TEST(Fft, AccuracyAgainstLongDouble) {
-    using T = real_of<TypeParam>;
-    for (int m = 0; m <= 12; ++m) {
-        const size_t n = size_t(1) << m;
-        const std::vector<T> input = random_values<T>(2 * n, 7 + m);
-        std::vector<cld> x(n);
-        for (size_t k = 0; k < n; ++k) x[k] = cld(input[2 * k], input[2 * k + 1]);
-        const std::vector<cld> want = exact_dft(x, false);
-        const double tol = transform_tolerance(eps_of<TypeParam>(), m);
-        Vec<TypeParam> v(input, true);
-        ASSERT_EQ(t_fft(&v, 0), 0);
-        EXPECT_LE(double(rel_l2(v.get()->data, want, n)), tol) << "forward, n = " << n;
-        ASSERT_EQ(t_fft(&v, 1), 0);
-        EXPECT_LE(double(rel_l2(v.get()->data, x, n)), 2 * tol) << "round trip, n = " << n;
-    }
-}
-
-// Small lengths whose results are exact in both precisions.
+// Small lengths whose results are exact in both precisions.  The real transform of the real rows keeps the first
+// N/2 + 1 bins (one point stays real) and turns a zero delta into the fallback.
 TYPED_TEST(Fft, ExactSmallLengths) {
     using T = real_of<TypeParam>;
     struct Case { std::vector<T> in; bool in_complex; int inverse; std::vector<T> out; bool out_complex; };
@@ -64,57 +41,87 @@ TYPED_TEST(Fft, ExactSmallLengths) {
         {{1, 2, 3, 4}, false, 0, {2.5, 0, -0.5, 0.5, -0.5, 0, -0.5, -0.5}, true},
         {{10, 0, -2, 2, -2, 0, -2, -2}, true, 1, {4, 0, 8, 0, 12, 0, 16, 0}, true},
         {{1, 1, 1, 1, 1, 1, 1, 1}, false, 0, {1, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0}, true},
+        {{8, 0, 0, 0, 0, 0, 0, 0}, false, 0, {1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0}, true},
     };
     for (const Case& c : cases) {
-        Vec<TypeParam> v(c.in, c.in_complex);
+        Vec<TypeParam> v(c.in, c.in_complex), r(c.in, false);
         ASSERT_EQ(t_fft(&v, c.inverse), 0);
-        EXPECT_EQ(v->complex != 0, c.out_complex);
-        EXPECT_EQ(v.values(), c.out) << "input of " << c.in.size() << " scalars";
+        EXPECT_TRUE((v->complex != 0) == c.out_complex && v.values() == c.out) << "input of " << c.in.size() << " scalars";
+        if (c.in_complex) continue;
+        r->delta = T(0);
+        const size_t half = c.in.size() > 1 ? c.in.size() + 2 : 1;
+        ASSERT_TRUE(t_rfft(&r) == 0 && r->complex == (half > 1 ? 1 : 0) && r->delta == bound_of<TypeParam>());
+        EXPECT_EQ(r.values(), std::vector<T>(c.out.begin(), c.out.begin() + half)) << "real input of " << c.in.size();
     }
+    // With room for 8 real samples, both grow to the 16 scalars they work in, although the real one keeps 5 points.
+    Vec<TypeParam> r(random_values<T>(8, 2), false), f(random_values<T>(8, 2), false);
+    ASSERT_TRUE(r->alloc == 8 && t_rfft(&r) == 0 && t_fft(&f, 0) == 0);
+    EXPECT_TRUE(r->alloc == 16 && r->points == 5 && f->alloc == 16 && f->points == 8);
 }
 
-TYPED_TEST(Fft, Delta) {
-    using T = real_of<TypeParam>;
-    const T nan = std::numeric_limits<T>::quiet_NaN();
-    const T fallback = bound_of<TypeParam>();
-    struct Case { T delta; int points; int inverse; T want; };
-    const Case cases[] = {
-        {T(0), 4, 0, fallback}, {T(-0.0), 8, 1, fallback}, {T(-2), 8, 0, T(-0.0625)},
-        {T(0.5), 1, 0, T(2)},   {T(0), 2, 1, fallback},    {T(4), 2, 0, T(0.125)}, {nan, 8, 0, nan},
-    };
-    for (const Case& c : cases) {
-        Vec<TypeParam> v(std::vector<T>(2 * c.points, T(1)), true);
-        v->delta = c.delta;
-        ASSERT_EQ(t_fft(&v, c.inverse), 0);
-        EXPECT_TRUE(same_scalars<T>({v->delta}, {c.want})) << v->delta << " for delta " << c.delta;
-    }
-}
-
-// Not a power of two: -1 with the vector untouched, real or complex.
+// Not a power of two: -1 and the vector untouched, for transforms and reorderings; rfft also refuses complex input.
 TYPED_TEST(Fft, RejectsOtherLengths) {
     using T = real_of<TypeParam>;
     for (int points : {0, 3, 6, 12, 1000}) {
         for (int cplx = 0; cplx <= 1; ++cplx) {
             const std::vector<T> in = random_values<T>(size_t(points) * (cplx + 1), 5);
-            Vec<TypeParam> v(in, cplx != 0);
+            Vec<TypeParam> v(in, cplx != 0), r(in, cplx != 0), b(in, cplx != 0), s(in, cplx != 0);
             v->delta = T(0.25);
             EXPECT_TRUE(t_fft(&v, 0) == -1 && (has_shape(v.get(), points, cplx, 0.25) && v.values() == in));
+            EXPECT_TRUE(t_rfft(&r) == -1 && has_shape(r.get(), points, cplx, 1) && r.values() == in);
+            EXPECT_TRUE(t_bitrev(&b) == -1 && t_bitrev_scale(&s) == -1 && b.values() == in && s.values() == in);
         }
     }
-    Vec<TypeParam> v;
+    Vec<TypeParam> v, c(random_values<T>(8, 4), true);
     v->points = -4;
-    EXPECT_EQ(t_fft(&v, 1), -1);
+    EXPECT_TRUE(t_fft(&v, 1) == -1 && t_rfft(&c) == -1 && c->points == 4 && c->complex == 1);
 }
 
-// A real vector is spread in place to 2N scalars; its transform is that of the same data given as complex.
-TYPED_TEST(Fft, RealInputGrowsToComplex) {
+// Every point lands at its reversed index, real and complex alike, past 1 MB of samples; the scaled form multiplies
+// each sample by 1/N exactly once; twice is identity.
+TYPED_TEST(Fft, BitrevPermutesAndScales) {
     using T = real_of<TypeParam>;
-    const std::vector<T> in = random_values<T>(64, 9);
-    std::vector<T> spread(128, T(0));
-    for (size_t i = 0; i < 64; ++i) spread[2 * i] = in[i];
-    Vec<TypeParam> real(in, false), cplx(spread, true);
-    ASSERT_TRUE(t_fft(&real, 0) == 0 && t_fft(&cplx, 0) == 0 && real->alloc == 128 && real->points == 64);
-    EXPECT_TRUE(same_scalars(real.values(), cplx.values()));
+    for (int m = 0; m <= 18; ++m)
+        for (int cplx = 0; cplx <= 1; ++cplx) {
+            const size_t n = size_t(1) << m, w = cplx ? 2 : 1;
+            const std::vector<T> in = random_values<T>(n * w, 20 + m);
+            std::vector<T> want(in.size()), scaled(in.size());
+            for (size_t i = 0; i < n * w; ++i) {
+                want[reverse_index(i / w, m) * w + i % w] = in[i];
+                scaled[reverse_index(i / w, m) * w + i % w] = in[i] * (T(1) / T(n));
+            }
+            Vec<TypeParam> plain(in, cplx), s(in, cplx);
+            plain->delta = T(3);
+            ASSERT_TRUE(t_bitrev(&plain) == 0 && t_bitrev_scale(&s) == 0 && has_shape(plain.get(), int32_t(n), cplx, 3));
+            EXPECT_TRUE(same_scalars(plain.values(), want) && same_scalars(s.values(), scaled)) << n << " " << cplx;
+            EXPECT_TRUE(t_bitrev(&plain) == 0 && plain.values() == in);
+        }
+}
+
+TYPED_TEST(Fft, RealReconstruction) {
+    using T = real_of<TypeParam>;
+    struct Case { std::vector<T> in; bool cplx; int odd; std::vector<T> out; };
+    const Case cases[] = {
+        {{1, 2, 3, 4}, true, 0, {1, 2, 3, 4}},                  // 2 points: nothing to mirror
+        {{1, 2, 3, 4}, true, 1, {1, 2, 3, 4, 3, -4}},           // odd: point 1 mirrored
+        {{7, 0}, true, 1, {7, 0}},                               // a single point stays
+        {{0, 0, 1, 1, 2, 2, 3, 3, 4, 0}, true, 0, {0, 0, 1, 1, 2, 2, 3, 3, 4, 0, 3, -3, 2, -2, 1, -1}},
+        {{0, 0, 1, 1, 2, 2}, true, 1, {0, 0, 1, 1, 2, 2, 2, -2, 1, -1}},
+        {{0, 1, 2, 3}, false, 0, {0, 1, 2, 3, 2, 1}},           // real: mirrored as is
+        {{0, 1, 2}, false, 1, {0, 1, 2, 2, 1}},
+    };
+    for (const Case& c : cases) {
+        Vec<TypeParam> v(c.in, c.cplx);
+        v->delta = T(2);
+        ASSERT_EQ(t_orecon(&v, c.odd), 0);
+        EXPECT_EQ(v.values(), c.out) << c.in.size() << " scalars, odd " << c.odd;
+        EXPECT_EQ(v->delta, T(2));
+        if (c.odd == 0) {
+            Vec<TypeParam> w(c.in, c.cplx);
+            ASSERT_EQ(t_recon(&w), 0);
+            EXPECT_EQ(w.values(), c.out);
+        }
+    }
 }
 
 }  // namespace

@@ -1,16 +1,12 @@
 // Every vector path of the power-of-two engines gives the scalar path's bits.
 #include "fft_reference.hpp"
 
-#include <cstring>
-
 using namespace vlxtest;
 using namespace fftref;
 
 namespace {
 
-template <class V>
-class Lanes : public ::testing::Test {};
-TYPED_TEST_SUITE(Lanes, Families);
+VLX_TYPED_SUITE(Lanes);
 
 // Complex transforms in both directions, the real transform, and the plain
 // and scaled reorderings, at the given lane level.
@@ -46,9 +42,7 @@ TYPED_TEST(Lanes, EveryPathMatchesScalarBitForBit) {
         for (int32_t level = 1; level <= widest; ++level) {
             const auto got = run_all<TypeParam>(level, in);
             for (size_t i = 0; i < want.size(); ++i)
-                EXPECT_TRUE(got[i].size() == want[i].size() &&
-                            std::memcmp(got[i].data(), want[i].data(), want[i].size() * sizeof(T)) == 0)
-                    << "n = " << n << ", lanes " << level << ", case " << i;
+                EXPECT_TRUE(same_scalars(got[i], want[i])) << "n = " << n << ", lanes " << level << ", case " << i;
         }
     }
     vlx_transform_lanes(2);
