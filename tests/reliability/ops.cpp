@@ -1,9 +1,6 @@
-// The operation table: one row per exported operation (a few operations have
-// a second row for another path), each a representative call written once for
-// both families.  The context decides which argument is spoiled or aliased.
+// The operation table: one row per exported operation (a few operations have a second row for another path), each a
+// representative call written once for both families.  The context decides which argument is spoiled or aliased.
 #include "harness.hpp"
-
-#include <type_traits>
 
 #include <cstdio>
 
@@ -12,9 +9,7 @@ namespace {
 
 // Operations that return a value, not a status: only their survival counts.
 template <class X>
-int value_only(X) {
-    return 0;
-}
+int value_only(X) { return 0; }
 
 // Points doubled, for a vector that must grow (hostile lengths left alone).
 template <class V>
@@ -26,14 +21,10 @@ V* bump(V* v) {
 // A staged filter call closed as a filter closes it.
 template <class V, class S, class U>
 int staged(Ctx<V>& c, S stage, U unstage, int32_t flags) {
-    V* out = c.out();
-    V* hist = c.hist();
-    V* tmp = c.out();
-    V* saved = nullptr;
+    V *out = c.out(), *hist = c.hist(), *tmp = c.out(), *saved = nullptr;
     int32_t aliased = 0;
     const int r = stage(c.in(64), &out, nullptr, &hist, c.n(16), c.n(flags), &aliased, tmp, &saved);
-    if (r < 0) return r;
-    return unstage(out, aliased, saved);
+    return r < 0 ? r : unstage(out, aliased, saved);
 }
 
 // Abscissas 0, 0.5, 1, ... : a table that rises strictly.
@@ -41,7 +32,7 @@ template <class V>
 V* ramp(Ctx<V>& c, int32_t n) {
     V* v = c.coef(n);
     if (c.intact(v) && v->alloc >= n)
-        for (int32_t i = 0; i < n; ++i) v->data[i] = vlxtest::real_of<V>(0.5 * i);
+        for (int32_t i = 0; i < n; ++i) v->data[i] = real_of<V>(0.5 * i);
     return v;
 }
 
@@ -58,40 +49,27 @@ V* rsmp_table(Ctx<V>& c) {
 template <class V>
 V* wanting(Ctx<V>& c, int32_t n) {
     V* v = c.out();
-    if (v->points == 0 && v->data == nullptr) {
-        Pause p;
-        v->points = n;
-        vlxtest::t_alloc(v);
-    }
+    Pause p;
+    if (v->points == 0 && v->data == nullptr) v->points = n, vlxtest::t_alloc(v);
     return v;
 }
 
-// A stream to write to, its buffer made before the window opens.
-struct Sink {
+// A stream to write to, or one holding v in the given form at its start; its buffer is made before the window opens.
+struct Stream {
     std::FILE* f;
-    Sink() {
+    Stream() {
         Pause p;
         f = std::fopen("/dev/null", "w");
         std::fputc(' ', f);
     }
-    ~Sink() {
+    template <class V>
+    Stream(V* v, int32_t form) : f((Pause(), std::tmpfile())) {
         Pause p;
-        std::fclose(f);
-    }
-};
-
-// A stream holding v in the form given, at its start.
-template <class V>
-struct Source {
-    std::FILE* f;
-    Source(V* v, int32_t form) {
-        Pause p;
-        f = std::tmpfile();
         REL_TW(f, fwrite2)(v, f, form);
         std::rewind(f);
         std::ungetc(std::fgetc(f), f);
     }
-    ~Source() {
+    ~Stream() {
         Pause p;
         std::fclose(f);
     }
@@ -99,22 +77,19 @@ struct Source {
 
 // A configured streaming resampler of the family of V, destroyed on exit.
 template <class V>
-struct Stream {
-    std::conditional_t<vlxtest::is_double<V>, vlxh_rsmp_coef_t, vlxfh_rsmp_coef_t> coef;
-    std::conditional_t<vlxtest::is_double<V>, vlxh_rsmp_state_t, vlxfh_rsmp_state_t> state;
-    Stream(Ctx<V>& c, double ratio, bool is_complex = false) {
+struct Resampler {
+    std::conditional_t<is_double<V>, vlxh_rsmp_coef_t, vlxfh_rsmp_coef_t> coef;
+    std::conditional_t<is_double<V>, vlxh_rsmp_state_t, vlxfh_rsmp_state_t> state;
+    Resampler(Ctx<V>& c, double ratio, bool is_complex = false) {
         Pause p;
-        REL_TW(h, rsmp_coef_init)(&coef);
-        REL_TW(h, rsmp_coef_alloc)(&coef, 0);
+        REL_TW(h, rsmp_coef_init)(&coef), REL_TW(h, rsmp_coef_alloc)(&coef, 0);
         REL_TW(h, rsmp_coef_setup)(&coef, c.s(ratio), 0, 0);
-        REL_TW(h, rsmp_state_init)(&state);
-        REL_TW(h, rsmp_state_alloc)(&coef, &state, is_complex);
+        REL_TW(h, rsmp_state_init)(&state), REL_TW(h, rsmp_state_alloc)(&coef, &state, is_complex);
         REL_TW(h, rsmp_state_reset)(&coef, &state);
     }
-    ~Stream() {
+    ~Resampler() {
         Pause p;
-        REL_TW(h, rsmp_state_destroy)(&state);
-        REL_TW(h, rsmp_coef_destroy)(&coef);
+        REL_TW(h, rsmp_state_destroy)(&state), REL_TW(h, rsmp_coef_destroy)(&coef);
     }
 };
 
@@ -144,8 +119,10 @@ const std::vector<Row> table = {
     REL_ROW(, kmp_set_blocktime, return fn(c.n(0));),
     REL_ROW(, omp_set_num_threads, return fn(c.n(1));),
     // ---- transforms (the lane cap is put back after the call)
-    REL_ROW_SHARED(vlx_transform_lanes, const int32_t old = fn(-1); const int32_t r = fn(c.n(0)); fn(old);
-                   return r >= 0 ? 0 : -1;),
+    row<vlx_transform_lanes, vlx_transform_lanes>("vlx_transform_lanes", [](auto& c, auto fn) {
+        const int32_t old = fn(-1), r = fn(c.n(0));
+        return fn(old), r >= 0 ? 0 : -1;
+    }, 0u),
     REL_ROW(i, fft, return fn(c.grow(64), c.n(0));),
     REL_ROW(i, fft, return fn(c.io(64, true), c.n(1));),
     REL_ROW(i, bitrev, return fn(c.io(64, true));),
@@ -300,25 +277,25 @@ const std::vector<Row> table = {
              return fn(l, d, u, r, x, 8);),
     // ---- sample files
     REL_ROW(f, fopen, std::FILE* f = fn("/dev/null", "r"); return f != nullptr ? REL_TW(f, fclose)(f) : -1;),
-    REL_ROW(f, fwrite, Sink o; return fn(c.in(64, true), o.f);),
-    REL_ROW(f, fwrite_ascii, Sink o; return fn(c.in(64), o.f);),
-    REL_ROW(f, fwrite2, Sink o; return fn(c.in(64, true), o.f, c.n(VLX_FORMAT_SUMMARY));),
-    REL_ROW(f, fwrite2, Sink o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_GNUPLOT));),
-    REL_ROWF(kSettledLeak, f, fwrite2, Sink o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_TRACE));),
-    REL_ROW(f, fread, Source<V> i(c.in(64, true), VLX_FORMAT_BINARY); return fn(c.out(), i.f) == 1 ? 0 : -1;),
-    REL_ROWF(kCountKept, f, fread, Source<V> i(c.in(64), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROW(f, fwrite, Stream o; return fn(c.in(64, true), o.f);),
+    REL_ROW(f, fwrite_ascii, Stream o; return fn(c.in(64), o.f);),
+    REL_ROW(f, fwrite2, Stream o; return fn(c.in(64, true), o.f, c.n(VLX_FORMAT_SUMMARY));),
+    REL_ROW(f, fwrite2, Stream o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_GNUPLOT));),
+    REL_ROWF(kSettledLeak, f, fwrite2, Stream o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_TRACE));),
+    REL_ROW(f, fread, Stream i(c.in(64, true), VLX_FORMAT_BINARY); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROWF(kCountKept, f, fread, Stream i(c.in(64), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
     // ---- streaming and measurement level (scratch vectors are never shared: hist())
-    REL_ROW(h, rsmp_coef_alloc, decltype(Stream<V>::coef) k; REL_TW(h, rsmp_coef_init)(&k);
+    REL_ROW(h, rsmp_coef_alloc, decltype(Resampler<V>::coef) k; REL_TW(h, rsmp_coef_init)(&k);
             const int r = fn(&k, c.n(0)); REL_TW(h, rsmp_coef_destroy)(&k); return r;),
-    REL_ROW(h, rsmp_coef_setup, Stream<V> st(c, 1); return fn(&st.coef, c.s(0.3), c.n(1), c.n(0));),
-    REL_ROW(h, rsmp_state_alloc, Stream<V> st(c, 5.5); return fn(&st.coef, &st.state, c.n(1));),
-    REL_ROW(h, rsmp_state_reset, Stream<V> st(c, 0.7); return fn(&st.coef, &st.state);),
-    REL_ROW(h, rsmp_get_in_pts, Stream<V> st(c, 3.3); int32_t n; return fn(&n, &st.coef, c.n(100), c.n(1));),
-    REL_ROW(h, rsmp_get_out_pts, Stream<V> st(c, 0.3); int32_t n; return fn(&n, &st.coef, c.n(100), c.n(0), c.n(1));),
-    REL_ROW(h, rsmp_get_delay_pts, Stream<V> st(c, 2.5); T d; return fn(&d, &st.coef, c.n(1));),
-    REL_ROW(h, rsmp_get_settle_pts, Stream<V> st(c, 2.5); T d; return fn(&d, &st.coef, c.n(1));),
-    REL_ROW(h, rsmp, Stream<V> st(c, 2.5); return fn(c.in(256), wanting(c, 100), c.hist(), &st.coef, &st.state);),
-    REL_ROW(h, rsmp, Stream<V> st(c, 0.7, true); return fn(c.in(256, true), wanting(c, 400), c.hist(), &st.coef, &st.state);),
+    REL_ROW(h, rsmp_coef_setup, Resampler<V> st(c, 1); return fn(&st.coef, c.s(0.3), c.n(1), c.n(0));),
+    REL_ROW(h, rsmp_state_alloc, Resampler<V> st(c, 5.5); return fn(&st.coef, &st.state, c.n(1));),
+    REL_ROW(h, rsmp_state_reset, Resampler<V> st(c, 0.7); return fn(&st.coef, &st.state);),
+    REL_ROW(h, rsmp_get_in_pts, Resampler<V> st(c, 3.3); int32_t n; return fn(&n, &st.coef, c.n(100), c.n(1));),
+    REL_ROW(h, rsmp_get_out_pts, Resampler<V> st(c, 0.3); int32_t n; return fn(&n, &st.coef, c.n(100), c.n(0), c.n(1));),
+    REL_ROW(h, rsmp_get_delay_pts, Resampler<V> st(c, 2.5); T d; return fn(&d, &st.coef, c.n(1));),
+    REL_ROW(h, rsmp_get_settle_pts, Resampler<V> st(c, 2.5); T d; return fn(&d, &st.coef, c.n(1));),
+    REL_ROW(h, rsmp, Resampler<V> st(c, 2.5); return fn(c.in(256), wanting(c, 100), c.hist(), &st.coef, &st.state);),
+    REL_ROW(h, rsmp, Resampler<V> st(c, 0.7, true); return fn(c.in(256, true), wanting(c, 400), c.hist(), &st.coef, &st.state);),
     REL_ROW(h, avg, return fn(c.in(64, true), c.out(), c.hist(), c.n(VLX_AVG_LINEAR | VLX_AVG_POWER), c.n(1), c.n(2), c.s(-1), c.s(10));),
     REL_ROW(h, avg, return fn(c.in(64), c.io(64), c.hist(), c.n(VLX_AVG_GEOMETRIC | VLX_AVG_LIMITED | VLX_AVG_LOG), c.n(3), c.n(2), c.s(-1), c.s(2));),
     REL_ROW(h, corr, return fn(c.in(16, true), c.in(64, true), c.out(), c.hist(), c.n(16), c.n(1));),
