@@ -13,14 +13,14 @@ namespace {
 
 template <class V>
 struct api;
-#define VLX_BINDING_API(V, p, prec)                                                                          \
-    template <>                                                                                              \
-    struct api<V> {                                                                                          \
-        static constexpr auto get = p##_dft_get_flags, set = p##_dft_set_flags;                             \
-        static constexpr auto blocktime = p##_kmp_get_blocktime, threads = p##_omp_get_max_threads;         \
+#define VLX_BINDING_API(V, p, prec)                                                                      \
+    template <>                                                                                          \
+    struct api<V> {                                                                                      \
+        static constexpr auto get = p##_dft_get_flags, set = p##_dft_set_flags;                         \
+        static constexpr auto blocktime = p##_kmp_get_blocktime, threads = p##_omp_get_max_threads;     \
         static constexpr auto set_blocktime = p##_kmp_set_blocktime, set_threads = p##_omp_set_num_threads; \
-        static constexpr auto release = p##_free_internal;                                                   \
-        static constexpr int precision = prec;                                                               \
+        static constexpr auto release = p##_free_internal;                                               \
+        static constexpr int precision = prec;                                                           \
     };
 VLX_BINDING_API(vlx_t, vlx, 36)
 VLX_BINDING_API(vlxf_t, vlxf, 35)
@@ -32,8 +32,9 @@ R got(F fn) {
     return fn(&x) == 0 ? x : R(-2);
 }
 
-#define SCENARIO(name)                                                                                     \
-    if (std::getenv("VLX_BINDING_SCENARIO") == nullptr || std::strcmp(std::getenv("VLX_BINDING_SCENARIO"), name) != 0) \
+#define SCENARIO(name)                                                      \
+    if (std::getenv("VLX_BINDING_SCENARIO") == nullptr ||                   \
+        std::strcmp(std::getenv("VLX_BINDING_SCENARIO"), name) != 0)        \
     GTEST_SKIP() << "runs as a process of its own under ctest"
 
 // A function of a module that the library has loaded (omp_... from the runtime).
@@ -52,14 +53,8 @@ std::string calls() {
     seen = all.size();
     return fresh;
 }
-// The calls that make, commit, run (each of `runs`) and free a descriptor of the family: complex (domain 32) or real
-// (33), n points, forward scale 1/n; free (" x") only when asked.
 template <class V>
-std::string descriptor(int domain, int n, const std::string& runs, bool freed = true, const std::string& set = "") {
-    char head[64];
-    std::snprintf(head, sizeof head, "c%d.%d.1/%d s4=%.17g", api<V>::precision, domain, n, 1.0 / n);
-    return std::string(head).append(set).append(" m ").append(runs).append(freed ? " x " : " ");
-}
+std::string created() { return std::string(1, 'c').append(std::to_string(api<V>::precision)).append("."); }
 
 enum Kind { forward, inverse, real_fft, real_as_complex };
 
@@ -86,10 +81,6 @@ void expect_transform(Kind kind, int n, bool fast) {
     want.resize(2 * size_t(points));
     EXPECT_TRUE(same_scalars(v.values(), want) && has_shape(v.get(), points, 1, 2.0 / n)) << kind << " " << n;
 }
-template <class V>
-void expect_all_three(bool fast) {
-    for (Kind k : {forward, inverse, real_fft}) expect_transform<V>(k, 16, fast);
-}
 
 VLX_TYPED_SUITE(Binding);
 
@@ -104,7 +95,7 @@ TYPED_TEST(Binding, Absent) {
     for (uint32_t f : {0x0u, 0x7000u, 0xf000u}) EXPECT_EQ((A::set(f), got<uint32_t>(A::get)), f & 0x8000u);
     // A flags word of 0x8000 with no modules reaches no runtime call.
     EXPECT_EQ(A::set_blocktime(5) | A::set_threads(1) | got(A::blocktime) | got(A::threads), 0);
-    expect_all_three<TypeParam>(false);
+    for (Kind k : {forward, inverse, real_fft}) expect_transform<TypeParam>(k, 16, false);
     Vec<TypeParam> one({3});
     EXPECT_TRUE(t_rfft(&one) == 0 && has_shape(one.get(), 1, 0, 1.0));  // natively one real point stays real
     EXPECT_EQ(A::release(), 0);
@@ -112,62 +103,60 @@ TYPED_TEST(Binding, Absent) {
 
 TYPED_TEST(Binding, Present) {
     SCENARIO("Present");
-    using V = TypeParam;
-    using A = api<V>;
-    EXPECT_TRUE(got<uint32_t>(A::get) == 0x3000u && got(A::threads) == 2);
+    using A = api<TypeParam>;
+    EXPECT_TRUE((got<uint32_t>(A::get)) == 0x3000u && got(A::threads) == 2);
+    const std::string c = created<TypeParam>();
     // Without KEEP each transform makes and frees its descriptor; forward scale 1/N.
-    const struct { Kind kind; int n; std::string calls; } cases[] = {
-        {forward, 8, descriptor<V>(32, 8, "f")},   {inverse, 8, descriptor<V>(32, 8, "b")},
-        {real_fft, 16, descriptor<V>(33, 16, "f")}, {real_fft, 1, descriptor<V>(33, 1, "f")},  // one real point comes back complex
-        {real_as_complex, 1, descriptor<V>(32, 1, "f")}};
+    const struct { Kind kind; int n; std::string calls; } cases[] = {{forward, 8, c + "32.1/8 s4=0.125 m f x "},
+                 {inverse, 8, c + "32.1/8 s4=0.125 m b x "}, {real_fft, 16, c + "33.1/16 s4=0.0625 m f x "},
+                 {real_fft, 1, c + "33.1/1 s4=1 m f x "},  // one real point comes back complex
+                 {real_as_complex, 1, c + "32.1/1 s4=1 m f x "}};
     for (const auto& k : cases) {
-        expect_transform<V>(k.kind, k.n, true);
+        expect_transform<TypeParam>(k.kind, k.n, true);
         EXPECT_EQ(calls(), k.calls);
     }
     A::set(0x6000);  // KEEP: one descriptor per length and domain
     EXPECT_EQ(got<uint32_t>(A::get), 0x7000u);
-    expect_all_three<V>(true);
-    EXPECT_EQ(calls(), descriptor<V>(32, 16, "f b", false) + descriptor<V>(33, 16, "f", false));
+    for (Kind k : {forward, inverse, real_fft}) expect_transform<TypeParam>(k, 16, true);
+    EXPECT_EQ(calls(), c + "32.1/16 s4=0.0625 m f b " + c + "33.1/16 s4=0.0625 m f ");
     // A thread count releases them; a runtime held to one thread gets the user-thread count.
     EXPECT_EQ(A::set_threads(1) + got(A::threads), 1);
-    expect_transform<V>(forward, 16, true);
+    expect_transform<TypeParam>(forward, 16, true);
     EXPECT_EQ(A::release(), 0);
     const std::string procs = std::to_string(module_fn<int (*)()>("omp_get_num_procs")());
-    EXPECT_EQ(calls(), std::string("x x ") + descriptor<V>(32, 16, "f", true, " s26=" + procs));
-    EXPECT_EQ(A::set_threads(2), 0);
-    expect_transform<V>(forward, 16, true);
+    EXPECT_TRUE(calls() == ("x x " + c + "32.1/16 s4=0.0625 s26=" + procs + " m f x ") && A::set_threads(2) == 0);
+    expect_transform<TypeParam>(forward, 16, true);
     A::set(0x2000);  // the next transform frees what was kept
-    expect_transform<V>(forward, 16, true);
-    EXPECT_EQ(calls(), descriptor<V>(32, 16, "f f"));
+    expect_transform<TypeParam>(forward, 16, true);
+    EXPECT_EQ(calls(), c + "32.1/16 s4=0.0625 m f f x ");
     A::set(0);  // the native engines, the module untouched
     EXPECT_EQ(got<uint32_t>(A::get), 0x1000u);
-    expect_all_three<V>(false);
+    for (Kind k : {forward, inverse, real_fft}) expect_transform<TypeParam>(k, 16, false);
     EXPECT_EQ(calls(), "");
-    using W = std::conditional_t<is_double<V>, vlxf_t, vlx_t>;  // the twin, never touched, is bound on its own
+    using W = std::conditional_t<is_double<TypeParam>, vlxf_t, vlx_t>;  // the twin, never touched, is bound on its own
     A::set(0x8000);
     EXPECT_TRUE(got<uint32_t>(api<W>::get) == 0x3000u && got<uint32_t>(A::get) == 0x9000u);
-    expect_transform<V>(forward, 8, false);
+    expect_transform<TypeParam>(forward, 8, false);
     expect_transform<W>(forward, 8, true);
-    EXPECT_EQ(calls(), descriptor<W>(32, 8, "f"));
+    EXPECT_EQ(calls(), created<W>() + "32.1/8 s4=0.125 m f x ");
 }
 
 TYPED_TEST(Binding, Refusals) {
     SCENARIO("Refusals");
-    using V = TypeParam;
-    Vec<V> odd({1, 2, 3}), cplx({1, 2, 3, 4}, true), v({1, 2, 3, 4}, true), r({1, 2}), want({1, 0, 2, 0}, true);
+    const std::string c = created<TypeParam>();
+    Vec<TypeParam> odd({1, 2, 3}), cplx({1, 2, 3, 4}, true), v({1, 2, 3, 4}, true), r({1, 2}), want({1, 0, 2, 0}, true);
     EXPECT_EQ(t_fft(&odd, 0) | t_rfft(&cplx), -1);  // before any descriptor, vectors unchanged
     EXPECT_TRUE(has_shape(odd.get(), 3, 0, 1.0) && has_shape(cplx.get(), 2, 1, 1.0));
     setenv("STANDIN_FAIL", "free", 1);  // fails after computing, delta untouched; the table goes all the same
     EXPECT_TRUE(t_fft(&v, 0) == -1 && v->delta == 1);
-    api<V>::set(0x6000);  // kept: nothing may wait on the counter the next failures leave raised
+    api<TypeParam>::set(0x6000);  // kept: nothing may wait on the counter the next failures leave raised
     setenv("STANDIN_FAIL", "create", 1);
     EXPECT_TRUE(t_fft(&r, 0) == -1 && same_scalars(r.values(), want.values()));  // complex, untransformed
     unsetenv("STANDIN_FAIL");
-    expect_transform<V>(forward, 2, true);
+    expect_transform<TypeParam>(forward, 2, true);
     setenv("STANDIN_FAIL", "compute", 1);
     EXPECT_EQ(t_fft(&r, 1), -1);
-    const std::string made = descriptor<V>(32, 2, "f"), refused = made.substr(0, made.find(' ') + 1);
-    EXPECT_EQ(calls(), made + refused + descriptor<V>(32, 2, "f b", false));
+    EXPECT_EQ(calls(), c + "32.1/2 s4=0.5 m f x " + c + "32.1/2 " + c + "32.1/2 s4=0.5 m f b ");
 }
 
 TYPED_TEST(Binding, Environment) {
