@@ -260,6 +260,9 @@ const std::vector<Row> table = {
     REL_ROWF(kSettledLeak, f, fwrite2, Stream o; return fn(c.in(64), o.f, c.n(VLX_FORMAT_TRACE));),
     REL_ROW(f, fread, Stream i(c.in(64, true), VLX_FORMAT_BINARY); return fn(c.out(), i.f) == 1 ? 0 : -1;),
     REL_ROWF(kCountKept, f, fread, Stream i(c.in(64), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROW(f, read_binary, Stream i(c.in(64, true), VLX_FORMAT_BINARY); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROWF(kCountKept, f, read_text, Stream i(c.in(64), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROW(f, auto_range, return value_only(fn(c.s(1234.5)));),
     // ---- streaming and measurement level (scratch vectors are never shared: hist())
     REL_ROW(h, rsmp_coef_alloc, decltype(Resampler<V>::coef) k; REL_TW(h, rsmp_coef_init)(&k);
             const int r = fn(&k, c.n(0)); REL_TW(h, rsmp_coef_destroy)(&k); return r;),
