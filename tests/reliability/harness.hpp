@@ -98,11 +98,10 @@ struct Ctx {
     using vec = V;
     using T = real_of<V>;
     Mode mode;
-    int nvec = 0, nscalar = 0, nint = 0, used = 0, fused = 0;
+    int nvec = 0, nscalar = 0, nint = 0, used = 0;
     std::vector<Role> roles;  // of the vector arguments handed out, in order
     std::array<V, 16> pool{};
     std::array<V*, 16> args{};
-    std::array<vlxf_t, 4> fpool{};
     std::vector<std::vector<T>> lent;
     uint32_t seed = 1;
 
@@ -139,19 +138,13 @@ struct Ctx {
     }
     // Not the spoiled argument (so its samples may be set).
     bool intact(const V* v) const { return mode.vec < 0 || args[size_t(mode.vec)] != v || mode.kind == VKind::normal; }
-    vlxf_t* fout() {
-        Pause p;
-        vlxf_init(&fpool[size_t(fused)]);
-        return &fpool[size_t(fused++)];
-    }
     T s(double x) { return T(nscalar++ == mode.scalar ? mode.scalar_value : x); }
     int32_t n(int32_t x) { return nint++ == mode.integer ? int32_t(mode.int_value) : x; }
     uint32_t u(uint32_t x) { return nint++ == mode.integer ? uint32_t(mode.int_value) : x; }
     void clear() {
         Pause p;
         for (int i = 0; i < used; ++i) vlxtest::t_destroy(&pool[size_t(i)]);
-        for (int i = 0; i < fused; ++i) vlxf_destroy(&fpool[size_t(i)]);
-        used = fused = nvec = nscalar = nint = 0;
+        used = nvec = nscalar = nint = 0;
         roles.clear();
         lent.clear();
     }

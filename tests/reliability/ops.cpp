@@ -108,7 +108,7 @@ const std::vector<Row> table = {
     REL_ROW(, copy_at_most, return fn(c.out(), c.in(16), c.n(5));),
     REL_ROW(u, subvec, return fn(c.in(16, true), c.out(), c.n(2), c.n(5));),
     REL_ROW(, insert_subvec, return fn(c.in(8, true), c.io(16), c.n(1), c.n(5), c.n(3));),
-    REL_ROW(u, tof, return fn(c.in(16, true), c.fout());),
+    REL_ROW(u, tof, vlxtest::Vec<vlxf_t> f; return fn(c.in(16, true), f.get());),
     REL_ROW(, cmp, int32_t r = 0; return fn(c.in(16, true), c.in(16), c.s(0.1), &r);),
     // ---- binding calls (inert without the modules); the flags word is restored
     REL_ROW(, dft_set_flags, uint32_t old = 0; REL_TW(, dft_get_flags)(&old);
