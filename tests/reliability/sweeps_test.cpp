@@ -3,7 +3,6 @@
 
 #include <cstdio>
 #include <fstream>
-#include <regex>
 #include <set>
 
 #if defined(__SANITIZE_ADDRESS__)
@@ -227,10 +226,10 @@ TEST(ReliabilityCoverage, OperationsWithoutRows) {
     const std::string source = __FILE__;
     std::ifstream in(source.substr(0, source.rfind("/tests/")) + "/include/libvlx.h");
     std::set<std::string> declared, covered;
-    const std::regex declaration(R"(^VLX_API [^(]*\b(vlx\w+)\()");
-    std::smatch m;
-    for (std::string line; std::getline(in, line);)
-        if (std::regex_search(line, m, declaration)) declared.insert(m[1]);
+    for (std::string line; std::getline(in, line);) {
+        const size_t open = line.find('('), start = line.find_last_of(" *", open) + 1;
+        if (line.rfind("VLX_API ", 0) == 0 && open != std::string::npos) declared.insert(line.substr(start, open - start));
+    }
     for (const Row& r : rows()) covered.insert(r.name);
     // Calls without arguments to spoil, reading state only, or run by the set-up of other rows.
     const std::set<std::string> trivial = {"vlx_lib_alloc", "vlx_lib_realloc", "vlx_lib_free", "vlx_init",
