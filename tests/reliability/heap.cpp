@@ -72,8 +72,10 @@ int32_t hook_realloc(V* v, int32_t, int32_t) {
         return 0;
     }
     // A failed enlargement keeps the old block, which the library drops: it stays tracked, for release_hook_blocks.
+    const auto old_bits = reinterpret_cast<uintptr_t>(old);  // not a pointer once realloc has run
+    track(nullptr, old);
     void* p = REL_REAL(realloc)(old, bytes_of(v));
-    if (p != nullptr) track(p, old);
+    track(p != nullptr ? p : reinterpret_cast<void*>(old_bits), nullptr);
     v->data = static_cast<decltype(v->data)>(p);
     return 0;
 }
