@@ -112,14 +112,14 @@ bool same_bits(T a, T b) { return std::memcmp(&a, &b, sizeof(T)) == 0; }
 template <class T>
 double ulp_distance(T a, T b) {
     if (std::isnan(a) || std::isnan(b)) return std::numeric_limits<double>::infinity();
-    if (a == b) return 0.0;
     using I = std::conditional_t<sizeof(T) == 8, int64_t, int32_t>;
-    I ia, ib;
-    std::memcpy(&ia, &a, sizeof(T));
-    std::memcpy(&ib, &b, sizeof(T));
-    if (ia < 0) ia = std::numeric_limits<I>::min() - ia;
-    if (ib < 0) ib = std::numeric_limits<I>::min() - ib;
-    return std::fabs(static_cast<double>(ia) - static_cast<double>(ib));
+    // Bit patterns mapped onto one monotonic integer line (-0 and +0 both at 0).
+    auto line = [](T x) {
+        I i;
+        std::memcpy(&i, &x, sizeof(T));
+        return i < 0 ? std::numeric_limits<I>::min() - i : i;
+    };
+    return a == b ? 0.0 : std::fabs(static_cast<double>(line(a)) - static_cast<double>(line(b)));
 }
 
 // |a - b| <= tol, written so that a NaN on either side fails.
@@ -172,11 +172,8 @@ std::vector<real_of<V>> in_blocks(const std::vector<real_of<V>>& x, bool xc, uin
 // Installs the family's storage hooks; null restores the library's own.
 template <class V>
 void set_hooks(int32_t (*a)(V*), int32_t (*r)(V*, int32_t, int32_t), int32_t (*f)(V*) = nullptr) {
-    if constexpr (is_double<V>) {
-        vlx_lib_alloc(a, nullptr), vlx_lib_realloc(r, nullptr), vlx_lib_free(f, nullptr);
-    } else {
-        vlxf_lib_alloc(a, nullptr), vlxf_lib_realloc(r, nullptr), vlxf_lib_free(f, nullptr);
-    }
+    if constexpr (is_double<V>) vlx_lib_alloc(a, nullptr), vlx_lib_realloc(r, nullptr), vlx_lib_free(f, nullptr);
+    else vlxf_lib_alloc(a, nullptr), vlxf_lib_realloc(r, nullptr), vlxf_lib_free(f, nullptr);
 }
 
 // While in scope every allocation of the family fails: the hooks release the old block and hand back no storage.
@@ -184,14 +181,11 @@ template <class V>
 struct FailingAlloc {
     static int32_t alloc(V* v) {
         if (v->alloc > 0) std::free(v->data);
-        v->data = nullptr;
-        return 0;
+        return v->data = nullptr, 0;
     }
     static int32_t realloc(V* v, int32_t, int32_t) { return alloc(v); }
     FailingAlloc() { set_hooks<V>(alloc, realloc); }
     ~FailingAlloc() { set_hooks<V>(nullptr, nullptr); }
-    FailingAlloc(const FailingAlloc&) = delete;
-    FailingAlloc& operator=(const FailingAlloc&) = delete;
 };
 
 }  // namespace vlxtest

@@ -24,6 +24,11 @@ FAULTS = [
      "for (int64_t i = width * old + 1; i < width * new_n; ++i)", "core", "zero padding misses the first new scalar"),
     ("core-clamp-count", "src/core/vector.cpp", "if (s + c > points) c = points - s;",
      "if (s + c > points) c = points - s - 1;", "core", "clamped range one point short"),
+    ("core-cmp-delta-order", "src/core/vector.cpp", "int32_t r = order(a->delta - b->delta);",
+     "int32_t r = order(b->delta - a->delta);", "core", "comparison orders the spacings the other way round"),
+    ("core-insert-spread-edge", "src/core/vector.cpp", "if (a != 0 || r.count < dst->points) {",
+     "if (a != 0 || r.count <= dst->points) {", "core",
+     "complex insert over the whole of a real vector spreads the old samples first"),
     # frame
     ("frame-counter-bound", "src/core/frame.hpp", "if (n > 10000) counter.fetch_sub(1);",
      "if (n > 1000) counter.fetch_sub(1);", "frame", "bounded counter held at the wrong level"),
@@ -136,6 +141,10 @@ FAULTS = [
      'if (v->points >= summary_samples) std::fputs(" ...", f);', "fileio",
      "summary marks a vector of exactly 32 points as cut"),
     # binding of the vendor transform modules
+    # reliability (argument checks that only the sweeps exercise)
+    ("rel-ratio-max", "src/streaming/rsmp_stream.cpp", "if (ratio > std::numeric_limits<T>::max()) return -1;",
+     "if (ratio >= std::numeric_limits<T>::max()) return -1;", "reliability",
+     "streaming resampler refuses the largest finite ratio along with an infinite one"),
     ("bind-scale-param", "src/core/binding.cpp", "constexpr int dfti_forward_scale = 4;",
      "constexpr int dfti_forward_scale = 5;", "binding", "forward scale set through the wrong parameter"),
     ("bind-precision", "src/core/binding.cpp", "constexpr int dfti_double = 36;", "constexpr int dfti_double = 35;",

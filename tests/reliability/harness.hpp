@@ -1,58 +1,58 @@
-// Machinery of the reliability sweeps: a counted, failing allocator behind
-// both the vector hooks and the standard heap; the argument context through
-// which every row of the operation table asks for its vectors and scalars, so
-// that one row serves the normal call, every hostile variant and every
-// aliasing; and a watchdog that turns a hang into a failure with a name.
+// Machinery of the reliability sweeps: a counted, failing allocator behind both the vector hooks and the standard
+// heap; a watchdog that turns a hang into a failure with a name; and the argument context through which every row of
+// the operation table asks for its vectors and numbers, so that one row serves the normal call, every hostile variant
+// and every aliasing.
 #pragma once
 
 #include "vlx_test.hpp"
 
 #include <array>
-#include <cstdint>
 #include <string>
-#include <vector>
 
 namespace rel {
 
-// ---- counted allocation (heap.cpp) -------------------------------------------
-// A window on the calling thread: every allocation made in it (hook or
-// malloc/calloc/realloc) is counted, the fail_at-th one fails, and any single
-// request above the cap fails.  Pausing hides the harness's own allocations.
+using vlxtest::is_double;
+using vlxtest::real_of;
+
+// ---- counted allocation (heap.cpp) ----
+// A window on the calling thread: every allocation made in it (hook or malloc/calloc/realloc) is counted, the
+// fail_at-th one fails, and any single request above 256 MiB fails.  Pausing hides the harness's own allocations.
 struct Window {
     bool open = false;
     int paused = 0;
-    long count = 0;
-    long fail_at = 0;
-    long failed = 0;
+    long count = 0, fail_at = 0, failed = 0;
 };
 Window& window();
 struct Pause {
     Pause() { ++window().paused; }
     ~Pause() { --window().paused; }
 };
-constexpr size_t kCapBytes = size_t(1) << 28;  // no single request above 256 MiB
-bool should_fail(size_t bytes);
-void* raw_malloc(size_t bytes);
-void raw_free(void* p);
-
-// Hook blocks alive now; release_hook_blocks() frees them (after a settled leak).
-long live_hook_blocks();
-void release_hook_blocks();
+long live_hook_blocks();     // blocks made through the hooks and alive now
+void release_hook_blocks();  // frees them (after a settled leak)
 void install_hooks();
-
-// ---- watchdog ------------------------------------------------------------------
-// Names the call in flight; a call that outlives the budget ends the process
-// with that name on stderr.
+// Names the call in flight; a call that outlives the budget ends the process with that name on stderr.
 void watch(const std::string& what, unsigned seconds);
 void unwatch();
 
-// ---- argument context ------------------------------------------------------------
-// coef: a read-only operand (taps, tables) that no destination may share;
-// fixed: never spoiled nor aliased.
+// Shape, spacing and scalars of a vector, compared bit for bit by same_image.
+template <class V>
+std::vector<double> image(const V* v) {
+    std::vector<double> x{double(v->points), double(v->complex), double(v->delta)};
+    const int64_t n = v->data == nullptr ? 0 : v->complex ? 2 * int64_t(v->points) : int64_t(v->points);
+    for (int64_t j = 0; j < n; ++j) x.push_back(double(v->data[j]));
+    return x;
+}
+inline bool same_image(const std::vector<double>& a, const std::vector<double>& b) {
+    return a.size() == b.size() && std::memcmp(a.data(), b.data(), a.size() * sizeof(double)) == 0;
+}
+
+// ---- argument context ----
+// coef: a read-only operand (taps, tables) that no destination may share; fixed: never spoiled nor aliased.
 enum class Role { in, io, grow, out, hist, fixed, coef };
+inline const char* const kRoleNames[] = {"in", "io", "grow", "out", "hist", "fixed", "coef"};
+inline bool writes(Role r) { return r == Role::io || r == Role::grow || r == Role::out; }
 // Whether arguments of these roles may be one vector.
 inline bool may_alias(Role a, Role b) {
-    auto writes = [](Role r) { return r == Role::io || r == Role::grow || r == Role::out; };
     if (a == Role::hist || b == Role::hist || a == Role::fixed || b == Role::fixed) return false;
     return !((a == Role::coef && writes(b)) || (b == Role::coef && writes(a)));
 }
@@ -71,15 +71,18 @@ enum class VKind {
     lent_tiny,    // one-scalar lent block, points 1 (out, hist only)
     big,          // 46341 points, whose square overflows 32 bits (not on quadratic rows)
 };
-constexpr VKind kVecKinds[] = {VKind::neg_points, VKind::no_points, VKind::one_point, VKind::odd_complex,
-                               VKind::nonfinite,  VKind::lent,      VKind::neg_alloc, VKind::huge,
-                               VKind::huge_pairs, VKind::lent_tiny, VKind::big};
-const char* kind_name(VKind k);
-bool kind_fits(VKind k, Role r);
+inline const char* const kKindNames[] = {"normal", "neg_points", "no_points", "one_point", "odd_complex", "nonfinite",
+                                         "lent",   "neg_alloc",  "huge",      "huge_pairs", "lent_tiny",  "big"};
+inline bool kind_fits(VKind k, Role r) {
+    const bool dest = r == Role::out || r == Role::hist;
+    if (r == Role::fixed) return false;
+    if (k == VKind::lent_tiny) return dest;
+    return (k != VKind::huge && k != VKind::huge_pairs) || dest || r == Role::grow;
+}
 
 struct Mode {
     int vec = -1;  // vector argument spoiled by kind (arguments count in the order they are made)
-    const char* role = "";
+    Role role = Role::in;
     VKind kind = VKind::normal;
     int scalar = -1;  // scalar argument replaced by scalar_value
     double scalar_value = 0;
@@ -92,19 +95,17 @@ struct Mode {
 
 template <class V>
 struct Ctx {
-    using T = vlxtest::real_of<V>;
+    using vec = V;
+    using T = real_of<V>;
     Mode mode;
-    int nvec = 0, nscalar = 0, nint = 0;
+    int nvec = 0, nscalar = 0, nint = 0, used = 0;
     std::vector<Role> roles;  // of the vector arguments handed out, in order
     std::array<V, 16> pool{};
     std::array<V*, 16> args{};
-    std::array<vlxf_t, 4> fpool{};
-    int used = 0, fused = 0;
     std::vector<std::vector<T>> lent;
     uint32_t seed = 1;
 
-    Ctx() = default;
-    explicit Ctx(const Mode& m) : mode(m) {}
+    explicit Ctx(const Mode& m = {}) : mode(m) {}
     Ctx(const Ctx&) = delete;
     Ctx& operator=(const Ctx&) = delete;
     ~Ctx() { clear(); }
@@ -113,6 +114,9 @@ struct Ctx {
     V* io(int32_t points, bool cplx = false) { return make(Role::io, points, cplx); }
     V* grow(int32_t points, bool cplx = false) { return make(Role::grow, points, cplx); }
     V* out() { return make(Role::out, 0, false); }
+    V* hist() { return make(Role::hist, 0, false); }
+    V* fixed(int32_t points, bool cplx = false) { return make(Role::fixed, points, cplx); }
+    V* coef(int32_t points, bool cplx = false) { return make(Role::coef, points, cplx); }
     // Points preset and no storage yet: a vector that the operation fills.
     V* bare(int32_t points, bool cplx = false) {
         V* v = make(Role::grow, points, cplx);
@@ -124,9 +128,6 @@ struct Ctx {
         }
         return v;
     }
-    V* hist() { return make(Role::hist, 0, false); }
-    V* fixed(int32_t points, bool cplx = false) { return make(Role::fixed, points, cplx); }
-    V* coef(int32_t points, bool cplx = false) { return make(Role::coef, points, cplx); }
     // A vector with given samples, an ordinary source.
     V* vals(std::initializer_list<double> x, bool cplx = false, Role role = Role::in) {
         V* v = make(role, int32_t(x.size() / (cplx ? 2 : 1)), cplx);
@@ -137,72 +138,53 @@ struct Ctx {
     }
     // Not the spoiled argument (so its samples may be set).
     bool intact(const V* v) const { return mode.vec < 0 || args[size_t(mode.vec)] != v || mode.kind == VKind::normal; }
-    vlxf_t* fout() {
-        Pause p;
-        vlxf_t* f = &fpool[fused++];
-        vlxf_init(f);
-        return f;
-    }
-    T s(double x) {
-        const int i = nscalar++;
-        return T(i == mode.scalar ? mode.scalar_value : x);
-    }
-    int32_t n(int32_t x) {
-        const int i = nint++;
-        return i == mode.integer ? int32_t(mode.int_value) : x;
-    }
-    uint32_t u(uint32_t x) {
-        const int i = nint++;
-        return i == mode.integer ? uint32_t(mode.int_value) : x;
-    }
+    T s(double x) { return T(nscalar++ == mode.scalar ? mode.scalar_value : x); }
+    int32_t n(int32_t x) { return nint++ == mode.integer ? int32_t(mode.int_value) : x; }
+    uint32_t u(uint32_t x) { return nint++ == mode.integer ? uint32_t(mode.int_value) : x; }
     void clear() {
         Pause p;
-        for (int i = 0; i < used; ++i) vlxtest::t_destroy(&pool[i]);
-        for (int i = 0; i < fused; ++i) vlxf_destroy(&fpool[i]);
-        used = fused = 0;
-        nvec = nscalar = nint = 0;
+        for (int i = 0; i < used; ++i) vlxtest::t_destroy(&pool[size_t(i)]);
+        used = nvec = nscalar = nint = 0;
         roles.clear();
         lent.clear();
     }
-    // Every vector handed out, for the state checks.
-    V* vec(int i) { return &pool[i]; }
 
 private:
     V* make(Role role, int32_t points, bool cplx) {
         Pause p;
         const int i = nvec++;
         roles.push_back(role);
-        if (i == mode.alias_at) return args[i] = args[mode.alias_of];
+        if (i == mode.alias_at) return args[size_t(i)] = args[size_t(mode.alias_of)];
         if (mode.all_same && role != Role::coef && role != Role::hist && role != Role::fixed)
             for (int j = 0; j < i; ++j)
-                if (may_alias(roles[size_t(j)], role) && roles[size_t(j)] != Role::coef) return args[i] = args[j];
-        V* v = &pool[used++];
+                if (may_alias(roles[size_t(j)], role) && roles[size_t(j)] != Role::coef) return args[size_t(i)] = args[size_t(j)];
+        V* v = &pool[size_t(used++)];
+        args[size_t(i)] = v;
         vlxtest::t_init(v);
         v->delta = T(0.5);
         const VKind k = i == mode.vec ? mode.kind : VKind::normal;
         const bool dest = role == Role::out || role == Role::hist;
-        if (dest && k == VKind::normal) return args[i] = v;
+        if (dest && k == VKind::normal) return v;
         v->complex = cplx;
         switch (k) {
             case VKind::no_points: points = 0; break;
             case VKind::one_point: points = 1; break;
             case VKind::big: points = 46341; break;
             case VKind::odd_complex: v->complex = 2; break;
-            case VKind::huge: v->points = INT32_MAX; return args[i] = v;
-            case VKind::huge_pairs: v->points = int32_t(1) << 30; return args[i] = v;
+            case VKind::huge: v->points = INT32_MAX; return v;
+            case VKind::huge_pairs: v->points = int32_t(1) << 30; return v;
             default: break;
         }
-        if (dest && points == 0) points = 4;
-        v->points = points;
+        v->points = dest && points == 0 ? 4 : points;
         if (k == VKind::lent || k == VKind::neg_alloc || k == VKind::lent_tiny) {
             if (k == VKind::lent_tiny) v->points = 1, v->complex = 0;
             lent.emplace_back(size_t(v->complex ? 2 * v->points : v->points), T(0.25));
             v->data = lent.back().data();
             v->alloc = k == VKind::neg_alloc ? -3 : 0;
-        } else if (points > 0) {
+        } else if (v->points > 0) {
             vlxtest::t_alloc(v);
             const auto x = vlxtest::random_values<T>(size_t(v->alloc), seed++);
-            for (int32_t j = 0; j < v->alloc; ++j) v->data[j] = x[size_t(j)];
+            std::copy(x.begin(), x.end(), v->data);
         }
         if (k == VKind::nonfinite && v->alloc >= 3) {
             v->data[0] = std::numeric_limits<T>::quiet_NaN();
@@ -210,7 +192,7 @@ private:
             v->data[v->alloc - 1] = -std::numeric_limits<T>::infinity();
         }
         if (k == VKind::neg_points) v->points = -7;
-        return args[i] = v;
+        return v;
     }
 };
 
@@ -220,48 +202,45 @@ struct Row {
     int (*d)(Ctx<vlx_t>&);
     int (*f)(Ctx<vlxf_t>&);
     unsigned flags;
+    template <class V>
+    int operator()(Ctx<V>& c) const {
+        if constexpr (is_double<V>) return d(c); else return f(c);
+    }
 };
 enum : unsigned {
     kSettledLeak = 1,  // a failed run may leave hook blocks behind, as the library settles
     kRandom = 2,       // results differ from call to call (noise): compared by status only
     kNoHostile = 4,    // not in the hostile sweep (the row's arguments are pointers it cannot spoil)
-    kQuadratic = 8,
+    kQuadratic = 8,    // work grows with the square of a length or worse: no 46341-point vectors
     kFails = 16,       // the normal call fails by design
-    kCountKept = 32,   // a failed growth leaves the count read so far with no storage (text reader)    // work grows with the square of a length or worse: no 46341-point vectors
+    kCountKept = 32,   // a failed growth leaves the count read so far with no storage (text reader)
 };
 const std::vector<Row>& rows();
+
+// The body, a stateless generic lambda, called with the context and the family's function D or F.
+template <auto D, auto F, class Body>
+Row row(const char* name, Body, unsigned flags) {
+    return {name, [](Ctx<vlx_t>& c) { return Body{}(c, D); }, [](Ctx<vlxf_t>& c) { return Body{}(c, F); }, flags};
+}
 
 // The twin of a function for the family of V.
 template <class V, class D, class F>
 auto twin(D d, F f) {
-    if constexpr (vlxtest::is_double<V>) return d; else return f;
+    if constexpr (is_double<V>) return d; else return f;
 }
 #define REL_TW(prefix, name) ::rel::twin<V>(vlx##prefix##_##name, vlxf##prefix##_##name)
 
-// ROW(prefix, name, body): body sees `c` (the context), `fn` (the operation of
-// the family) and V, T; it returns the operation's status.
-#define REL_ROWF(flags, prefix, name, ...)                                                              \
-    ::rel::Row{"vlx" #prefix "_" #name,                                                               \
-               [](::rel::Ctx<vlx_t>& c) -> int {                                                       \
-                   using V = vlx_t;                                                                    \
-                   using T = double;                                                                   \
-                   [[maybe_unused]] auto fn = vlx##prefix##_##name;                                    \
-                   (void)c, (void)sizeof(V), (void)sizeof(T);                                          \
-                   __VA_ARGS__                                                                         \
-               },                                                                                      \
-               [](::rel::Ctx<vlxf_t>& c) -> int {                                                      \
-                   using V = vlxf_t;                                                                   \
-                   using T = float;                                                                    \
-                   [[maybe_unused]] auto fn = vlxf##prefix##_##name;                                   \
-                   (void)c, (void)sizeof(V), (void)sizeof(T);                                          \
-                   __VA_ARGS__                                                                         \
-               },                                                                                      \
-               flags}
+// REL_ROW(prefix, name, body): body sees `c` (the context), `fn` (the operation of the family) and V, T; it returns
+// the operation's status.
+#define REL_ROWF(flags, prefix, name, ...)                                                                       \
+    ::rel::row<vlx##prefix##_##name, vlxf##prefix##_##name>(                                                     \
+        "vlx" #prefix "_" #name,                                                                                 \
+        []([[maybe_unused]] auto& c, [[maybe_unused]] auto fn) -> int {                                                     \
+            using V [[maybe_unused]] = typename std::remove_reference_t<decltype(c)>::vec;                       \
+            using T [[maybe_unused]] = ::rel::real_of<V>;                                                        \
+            __VA_ARGS__                                                                                          \
+        },                                                                                                       \
+        flags)
 #define REL_ROW(prefix, name, ...) REL_ROWF(0u, prefix, name, __VA_ARGS__)
-// A function shared by both families: fn is the same in both bodies.
-#define REL_ROW_SHARED(name, ...)                                                                          \
-    ::rel::Row{#name,                                                                                     \
-               [](::rel::Ctx<vlx_t>& c) -> int { [[maybe_unused]] auto fn = name; __VA_ARGS__ },           \
-               [](::rel::Ctx<vlxf_t>& c) -> int { [[maybe_unused]] auto fn = name; __VA_ARGS__ }, 0u}
 
 }  // namespace rel

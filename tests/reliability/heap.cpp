@@ -1,13 +1,11 @@
-// The counted allocator: malloc, calloc and realloc of this executable (and
-// so of the library, which calls them through the dynamic linker) and the
-// vector hooks of both families share one per-thread window.  The real
+// The counted allocator: malloc, calloc and realloc of this executable (and so of the library, which calls them
+// through the dynamic linker) and the vector hooks of both families share one per-thread window.  The real
 // allocator is glibc's, or the sanitizer's when one is linked in.
 #include "harness.hpp"
 
 #include <csignal>
-#include <cstdio>
-#include <cstring>
 #include <mutex>
+#include <unordered_set>
 #include <unistd.h>
 
 extern "C" {
@@ -30,45 +28,25 @@ void* __libc_realloc(void*, size_t);
 namespace rel {
 namespace {
 thread_local Window tls_window;
-}
-
-Window& window() { return tls_window; }
 
 bool should_fail(size_t bytes) {
     Window& w = tls_window;
     if (!w.open || w.paused > 0) return false;
-    if (bytes > kCapBytes) return true;
+    if (bytes > (size_t(1) << 28)) return true;
     if (++w.count != w.fail_at) return false;
-    ++w.failed;
-    return true;
+    return ++w.failed, true;
 }
 
-void* raw_malloc(size_t bytes) { return REL_REAL(malloc)(bytes); }
-void raw_free(void* p) { std::free(p); }
-
-// ---- hook blocks, tracked so that a leak through the hooks is seen in any build.
-namespace {
+// Hook blocks, tracked so that a leak through the hooks is seen in any build.
 std::mutex live_mutex;
-std::vector<void*>* live = nullptr;  // made paused, on first use
+std::unordered_set<void*>* live = nullptr;
 
-void track(void* p, void* gone) {
+void track(void* made, void* gone) {
     std::lock_guard<std::mutex> lock(live_mutex);
-    if (live == nullptr) {
-        Pause pause;
-        live = new std::vector<void*>();
-        live->reserve(1 << 12);
-    }
-    if (gone != nullptr)
-        for (auto& q : *live)
-            if (q == gone) {
-                q = live->back();
-                live->pop_back();
-                break;
-            }
-    if (p != nullptr) {
-        Pause pause;
-        live->push_back(p);
-    }
+    Pause pause;
+    if (live == nullptr) live = new std::unordered_set<void*>();
+    if (gone != nullptr) live->erase(gone);
+    if (made != nullptr) live->insert(made);
 }
 
 template <class V>
@@ -80,28 +58,23 @@ size_t bytes_of(const V* v) {
 template <class V>
 int32_t hook_alloc(V* v) {
     if (v->alloc > 0) track(nullptr, v->data), std::free(v->data);
-    v->data = nullptr;
-    const size_t b = bytes_of(v);
-    if (should_fail(b)) return 0;
-    v->data = static_cast<decltype(v->data)>(REL_REAL(malloc)(b));
+    v->data = should_fail(bytes_of(v)) ? nullptr : static_cast<decltype(v->data)>(REL_REAL(malloc)(bytes_of(v)));
     track(v->data, nullptr);
     return 0;
 }
 
 template <class V>
 int32_t hook_realloc(V* v, int32_t, int32_t) {
-    const size_t b = bytes_of(v);
     void* old = v->alloc > 0 ? v->data : nullptr;
-    if (should_fail(b)) {  // the failing hook gives the old block back itself
+    if (should_fail(bytes_of(v))) {  // the failing hook gives the old block back itself
         track(nullptr, old), std::free(old);
         v->data = nullptr;
         return 0;
     }
-    // A failed enlargement keeps the old block, which the library drops: it
-    // stays tracked so that release_hook_blocks() frees it.
-    const auto old_bits = reinterpret_cast<uintptr_t>(old);
+    // A failed enlargement keeps the old block, which the library drops: it stays tracked, for release_hook_blocks.
+    const auto old_bits = reinterpret_cast<uintptr_t>(old);  // not a pointer once realloc has run
     track(nullptr, old);
-    void* p = REL_REAL(realloc)(old, b);
+    void* p = REL_REAL(realloc)(old, bytes_of(v));
     track(p != nullptr ? p : reinterpret_cast<void*>(old_bits), nullptr);
     v->data = static_cast<decltype(v->data)>(p);
     return 0;
@@ -113,7 +86,20 @@ int32_t hook_free(V* v) {
     std::free(v->data);
     return 0;
 }
+
+char watched[512];
+size_t watched_len = 0;
+
+void on_alarm(int) {
+    static const char head[] = "\nreliability: call did not return in time: ";
+    (void)!write(2, head, sizeof head - 1);
+    (void)!write(2, watched, watched_len);
+    (void)!write(2, "\n", 1);
+    _exit(3);
+}
 }  // namespace
+
+Window& window() { return tls_window; }
 
 long live_hook_blocks() {
     std::lock_guard<std::mutex> lock(live_mutex);
@@ -132,20 +118,6 @@ void install_hooks() {
     vlxtest::set_hooks<vlxf_t>(hook_alloc<vlxf_t>, hook_realloc<vlxf_t>, hook_free<vlxf_t>);
 }
 
-// ---- watchdog ---------------------------------------------------------------------
-namespace {
-char watched[512];
-size_t watched_len = 0;
-
-void on_alarm(int) {
-    static const char head[] = "\nreliability: call did not return in time: ";
-    (void)!write(2, head, sizeof head - 1);
-    (void)!write(2, watched, watched_len);
-    (void)!write(2, "\n", 1);
-    _exit(3);
-}
-}  // namespace
-
 void watch(const std::string& what, unsigned seconds) {
     watched_len = std::min(what.size(), sizeof watched);
     std::memcpy(watched, what.data(), watched_len);
@@ -157,8 +129,7 @@ void unwatch() { alarm(0); }
 
 }  // namespace rel
 
-// The interposed standard heap.  free needs no wrapper: every block comes from
-// the real allocator.
+// The interposed standard heap.  free needs no wrapper: every block comes from the real allocator.
 #if !defined(__SANITIZE_THREAD__)
 extern "C" {
 void* malloc(size_t n) { return rel::should_fail(n) ? nullptr : REL_REAL(malloc)(n); }
