@@ -343,8 +343,8 @@ VLX_LEAF_STEP void leaf_pair(const L* s, L* a, L* b, const L* p4, const L* p8, c
     real_leaf<L>(s + 24, b + 48, 4, r);
     real_edges<L>(b + 32, 4, r);
     real_element<L>(b + 32, 4, 1, p4);
-    for (int j = 18; j < 24; ++j) b[j] = L{};
-    b[54] = b[55] = L{};
+    // (one by one: as a loop GCC makes it a string store, slow to start)
+    b[18] = b[19] = b[20] = b[21] = b[22] = b[23] = b[54] = b[55] = L{};
 }
 
 static constexpr uint8_t r5[32] = {0, 16, 8, 24, 4, 20, 12, 28, 2, 18, 10, 26, 6, 22, 14, 30,
@@ -357,6 +357,7 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
                               uint32_t two16, const double* pair4, const double* pair8, int64_t stride8) {
     const lanes8 scale = _mm512_set1_pd(f);
     lanes8 s[32];
+#pragma GCC unroll 32
     for (int t = 0; t < 32; ++t) s[t] = lanes8(_mm512_loadu_pd(src + r5[t] * row)) * scale;
     lanes8 p4[6], p8[18];
     for (int i = 0; i < 6; ++i) p4[i] = _mm512_set1_pd(pair4[i]);
