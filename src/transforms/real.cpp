@@ -366,6 +366,9 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
     lanes8 a[64], b[64];
     leaf_pair<lanes8>(s, a, b, p4, p8, _mm512_set1_pd(fft_sqrt_half<vlx_t>));
     const __mmask8 mask = __mmask8(two16);
+    double* dst[8];
+    for (int i = 0; i < 8; ++i) dst[i] = x + to[i];
+#pragma GCC unroll 7
     for (int q = 0; q < 7; ++q) {
         __m512d rows[8], column[8];
         for (int j = 0; j < 8; ++j)
@@ -373,7 +376,7 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
                       : q == 5 ? b[8 * q + j]
                                : _mm512_mask_blend_pd(mask, a[8 * q + j], b[8 * q + j]);
         fft_simd::transpose8(rows, column);
-        for (int i = 0; i < 8; ++i) _mm512_storeu_pd(x + to[i] + 8 * q, column[i]);
+        for (int i = 0; i < 8; ++i) _mm512_storeu_pd(dst[i] + 8 * q, column[i]);
     }
 }
 
@@ -392,6 +395,7 @@ VLX_LEAVES256 void leaf_lanes(const float* src, int64_t row, float f, float* x, 
                               const float* pair4, const float* pair8, int64_t stride8) {
     const lanes8f scale = _mm256_set1_ps(f);
     lanes8f s[32];
+#pragma GCC unroll 32
     for (int t = 0; t < 32; ++t) s[t] = lanes8f(_mm256_loadu_ps(src + r5[t] * row)) * scale;
     lanes8f p4[6], p8[18];
     for (int i = 0; i < 6; ++i) p4[i] = _mm256_set1_ps(pair4[i]);
