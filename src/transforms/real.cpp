@@ -353,12 +353,11 @@ static constexpr uint8_t r5[32] = {0, 16, 8, 24, 4, 20, 12, 28, 2, 18, 10, 26, 6
 // Eight subtrees: rows of eight lanes from src, `row` scalars apart, times f;
 // to[i] the scalar offset of lane i's subtree, bit i of two16 set if it holds
 // two leaves of 16.  Doubles on AVX-512F.
-VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* x, const int64_t* to,
-                              uint32_t two16, const double* pair4, const double* pair8, int64_t stride8) {
-    const lanes8 scale = _mm512_set1_pd(f);
-    lanes8 s[32];
-#pragma GCC unroll 32
-    for (int t = 0; t < 32; ++t) s[t] = lanes8(_mm512_loadu_pd(src + r5[t] * row)) * scale;
+// From s, the scaled samples in the order of the points.
+__attribute__((target("avx512f"), always_inline)) inline void leaf_lanes_scaled(const lanes8* s, double* x,
+                                                                                const int64_t* to, uint32_t two16,
+                                                                                const double* pair4,
+                                                                                const double* pair8, int64_t stride8) {
     lanes8 p4[6], p8[18];
     for (int i = 0; i < 6; ++i) p4[i] = _mm512_set1_pd(pair4[i]);
     for (int k = 0; k < 3; ++k)
@@ -378,6 +377,32 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
         fft_simd::transpose8(rows, column);
         for (int i = 0; i < 8; ++i) _mm512_storeu_pd(dst[i] + 8 * q, column[i]);
     }
+}
+
+VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* x, const int64_t* to,
+                              uint32_t two16, const double* pair4, const double* pair8, int64_t stride8) {
+    const lanes8 scale = _mm512_set1_pd(f);
+    lanes8 s[32];
+#pragma GCC unroll 32
+    for (int t = 0; t < 32; ++t) s[t] = lanes8(_mm512_loadu_pd(src + r5[t] * row)) * scale;
+    leaf_lanes_scaled(s, x, to, two16, pair4, pair8, stride8);
+}
+
+// The same from samples already scaled and ordered, 32 vectors at pre.
+VLX_LEAVES512 void leaf_lanes_pre(const double* pre, double* x, const int64_t* to, uint32_t two16,
+                                  const double* pair4, const double* pair8, int64_t stride8) {
+    leaf_lanes_scaled(reinterpret_cast<const lanes8*>(pre), x, to, two16, pair4, pair8, stride8);
+}
+
+// The samples of one stripe of `groups` groups, scaled, each group's 32
+// vectors in the order of the points: the aside copy of a lone stripe, with
+// the loads and the scaling of its subtrees done on the way.
+VLX_LEAVES512 void scale_rows(double* pre, int64_t groups, const double* src, int64_t row, double f) {
+    const lanes8 scale = _mm512_set1_pd(f);
+    for (int64_t j = 0; j < groups; ++j)
+#pragma GCC unroll 32
+        for (int t = 0; t < 32; ++t)
+            _mm512_store_pd(pre + 256 * j + 8 * t, lanes8(_mm512_loadu_pd(src + r5[t] * row + 8 * j)) * scale);
 }
 
 // The 32 rows of `width` scalars at src, `row` apart, to dst, by the vectors
@@ -437,7 +462,8 @@ VLX_LEAVES256 void copy_rows(float* dst, int64_t width, const float* src, int64_
 // The subtrees of stripe s, their rows at src, `row` scalars apart.  Group g
 // holds b = 8g + i, whose subtree is c = r3(i) 2^(bits-3) + r(g).
 template <class T>
-void stripe_lanes(const T* src, int64_t row, int64_t s, int64_t width, T* x, int64_t n, const T* tw) {
+void stripe_lanes(const T* src, int64_t row, int64_t s, int64_t width, T* x, int64_t n, const T* tw,
+                  const T* pre = nullptr) {
     static constexpr int64_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
     const int32_t bits = log2_of(int32_t(n / 32));
     const T f = T(1) / static_cast<T>(n);
@@ -455,6 +481,12 @@ void stripe_lanes(const T* src, int64_t row, int64_t s, int64_t width, T* x, int
                 bits > 3 ? after[starts_after(c, bits - 1, bits - 3, true)] : starts_after(c, 2, 1, true);
             if (start && (c & 1) != 0) two16 |= 1u << i;
         }
+        if constexpr (std::is_same_v<T, double>) {
+            if (pre != nullptr) {
+                leaf_lanes_pre(pre + 256 * j, x, to, two16, tw + 6 * (n / 16), tw + 6 * (n / 32), n / 32);
+                continue;
+            }
+        }
         leaf_lanes(src + 8 * j, row, f, x, to, two16, tw + 6 * (n / 16), tw + 6 * (n / 32), n / 32);
     }
 }
@@ -470,6 +502,12 @@ void real_leaves_lanes(T* x, int64_t n, const T* tw) {
     // One group reads all its samples before it writes.
     if (row == 8) return stripe_lanes<T>(x, row, 0, width, x, n, tw);
     alignas(64) T aside[32 * 64];
+    if constexpr (std::is_same_v<T, double>) {
+        if (stripes == 1) {
+            scale_rows(aside, width / 8, x, row, T(1) / static_cast<T>(n));
+            return stripe_lanes<T>(x, row, 0, width, x, n, tw, aside);
+        }
+    }
     for (int64_t s = 0; s < stripes; ++s) {
         const int64_t image = reverse_index(s, bits);
         if (image < s) continue;
