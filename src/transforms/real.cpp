@@ -394,9 +394,9 @@ VLX_LEAVES512 void leaf_lanes_pre(const double* pre, double* x, const int64_t* t
     leaf_lanes_scaled(reinterpret_cast<const lanes8*>(pre), x, to, two16, pair4, pair8, stride8);
 }
 
-// The samples of one stripe of `groups` groups, scaled, each group's 32
-// vectors in the order of the points: the aside copy of a lone stripe, with
-// the loads and the scaling of its subtrees done on the way.
+// The samples of a stripe of `groups` groups, scaled, each group's 32
+// vectors in the order of the points: the aside copy, with the loads and the
+// scaling of its subtrees done on the way.
 VLX_LEAVES512 void scale_rows(double* pre, int64_t groups, const double* src, int64_t row, double f) {
     const lanes8 scale = _mm512_set1_pd(f);
     for (int64_t j = 0; j < groups; ++j)
@@ -405,12 +405,6 @@ VLX_LEAVES512 void scale_rows(double* pre, int64_t groups, const double* src, in
             _mm512_store_pd(pre + 256 * j + 8 * t, lanes8(_mm512_loadu_pd(src + r5[t] * row + 8 * j)) * scale);
 }
 
-// The 32 rows of `width` scalars at src, `row` apart, to dst, by the vectors
-// the subtrees load them back with (faster than a copy by bytes here).
-VLX_LEAVES512 void copy_rows(double* dst, int64_t width, const double* src, int64_t row) {
-    for (int64_t r = 0; r < 32; ++r)
-        for (int64_t j = 0; j < width; j += 8) _mm512_store_pd(dst + r * width + j, _mm512_loadu_pd(src + r * row + j));
-}
 
 // The same for floats on AVX, eight lanes of 32 bits.
 #define VLX_LEAVES256 __attribute__((target("avx")))
@@ -453,6 +447,8 @@ VLX_LEAVES256 void leaf_lanes(const float* src, int64_t row, float f, float* x, 
         }
     }
 }
+// The 32 rows of `width` scalars at src, `row` apart, to dst, by the vectors
+// the subtrees load them back with (faster than a copy by bytes here).
 VLX_LEAVES256 void copy_rows(float* dst, int64_t width, const float* src, int64_t row) {
     for (int64_t r = 0; r < 32; ++r)
         for (int64_t j = 0; j < width; j += 8) _mm256_store_ps(dst + r * width + j, _mm256_loadu_ps(src + r * row + j));
@@ -502,15 +498,15 @@ void real_leaves_lanes(T* x, int64_t n, const T* tw) {
     // One group reads all its samples before it writes.
     if (row == 8) return stripe_lanes<T>(x, row, 0, width, x, n, tw);
     alignas(64) T aside[32 * 64];
-    if constexpr (std::is_same_v<T, double>) {
-        if (stripes == 1) {
-            scale_rows(aside, width / 8, x, row, T(1) / static_cast<T>(n));
-            return stripe_lanes<T>(x, row, 0, width, x, n, tw, aside);
-        }
-    }
     for (int64_t s = 0; s < stripes; ++s) {
         const int64_t image = reverse_index(s, bits);
         if (image < s) continue;
+        if constexpr (std::is_same_v<T, double>) {
+            scale_rows(aside, width / 8, x + image * width, row, T(1) / static_cast<T>(n));
+            if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
+            stripe_lanes<T>(x, row, image, width, x, n, tw, aside);
+            continue;
+        }
         copy_rows(aside, width, x + image * width, row);
         if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
         stripe_lanes<T>(aside, width, image, width, x, n, tw);
