@@ -505,11 +505,11 @@ void real_leaves_lanes(T* x, int64_t n, const T* tw) {
             scale_rows(aside, width / 8, x + image * width, row, T(1) / static_cast<T>(n));
             if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
             stripe_lanes<T>(x, row, image, width, x, n, tw, aside);
-            continue;
+        } else {
+            copy_rows(aside, width, x + image * width, row);
+            if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
+            stripe_lanes<T>(aside, width, image, width, x, n, tw);
         }
-        copy_rows(aside, width, x + image * width, row);
-        if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
-        stripe_lanes<T>(aside, width, image, width, x, n, tw);
     }
 }
 #undef VLX_LEAVES512
