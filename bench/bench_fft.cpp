@@ -439,6 +439,12 @@ int main(int argc, char** argv) {
             return 0;
         }
     }
+    for (int i = 1; i < argc; ++i) {
+        if (std::strcmp(argv[i], "--real") == 0) {
+            real_table(reps);
+            return 0;
+        }
+    }
     interleaved_table<vlx_t>(reps);
     interleaved_table<vlxf_t>(reps);
     real_table(reps);

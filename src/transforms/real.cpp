@@ -343,8 +343,8 @@ VLX_LEAF_STEP void leaf_pair(const L* s, L* a, L* b, const L* p4, const L* p8, c
     real_leaf<L>(s + 24, b + 48, 4, r);
     real_edges<L>(b + 32, 4, r);
     real_element<L>(b + 32, 4, 1, p4);
-    for (int j = 18; j < 24; ++j) b[j] = L{};
-    b[54] = b[55] = L{};
+    // (one by one: as a loop GCC makes it a string store, slow to start)
+    b[18] = b[19] = b[20] = b[21] = b[22] = b[23] = b[54] = b[55] = L{};
 }
 
 static constexpr uint8_t r5[32] = {0, 16, 8, 24, 4, 20, 12, 28, 2, 18, 10, 26, 6, 22, 14, 30,
@@ -353,11 +353,11 @@ static constexpr uint8_t r5[32] = {0, 16, 8, 24, 4, 20, 12, 28, 2, 18, 10, 26, 6
 // Eight subtrees: rows of eight lanes from src, `row` scalars apart, times f;
 // to[i] the scalar offset of lane i's subtree, bit i of two16 set if it holds
 // two leaves of 16.  Doubles on AVX-512F.
-VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* x, const int64_t* to,
-                              uint32_t two16, const double* pair4, const double* pair8, int64_t stride8) {
-    const lanes8 scale = _mm512_set1_pd(f);
-    lanes8 s[32];
-    for (int t = 0; t < 32; ++t) s[t] = lanes8(_mm512_loadu_pd(src + r5[t] * row)) * scale;
+// From s, the scaled samples in the order of the points.
+__attribute__((target("avx512f"), always_inline)) inline void leaf_lanes_scaled(const lanes8* s, double* x,
+                                                                                const int64_t* to, uint32_t two16,
+                                                                                const double* pair4,
+                                                                                const double* pair8, int64_t stride8) {
     lanes8 p4[6], p8[18];
     for (int i = 0; i < 6; ++i) p4[i] = _mm512_set1_pd(pair4[i]);
     for (int k = 0; k < 3; ++k)
@@ -365,6 +365,9 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
     lanes8 a[64], b[64];
     leaf_pair<lanes8>(s, a, b, p4, p8, _mm512_set1_pd(fft_sqrt_half<vlx_t>));
     const __mmask8 mask = __mmask8(two16);
+    double* dst[8];
+    for (int i = 0; i < 8; ++i) dst[i] = x + to[i];
+#pragma GCC unroll 7
     for (int q = 0; q < 7; ++q) {
         __m512d rows[8], column[8];
         for (int j = 0; j < 8; ++j)
@@ -372,16 +375,36 @@ VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* 
                       : q == 5 ? b[8 * q + j]
                                : _mm512_mask_blend_pd(mask, a[8 * q + j], b[8 * q + j]);
         fft_simd::transpose8(rows, column);
-        for (int i = 0; i < 8; ++i) _mm512_storeu_pd(x + to[i] + 8 * q, column[i]);
+        for (int i = 0; i < 8; ++i) _mm512_storeu_pd(dst[i] + 8 * q, column[i]);
     }
 }
 
-// The 32 rows of `width` scalars at src, `row` apart, to dst, by the vectors
-// the subtrees load them back with (faster than a copy by bytes here).
-VLX_LEAVES512 void copy_rows(double* dst, int64_t width, const double* src, int64_t row) {
-    for (int64_t r = 0; r < 32; ++r)
-        for (int64_t j = 0; j < width; j += 8) _mm512_store_pd(dst + r * width + j, _mm512_loadu_pd(src + r * row + j));
+VLX_LEAVES512 void leaf_lanes(const double* src, int64_t row, double f, double* x, const int64_t* to,
+                              uint32_t two16, const double* pair4, const double* pair8, int64_t stride8) {
+    const lanes8 scale = _mm512_set1_pd(f);
+    lanes8 s[32];
+#pragma GCC unroll 32
+    for (int t = 0; t < 32; ++t) s[t] = lanes8(_mm512_loadu_pd(src + r5[t] * row)) * scale;
+    leaf_lanes_scaled(s, x, to, two16, pair4, pair8, stride8);
 }
+
+// The same from samples already scaled and ordered, 32 vectors at pre.
+VLX_LEAVES512 void leaf_lanes_pre(const double* pre, double* x, const int64_t* to, uint32_t two16,
+                                  const double* pair4, const double* pair8, int64_t stride8) {
+    leaf_lanes_scaled(reinterpret_cast<const lanes8*>(pre), x, to, two16, pair4, pair8, stride8);
+}
+
+// The samples of a stripe of `groups` groups, scaled, each group's 32
+// vectors in the order of the points: the aside copy, with the loads and the
+// scaling of its subtrees done on the way.
+VLX_LEAVES512 void scale_rows(double* pre, int64_t groups, const double* src, int64_t row, double f) {
+    const lanes8 scale = _mm512_set1_pd(f);
+    for (int64_t j = 0; j < groups; ++j)
+#pragma GCC unroll 32
+        for (int t = 0; t < 32; ++t)
+            _mm512_store_pd(pre + 256 * j + 8 * t, lanes8(_mm512_loadu_pd(src + r5[t] * row + 8 * j)) * scale);
+}
+
 
 // The same for floats on AVX, eight lanes of 32 bits.
 #define VLX_LEAVES256 __attribute__((target("avx")))
@@ -391,6 +414,7 @@ VLX_LEAVES256 void leaf_lanes(const float* src, int64_t row, float f, float* x, 
                               const float* pair4, const float* pair8, int64_t stride8) {
     const lanes8f scale = _mm256_set1_ps(f);
     lanes8f s[32];
+#pragma GCC unroll 32
     for (int t = 0; t < 32; ++t) s[t] = lanes8f(_mm256_loadu_ps(src + r5[t] * row)) * scale;
     lanes8f p4[6], p8[18];
     for (int i = 0; i < 6; ++i) p4[i] = _mm256_set1_ps(pair4[i]);
@@ -423,6 +447,8 @@ VLX_LEAVES256 void leaf_lanes(const float* src, int64_t row, float f, float* x, 
         }
     }
 }
+// The 32 rows of `width` scalars at src, `row` apart, to dst, by the vectors
+// the subtrees load them back with (faster than a copy by bytes here).
 VLX_LEAVES256 void copy_rows(float* dst, int64_t width, const float* src, int64_t row) {
     for (int64_t r = 0; r < 32; ++r)
         for (int64_t j = 0; j < width; j += 8) _mm256_store_ps(dst + r * width + j, _mm256_loadu_ps(src + r * row + j));
@@ -432,7 +458,8 @@ VLX_LEAVES256 void copy_rows(float* dst, int64_t width, const float* src, int64_
 // The subtrees of stripe s, their rows at src, `row` scalars apart.  Group g
 // holds b = 8g + i, whose subtree is c = r3(i) 2^(bits-3) + r(g).
 template <class T>
-void stripe_lanes(const T* src, int64_t row, int64_t s, int64_t width, T* x, int64_t n, const T* tw) {
+void stripe_lanes(const T* src, int64_t row, int64_t s, int64_t width, T* x, int64_t n, const T* tw,
+                  const T* pre = nullptr) {
     static constexpr int64_t r3[8] = {0, 4, 2, 6, 1, 5, 3, 7};
     const int32_t bits = log2_of(int32_t(n / 32));
     const T f = T(1) / static_cast<T>(n);
@@ -449,6 +476,12 @@ void stripe_lanes(const T* src, int64_t row, int64_t s, int64_t width, T* x, int
             const bool start =
                 bits > 3 ? after[starts_after(c, bits - 1, bits - 3, true)] : starts_after(c, 2, 1, true);
             if (start && (c & 1) != 0) two16 |= 1u << i;
+        }
+        if constexpr (std::is_same_v<T, double>) {
+            if (pre != nullptr) {
+                leaf_lanes_pre(pre + 256 * j, x, to, two16, tw + 6 * (n / 16), tw + 6 * (n / 32), n / 32);
+                continue;
+            }
         }
         leaf_lanes(src + 8 * j, row, f, x, to, two16, tw + 6 * (n / 16), tw + 6 * (n / 32), n / 32);
     }
@@ -468,9 +501,15 @@ void real_leaves_lanes(T* x, int64_t n, const T* tw) {
     for (int64_t s = 0; s < stripes; ++s) {
         const int64_t image = reverse_index(s, bits);
         if (image < s) continue;
-        copy_rows(aside, width, x + image * width, row);
-        if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
-        stripe_lanes<T>(aside, width, image, width, x, n, tw);
+        if constexpr (std::is_same_v<T, double>) {
+            scale_rows(aside, width / 8, x + image * width, row, T(1) / static_cast<T>(n));
+            if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
+            stripe_lanes<T>(x, row, image, width, x, n, tw, aside);
+        } else {
+            copy_rows(aside, width, x + image * width, row);
+            if (image != s) stripe_lanes<T>(x + s * width, row, s, width, x, n, tw);
+            stripe_lanes<T>(aside, width, image, width, x, n, tw);
+        }
     }
 }
 #undef VLX_LEAVES512
