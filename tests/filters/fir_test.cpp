@@ -1,4 +1,4 @@
-// FIR engine, symmetric and decimating FIR, hwfilt and resampler, both families.
+// FIR engine, symmetric and decimating FIR, hwfilt and resampler, their vector lanes, both families.
 #include "vlx_test.hpp"
 
 #include <algorithm>
@@ -264,6 +264,63 @@ TYPED_TEST(Filters, ResamplerEdgesAndFailures) {
     __lsan::ScopedDisabler settled_loss;  // a failed run keeps its table: settled behaviour
 #endif
     EXPECT_EQ(t_rsmp2(&in, &made, 3, 0, T(1), nullptr), -1);
+}
+
+// One stream in random blocks of up to 400 points, lanes on then off: the outputs and the final history, joined.
+template <class V, class Run>
+std::vector<real_of<V>> stream(int32_t lanes, const std::vector<real_of<V>>& x, bool xc, uint32_t seed, bool in_place,
+                               Run run) {
+    EXPECT_EQ(vlx_filter_lanes(lanes), lanes);
+    Vec<V> hist;
+    auto got = in_blocks<V>(x, xc, seed, [&](V* in, V* out) { return run(in, out, hist.get()); }, in_place, 400);
+    const auto kept = hist.values();
+    got.insert(got.end(), kept.begin(), kept.end());
+    return got;
+}
+
+// Random ratios both ways, both methods, real and complex, short blocks kept in the history, output counts cut short.
+TYPED_TEST(Filters, LanesResamplerKeepsScalarBits) {
+    using V = TypeParam; using T = real_of<V>;
+    const int32_t widest = vlx_filter_lanes(-1);
+    Vec<V> table;
+    table->points = 13314;  // 13 taps: windows end inside a register
+    ASSERT_EQ(t_table(table.get(), 4), 0);
+    std::mt19937 rng(7);
+    for (int trial = 0; trial < 24; ++trial) {
+        const bool cx = trial % 3 == 2;
+        const int32_t method = cx ? 1 : trial % 2, cap = int32_t(rng() % 50);
+        const T ratio = T(std::uniform_real_distribution<double>(trial % 4 ? 0.3 : 0.999, 2.5)(rng));
+        const auto x = random_values<T>(size_t(3000 * (cx ? 2 : 1)), uint32_t(trial));
+        const auto run = [&](V* in, V* out, V* hist) {
+            out->points = trial % 5 ? 100000 : cap;
+            return t_rsmp(in, out, method, table.get(), ratio, hist);
+        };
+        EXPECT_TRUE(same_scalars(stream<V>(widest, x, cx, uint32_t(trial), false, run),
+                                 stream<V>(0, x, cx, uint32_t(trial), false, run))) << "trial " << trial;
+    }
+    vlx_filter_lanes(widest);
+}
+
+// Every odd/anti pairing, real and complex sources, with and without history, plain and decimating by 1, 2, 3, 7;
+// some blocks shorter than the filter, some in place.
+TYPED_TEST(Filters, LanesSymmetricKernelsKeepScalarBits) {
+    using V = TypeParam; using T = real_of<V>;
+    const int32_t widest = vlx_filter_lanes(-1);
+    for (int32_t m : {1, 2, 12, 20, 31, 60})
+        for (int kind = 0; kind < 8; ++kind)
+            for (int32_t factor : {0, 1, 2, 3, 7}) {
+                const bool odd = kind & 1, anti = kind & 2, xc = kind & 4, keep = (m + factor) % 2;
+                const auto x = random_values<T>(size_t(1500 * (xc ? 2 : 1)), uint32_t(m * 8 + kind));
+                Vec<V> filter(random_values<T>(size_t(m), uint32_t(m)), false);
+                const auto run = [&](V* in, V* out, V* hist) {
+                    V* past = keep ? hist : nullptr;
+                    return factor ? t_sfir_deci(in, out, &filter, odd, anti, factor, past) : t_sfir(in, out, &filter, odd, anti, past);
+                };
+                EXPECT_TRUE(same_scalars(stream<V>(widest, x, xc, uint32_t(kind + factor), true, run),
+                                         stream<V>(0, x, xc, uint32_t(kind + factor), true, run)))
+                    << "m " << m << " kind " << kind << " factor " << factor;
+            }
+    vlx_filter_lanes(widest);
 }
 
 }  // namespace
