@@ -1,6 +1,5 @@
-// The signal sources: lines, tones and complex exponentials against long double with the rotation's exact restarts;
-// noise (the order of the masked rand() draws, moments of a million samples, uniform permutations); the resampling
-// tables (the kernels' shape, both expansion rules against long double, degenerate inputs).
+// The signal sources: lines, tones and exponentials with their exact restarts; noise draws, moments and shuffles; the
+// resampling tables.
 #include "vlx_test.hpp"
 
 using namespace vlxtest;

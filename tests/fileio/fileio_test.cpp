@@ -1,6 +1,5 @@
-// The sample files: the reader's text tokens, keys and line handling from a table, hand-made binary files in every
-// form and byte order, hostile headers; the writers byte for byte, round trips through the reader in both families,
-// the gnuplot script through gnuplot, and text under a decimal-comma locale.
+// The sample files: text and binary reading, hostile headers; the writers byte for byte, round trips, gnuplot, and text
+// under a decimal-comma locale.
 #include "vlx_test.hpp"
 
 #include <climits>

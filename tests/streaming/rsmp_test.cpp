@@ -10,39 +10,35 @@ namespace {
 VLX_TWIN(c, cos) VLX_TWIN(c, rand) VLX_TWIN(i, scale) VLX_TWIN(b, add) VLX_TWIN(h, fft) VLX_TWIN(h, avg)
 VLX_TWIN(s, peak) VLX_TWIN(i, window_gauss)
 
-template <class V>
-struct Rsmp;
-#define VLX_RSMP_API(P, V)                                                                                     \
-    template <>                                                                                                \
-    struct Rsmp<V> {                                                                                           \
-        using Coef = P##_rsmp_coef_t;                                                                          \
-        using State = P##_rsmp_state_t;                                                                        \
-        static constexpr auto coef_init = P##_rsmp_coef_init, coef_alloc = P##_rsmp_coef_alloc,                \
-                              coef_setup = P##_rsmp_coef_setup, coef_destroy = P##_rsmp_coef_destroy,          \
-                              state_init = P##_rsmp_state_init, state_reset = P##_rsmp_state_reset,            \
-                              state_destroy = P##_rsmp_state_destroy, run = P##_rsmp, in_pts = P##_rsmp_get_in_pts, \
-                              out_pts = P##_rsmp_get_out_pts, delay = P##_rsmp_get_delay_pts,                  \
-                              settle = P##_rsmp_get_settle_pts;                                                \
-    };
-VLX_RSMP_API(vlxh, vlx_t)
-VLX_RSMP_API(vlxfh, vlxf_t)
-#undef VLX_RSMP_API
+VLX_TWIN(h, rsmp)
+// The resampler's set-up calls, each family's told apart by the coefficient or state type it takes.
+#define VLX_RSMP_TWIN(name)                                                                                         \
+    template <class... A> auto t_##name(A... a) -> decltype(vlxh_##name(a...)) { return vlxh_##name(a...); }       \
+    template <class... A> auto t_##name(A... a) -> decltype(vlxfh_##name(a...)) { return vlxfh_##name(a...); }
+VLX_RSMP_TWIN(rsmp_coef_init) VLX_RSMP_TWIN(rsmp_coef_alloc) VLX_RSMP_TWIN(rsmp_coef_setup) VLX_RSMP_TWIN(rsmp_coef_destroy)
+VLX_RSMP_TWIN(rsmp_state_init) VLX_RSMP_TWIN(rsmp_state_reset) VLX_RSMP_TWIN(rsmp_state_destroy)
+VLX_RSMP_TWIN(rsmp_get_in_pts) VLX_RSMP_TWIN(rsmp_get_out_pts) VLX_RSMP_TWIN(rsmp_get_delay_pts)
+VLX_RSMP_TWIN(rsmp_get_settle_pts)
+#undef VLX_RSMP_TWIN
+template <class V> using Coef = std::conditional_t<is_double<V>, vlxh_rsmp_coef_t, vlxfh_rsmp_coef_t>;
+template <class V> using State = std::conditional_t<is_double<V>, vlxh_rsmp_state_t, vlxfh_rsmp_state_t>;
 
 // A coefficient object set up for a ratio and one stream's state, armed (start-up discards on).
-template <class V, class R = Rsmp<V>>
+template <class V>
 struct Stream {
-    typename R::Coef coef;
-    typename R::State state;
+    Coef<V> coef;
+    State<V> state;
     Stream(double ratio, int32_t forced) {
-        R::coef_init(&coef), R::state_init(&state);
-        EXPECT_EQ(R::coef_alloc(&coef, 0) | R::coef_setup(&coef, real_of<V>(ratio), forced, 0) | R::state_reset(&coef, &state), 0);
+        t_rsmp_coef_init(&coef), t_rsmp_state_init(&state);
+        EXPECT_EQ(t_rsmp_coef_alloc(&coef, 0) | t_rsmp_coef_setup(&coef, real_of<V>(ratio), forced, 0) |
+                      t_rsmp_state_reset(&coef, &state), 0);
     }
-    ~Stream() { R::state_destroy(&state), R::coef_destroy(&coef); }
+    ~Stream() { t_rsmp_state_destroy(&state), t_rsmp_coef_destroy(&coef); }
     int32_t out_pts(int32_t n, int32_t settled, int32_t at_least) {
         int32_t r = -1;
-        return R::out_pts(&r, &coef, n, settled, at_least) == 0 ? r : -1;
+        return t_rsmp_get_out_pts(&r, &coef, n, settled, at_least) == 0 ? r : -1;
     }
-    int32_t run(V* in, V* out, V* work, bool keep = true) { return R::run(in, out, work, &coef, keep ? &state : nullptr); }
+    int32_t run(V* in, V* out, V* work, bool keep = true) { return t_rsmp(in, out, work, &coef, keep ? &state : nullptr); }
 };
 
 VLX_TYPED_SUITE(StreamingResampler);
@@ -51,7 +47,6 @@ VLX_TYPED_SUITE(StreamingResampler);
 // reloading its filter as r crosses 1.5625.
 TYPED_TEST(StreamingResampler, SetupAndArithmetic) {
     using V = TypeParam; using T = real_of<V>;
-    using R = Rsmp<V>;
     // figures: delay in input and output points, start-up; -1: not checked
     const struct { T ratio; int32_t forced, k; T r; int32_t half, skip_mid, skip_out; T figures[3]; } cases[] = {
         {T(4), 0, 2, T(1), 20, 33, 0, {T(57), T(14.25), T(132)}},
@@ -67,33 +62,32 @@ TYPED_TEST(StreamingResampler, SetupAndArithmetic) {
     Stream<V> s(1, 0);
     T got[3];
     for (const auto& c : cases) {
-        ASSERT_EQ(R::coef_setup(&s.coef, c.ratio, c.forced, 0), 0);
+        ASSERT_EQ(t_rsmp_coef_setup(&s.coef, c.ratio, c.forced, 0), 0);
         const auto& o = s.coef;
         EXPECT_TRUE(o.octaves == c.k && o.ratio == c.r && o.half_filter.points == c.half && o.skip_mid == c.skip_mid &&
                     o.skip_out == c.skip_out) << c.ratio;
-        R::delay(&got[0], &s.coef, 0), R::delay(&got[1], &s.coef, 1), R::settle(&got[2], &s.coef, 0);
+        t_rsmp_get_delay_pts(&got[0], &s.coef, 0), t_rsmp_get_delay_pts(&got[1], &s.coef, 1), t_rsmp_get_settle_pts(&got[2], &s.coef, 0);
         for (int i = 0; i < 3; ++i) EXPECT_TRUE(c.figures[i] < 0 || got[i] == c.figures[i]) << c.ratio << " figure " << i;
-        EXPECT_TRUE(R::coef_setup(&s.coef, T(8), 0, 1) == -1 && s.coef.octaves == c.k);  // reserved: nothing stored
+        EXPECT_TRUE(t_rsmp_coef_setup(&s.coef, T(8), 0, 1) == -1 && s.coef.octaves == c.k);  // reserved: nothing stored
     }
-    typename R::Coef fresh;  // never set up: r 0, total = s, resampling formula
-    R::coef_init(&fresh), R::delay(&got[0], &fresh, 1);
+    Coef<V> fresh;  // never set up: r 0, total = s, resampling formula
+    t_rsmp_coef_init(&fresh), t_rsmp_get_delay_pts(&got[0], &fresh, 1);
     EXPECT_EQ(got[0], T(17.5));
 }
 
 // Inputs asked for by get_in_pts give what get_out_pts promises; the edges.
 TYPED_TEST(StreamingResampler, PointCountsAgree) {
-    using R = Rsmp<TypeParam>;
     for (double ratio : {0.1, 0.97, 1.0, 1.25, 1.9999, 2.0, 3.0, 4.0, 6.3, 1000.0}) {
         Stream<TypeParam> s(ratio, 0);
         for (int32_t settled : {0, 1})
             for (int32_t want : {0, 1, 2, 7, 100, 4096, 100000}) {
                 int32_t in = -1;
-                ASSERT_EQ(R::in_pts(&in, &s.coef, want, settled), 0);
+                ASSERT_EQ(t_rsmp_get_in_pts(&in, &s.coef, want, settled), 0);
                 EXPECT_GE(s.out_pts(in, settled, 1), want) << "ratio " << ratio << " settled " << settled;
                 EXPECT_TRUE(s.out_pts(in, 0, 0) >= s.out_pts(in, 0, 1) && (want != 0 || !settled || in == 0)) << ratio;
             }
         int32_t n = 5;  // ratio 1 is a copy
-        EXPECT_TRUE(R::in_pts(nullptr, &s.coef, 10, 0) == 0 && R::in_pts(&n, nullptr, 10, 0) == -1 && n == 5 &&
+        EXPECT_TRUE(t_rsmp_get_in_pts(nullptr, &s.coef, 10, 0) == 0 && t_rsmp_get_in_pts(&n, decltype(&s.coef){}, 10, 0) == -1 && n == 5 &&
                     (ratio != 1.0 || (s.out_pts(-7, 1, 0) == 0 && s.out_pts(13, 1, 0) == 13)));
     }
 }

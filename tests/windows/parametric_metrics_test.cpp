@@ -1,6 +1,4 @@
-// Parametric windows against closed forms in long double, their symmetric and width geometry, the direct operations'
-// frame and the FIR prototypes; the metrics' fixed values, and the bandwidth table against widths measured numerically
-// on long windows of the catalogue's shapes.
+// Parametric windows against closed forms, the direct operations and FIR prototypes; metrics, fixed and measured.
 #include "window_support.hpp"
 
 #include <complex>
@@ -14,10 +12,7 @@ namespace {
 
 long double bessel_i0(long double x) {
     long double term = 1, sum = 1;
-    for (int k = 1; k < 200 && term > 1e-30L * sum; ++k) {
-        term *= (x / (2 * k)) * (x / (2 * k));
-        sum += term;
-    }
+    for (int k = 1; k < 200 && term > 1e-30L * sum; ++k) sum += term *= (x / (2 * k)) * (x / (2 * k));
     return sum;
 }
 
@@ -55,10 +50,9 @@ TYPED_TEST(Parametric, ClosedForms) {
                 const long double u = std::max(0.0L, 1 - 4 * d * d / (len * len));
                 ASSERT_TRUE(near(kaiser[i], bessel_i0(beta * std::sqrt(u)) / bessel_i0(beta), tol)) << n << sym << i;
                 ASSERT_TRUE(near(gauss[i], std::exp(-0.5L * std::pow(dp / (n * sigma), 2)), tol)) << n << sym << i;
-                const long double flat = 0.75L * n * 0.5L;
+                const long double flat = 0.75L * n * 0.5L, a = M_PIl * 2 * dp / n;
                 const long double g = dp <= flat ? 1 : 0.5L * (1 + std::cos(2 * M_PIl * (dp - flat) / (0.25L * n)));
                 ASSERT_TRUE(near(tukey[i], g, tol)) << n << sym << i;
-                const long double a = M_PIl * 2 * dp / n;
                 ASSERT_TRUE(near(sinc[i], a == 0 ? 1 : std::sin(a) / a, tol)) << n << sym << i;
             }
         }
