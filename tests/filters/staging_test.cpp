@@ -10,12 +10,6 @@ namespace {
 VLX_TEST_TWIN(t_deci, vlxd_deci, vlxfd_deci) VLX_TEST_TWIN(t_stage, vlx_stage_io, vlxf_stage_io)
 VLX_TEST_TWIN(t_unstage, vlx_unstage_io, vlxf_unstage_io)
 
-template <class V>
-int32_t stage(V* in, V** out, V* other, V** hist, int32_t hist_points, int32_t flags, int32_t* aliased = nullptr,
-              V* tmp = nullptr, V** saved = nullptr) {
-    return t_stage(in, out, other, hist, hist_points, flags, aliased, tmp, saved);
-}
-
 VLX_TYPED_SUITE(Staging);
 
 // Blocks fed one after another give one long call's samples exactly, whatever the split: every factor-th sample.
@@ -74,19 +68,19 @@ TYPED_TEST(Staging, HistoryAndAliasedDestination) {
     Vec<V> in({1, 2, 3, 4}, true), out, hist({9, 8, 7, 6, 5}), a, b;
     in->delta = T(0.25);
     V *hp = hist.get(), *op = out.get(), tmp, *saved = nullptr;
-    ASSERT_EQ(stage<V>(in.get(), &op, nullptr, &hp, 3, 0), 0);
+    ASSERT_EQ(t_stage(in.get(), &op, nullptr, &hp, 3, 0, nullptr, nullptr, nullptr), 0);
     EXPECT_TRUE(has_shape(hist.get(), 5, 1, 0.25) && hist[2] == T(8) && hist[3] == T(0) && has_shape(out.get(), 2, 1, 0.25));
     Vec<V> v({1, 2, 3});
     v->points = 2, op = v.get();
     int32_t aliased = -7;
-    ASSERT_TRUE(stage<V>(v.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS | VLX_STAGE_KEEP_POINTS, &aliased, &tmp, &saved) == 0 &&
+    ASSERT_TRUE(t_stage(v.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS | VLX_STAGE_KEEP_POINTS, &aliased, &tmp, &saved) == 0 &&
                 aliased == 1 && saved == v.get() && op == &tmp && tmp.points == 2);
     for (int32_t i = 0; i < 2; ++i) tmp.data[i] = v[i] * T(10);  // the kernel reads the source
     ASSERT_EQ(t_unstage(op, aliased, saved), 0);
     EXPECT_TRUE(tmp.data == nullptr && v->points == 2 && v[0] == T(10) && v[1] == T(20));
     op = b.get();
-    ASSERT_EQ(stage<V>(a.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS), -1);
-    ASSERT_EQ(stage<V>(a.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS, &aliased, &tmp, &saved), 0);
+    ASSERT_EQ(t_stage(a.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS, nullptr, nullptr, nullptr), -1);
+    ASSERT_EQ(t_stage(a.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS, &aliased, &tmp, &saved), 0);
     EXPECT_TRUE(aliased == 1 && t_unstage(op, 1, static_cast<V*>(nullptr)) == -1 && t_unstage(op, 1, saved) == 0);
     EXPECT_EQ(t_unstage(a.get(), 0, static_cast<V*>(nullptr)), 0);
 }

@@ -66,7 +66,8 @@ TYPED_TEST(StreamingResampler, SetupAndArithmetic) {
         const auto& o = s.coef;
         EXPECT_TRUE(o.octaves == c.k && o.ratio == c.r && o.half_filter.points == c.half && o.skip_mid == c.skip_mid &&
                     o.skip_out == c.skip_out) << c.ratio;
-        t_rsmp_get_delay_pts(&got[0], &s.coef, 0), t_rsmp_get_delay_pts(&got[1], &s.coef, 1), t_rsmp_get_settle_pts(&got[2], &s.coef, 0);
+        t_rsmp_get_delay_pts(&got[0], &s.coef, 0), t_rsmp_get_delay_pts(&got[1], &s.coef, 1);
+        t_rsmp_get_settle_pts(&got[2], &s.coef, 0);
         for (int i = 0; i < 3; ++i) EXPECT_TRUE(c.figures[i] < 0 || got[i] == c.figures[i]) << c.ratio << " figure " << i;
         EXPECT_TRUE(t_rsmp_coef_setup(&s.coef, T(8), 0, 1) == -1 && s.coef.octaves == c.k);  // reserved: nothing stored
     }
@@ -87,7 +88,8 @@ TYPED_TEST(StreamingResampler, PointCountsAgree) {
                 EXPECT_TRUE(s.out_pts(in, 0, 0) >= s.out_pts(in, 0, 1) && (want != 0 || !settled || in == 0)) << ratio;
             }
         int32_t n = 5;  // ratio 1 is a copy
-        EXPECT_TRUE(t_rsmp_get_in_pts(nullptr, &s.coef, 10, 0) == 0 && t_rsmp_get_in_pts(&n, decltype(&s.coef){}, 10, 0) == -1 && n == 5 &&
+        EXPECT_TRUE(t_rsmp_get_in_pts(nullptr, &s.coef, 10, 0) == 0 &&
+                    t_rsmp_get_in_pts(&n, decltype(&s.coef){}, 10, 0) == -1 && n == 5 &&
                     (ratio != 1.0 || (s.out_pts(-7, 1, 0) == 0 && s.out_pts(13, 1, 0) == 13)));
     }
 }
