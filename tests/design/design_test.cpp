@@ -66,8 +66,7 @@ TYPED_TEST(Generators, LineToneAndExponentialFollowTheirReferences) {
         ASSERT_TRUE(near(re[k], cosl(angle), tol) && same_bits(cx[2 * k], re[k]) && cx[2 * k + 1] == T(0)) << k;
         ASSERT_TRUE(near(ex[2 * k], cosl(angle), tol) && near(ex[2 * k + 1], sinl(angle), tol)) << k;
     }
-    // Sample 256 restarts at the exact angle, whatever the rotation gathered: the float tone in single precision
-    // reduced in double, the float exponential wholly in double.
+    // Sample 256 restarts at the exact angle: the float tone in single precision reduced in double, its exponential in double.
     const T w = delta * T(2) * static_cast<T>(3.141592653589793) * freq, angle = T(256) * w + phase;
     if constexpr (is_double<TypeParam>)
         EXPECT_TRUE(same_bits(re[256], std::cos(angle)) && same_bits(ex[513], std::sin(angle)));

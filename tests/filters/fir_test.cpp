@@ -275,8 +275,7 @@ TYPED_TEST(Filters, LanesResamplerKeepsScalarBits) {
     vlx_filter_lanes(widest);
 }
 
-// Every odd/anti pairing, real and complex sources, with and without history, plain and decimating by 1, 2, 3, 7;
-// some blocks shorter than the filter, some in place.
+// Every odd/anti pairing, real and complex, with and without history, plain and decimating, some blocks short.
 TYPED_TEST(Filters, LanesSymmetricKernelsKeepScalarBits) {
     using V = TypeParam; using T = real_of<V>;
     const int32_t widest = vlx_filter_lanes(-1);
@@ -348,8 +347,7 @@ TYPED_TEST(Staging, DecimationSkipCount) {
     EXPECT_TRUE(t_deci(in.get(), dst.get(), 1, static_cast<V*>(nullptr)) == -1 && dst->points == 0);
 }
 
-// The history takes the source's type and keeps its surplus; a destination sharing the source's storage (two empty
-// vectors included) is filled through a temporary that unstaging delivers, and without one the call fails.
+// The history takes the source's type and keeps its surplus; an aliased destination goes through the temporary.
 TYPED_TEST(Staging, HistoryAndAliasedDestination) {
     using V = TypeParam; using T = real_of<V>;
     Vec<V> in({1, 2, 3, 4}, true), out, hist({9, 8, 7, 6, 5}), a, b;

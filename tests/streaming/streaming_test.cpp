@@ -168,8 +168,7 @@ struct Stream {
 
 VLX_TYPED_SUITE(StreamingResampler);
 
-// Ratio split, filter (half lengths 20, 38, 61), discards, delay and start-up; one object through every set-up,
-// reloading its filter as r crosses 1.5625.
+// Ratio split, filter, discards, delay and start-up; one object reloads its filter through every set-up.
 TYPED_TEST(StreamingResampler, SetupAndArithmetic) {
     using V = TypeParam; using T = real_of<V>;
     // figures: delay in input and output points, start-up; -1: not checked
@@ -219,8 +218,7 @@ TYPED_TEST(StreamingResampler, PointCountsAgree) {
     }
 }
 
-// Blocks of random sizes, each limited to the most it can give, continue one stream: one call's points, up to the
-// rounding that block boundaries change; after the start-up each block gives at least the certain count.
+// Blocks of random sizes continue one call's stream to rounding, each between the certain count and the most.
 TYPED_TEST(StreamingResampler, BlocksContinueOneStream) {
     using V = TypeParam; using T = real_of<V>;
     const int32_t total = 3000;
@@ -262,8 +260,7 @@ double gain(const V* taps, double f, bool half, int64_t from = 0, double step = 
     return std::abs(z) / step;
 }
 
-// The road of one measurement: a tone with noise from the generators, streamed through the resampler in blocks, turned
-// into spectra, averaged over sweeps and read by the peak search.
+// One measurement's road: a noisy tone resampled in blocks, into spectra, averaged over sweeps, peak read.
 TYPED_TEST(StreamingResampler, MeasurementRoad) {
     using V = TypeParam; using T = real_of<V>;
     const double rate_in = 48000, rate_out = 44100, tone = 1000, amplitude = 0.5;
