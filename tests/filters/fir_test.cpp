@@ -327,12 +327,9 @@ TYPED_TEST(Staging, BlockFedDecimationEqualsOneCall) {
 TYPED_TEST(Staging, DecimationSkipCount) {
     using V = TypeParam; using T = real_of<V>;
     struct Case { T stored; int32_t n, factor, points; T first, next; };
-    const Case cases[] = {
-        {7, 5, 3, 0, -1, 2},  // the whole block is still to be dropped
-        {0, 10, 4, 3, 0, 2}, {0, 0, 4, 0, -1, 0},
-        {-3, 4, 2, 2, 0, 0},  // a negative count is 0
-        {1.4f, 6, 2, 3, 1, 1}, {1.5f, 6, 2, 2, 2, 0},  // counts round to nearest
-    };
+    const Case cases[] = {  // the whole block still to be dropped; a negative count is 0; counts round to nearest
+        {7, 5, 3, 0, -1, 2}, {0, 10, 4, 3, 0, 2}, {0, 0, 4, 0, -1, 0}, {-3, 4, 2, 2, 0, 0}, {1.4f, 6, 2, 3, 1, 1},
+        {1.5f, 6, 2, 2, 2, 0}};
     for (const Case& c : cases) {
         std::vector<T> x(size_t(c.n));
         for (int32_t i = 0; i < c.n; ++i) x[size_t(i)] = T(i);
