@@ -114,13 +114,12 @@ TYPED_TEST(Synthesis, ShapesMatchClosedForms) {
         for (size_t k = 0; k < c.size(); ++k) s += c[k] * std::cos(2 * M_PIl * k * x);
         return s;
     };
-    for (const auto& f : forms) {
+    for (const auto& f : forms)
         for (int32_t n : {1, 2, 3, 4, 7, 8, 64, 1025, 3001}) {
             const std::vector<T> w = synth<TypeParam>(f.id, VLX_WNORM_PEAK, n);
             for (int32_t i = 0; i < n; ++i)
                 ASSERT_TRUE(near(w[i], form(f.id, f.c, static_cast<long double>(i - n / 2) / n), tol)) << f.id << " " << n << " " << i;
         }
-    }
     for (int32_t id : {0, 1, 25}) {  // no symmetric form of these
         int32_t st = 0;
         synth<TypeParam>(id, VLX_WNORM_PEAK | VLX_WFLAG_SYMMETRIC, 8, 0.0, &st);
@@ -131,7 +130,7 @@ TYPED_TEST(Synthesis, ShapesMatchClosedForms) {
 // Angles by repeated addition, re-seeded every 1024 samples; the float step is 2 pi (single) over n divided in double.
 TYPED_TEST(Synthesis, CosineSumBitsFollowRecurrence) {
     using T = real_of<TypeParam>;
-    for (int32_t count : {2, 5, 7}) {
+    for (int32_t count : {2, 5, 7})
         for (int32_t n : {6, 2050, 3073}) {
             const std::vector<T> c = random_values<T>(count, 17u * n + count);
             const T step = is_double<TypeParam> ? T(6.283185307179586 / n) : T(6.2831854820251465 / n);
@@ -152,7 +151,6 @@ TYPED_TEST(Synthesis, CosineSumBitsFollowRecurrence) {
             ASSERT_EQ(t_cos_sum(w.get(), coefs.get(), 0, T(0)), 0);
             EXPECT_TRUE(same_scalars(w.values(), want)) << count << " " << n;
         }
-    }
     for (int32_t n : {2050, 3073}) {  // the triangle: repeated subtraction, re-seeded every 1024 samples
         const std::vector<T> w = synth<TypeParam>(1, VLX_WNORM_PEAK, n);
         const T d = T(2) / T(n);
@@ -168,7 +166,7 @@ TYPED_TEST(Synthesis, EveryIdNormalises) {
     const long double tol = is_double<TypeParam> ? 1e-12L : 2e-5L;
     for (int32_t id = 0; id < 32; ++id) {
         const long double c0 = static_cast<T>(c0_of(id));
-        for (int32_t n : {1, 2, 3, 5, 8, 33, 1000}) {
+        for (int32_t n : {1, 2, 3, 5, 8, 33, 1000})
             for (int32_t extra : {0, VLX_WFLAG_WIDTH}) {
                 const double width = extra ? 0.6 * n + 0.3 : 0.0;
                 int32_t st = 0;
@@ -183,7 +181,6 @@ TYPED_TEST(Synthesis, EveryIdNormalises) {
                             near(s0 * mean_of(peak) / mean_of(mean), 1.0L, tol) && near(s1 * rms_of(peak) / rms_of(rms), 1.0L, tol))
                     << id << " " << n << " " << extra;
             }
-        }
     }
 }
 
@@ -223,14 +220,13 @@ TYPED_TEST(Synthesis, WorkedExamples) {
 TYPED_TEST(Synthesis, UserCoefficientsAndAllocationFailure) {
     using T = real_of<TypeParam>;
     Vec<TypeParam> coefs({0.5, 0.5});  // the one-pass multiply-and-rotate of even lengths keeps the bits
-    for (int32_t n : {7, 8, 10}) {
+    for (int32_t n : {7, 8, 10})
         for (bool cx : {false, true}) {
             const std::vector<T> x = random_values<T>((cx ? 2 : 1) * n, 9u + n);
             Vec<TypeParam> user(x, cx), hann(x, cx);
             ASSERT_EQ(t_window_cos(user.get(), coefs.get()) + t_window(hann.get(), 2, VLX_WNORM_PEAK), 0);
             EXPECT_TRUE(same_scalars(user.values(), hann.values())) << n << cx;
         }
-    }
     Vec<TypeParam> w(std::vector<T>(8, T(2)), false), empty, cplx({1, 0}, true);
     EXPECT_TRUE(t_window_cos(empty.get(), cplx.get()) == -1 && t_cos_sum(w.get(), coefs.get(), VLX_WFLAG_SYMMETRIC, T(0)) == -1);
     // allocation failure leaves the vector alone
@@ -267,7 +263,7 @@ TYPED_TEST(Synthesis, CacheReuseAndStrictRotation) {
 TYPED_TEST(Parametric, ClosedForms) {
     using T = real_of<TypeParam>;
     const long double tol = is_double<TypeParam> ? 2e-13L : 2e-5L;
-    for (int32_t n : {2, 3, 4, 5, 16, 101, 1000}) {
+    for (int32_t n : {2, 3, 4, 5, 16, 101, 1000})
         for (bool sym : {false, true}) {
             const int32_t flags = VLX_WNORM_PEAK | (sym ? VLX_WFLAG_SYMMETRIC : 0);
             const long double len = sym ? n - 1 : n;
@@ -288,7 +284,6 @@ TYPED_TEST(Parametric, ClosedForms) {
                 ASSERT_TRUE(near(sinc[i], a == 0 ? 1 : std::sin(a) / a, tol)) << n << sym << i;
             }
         }
-    }
 }
 
 TYPED_TEST(Parametric, WorkedExamples) {
@@ -337,7 +332,7 @@ TYPED_TEST(Parametric, DirectFrameAndPrototypes) {
     ASSERT_EQ(t_window_kaiser(direct.get(), static_cast<T>(9.473960131326246), VLX_WNORM_RMS) + t_window(cached.get(), 14, VLX_WNORM_RMS), 0);
     EXPECT_TRUE(same_scalars(direct.values(), cached.values()) && has_shape(direct.get(), 37, 1, 0.5));
 
-    for (int32_t n : {31, 32}) {
+    for (int32_t n : {31, 32})
         for (const auto& [id, param] : std::vector<std::pair<int32_t, double>>{{100, 0.1}, {101, 0.05}, {102, 0.1}, {103, 0.1}, {103, 0.0}, {14, 0}, {31, 0}}) {
             Vec<TypeParam> v(std::vector<T>(n, T(1)), false);
             ASSERT_EQ(t_window_fir(v.get(), id, static_cast<T>(param)), 0) << id;
@@ -345,7 +340,6 @@ TYPED_TEST(Parametric, DirectFrameAndPrototypes) {
             // no centre sample for an even n: the middle pair stands at 0.5
             EXPECT_TRUE((n % 2 == 0 || v[n / 2] == T(1)) && ((param == 0 && id >= 100) || v[0] < T(0.9))) << id;
         }
-    }
     Vec<TypeParam> v(x, false);
     EXPECT_EQ(t_window_fir(v.get(), 2, T(0)), -1);  // cosine sums reject the symmetric flag
     // id 0, bandwidth 0, and A = 7.95 < 21 (beta 0, ones) change nothing
