@@ -1,6 +1,4 @@
-// The sample files: the reader's text tokens, keys and line handling from a table, hand-made binary files in every
-// form and byte order, hostile headers; the writers byte for byte, round trips through the reader in both families,
-// the gnuplot script through gnuplot, and text under a decimal-comma locale.
+// The sample files: reading, hostile headers, the writers byte for byte, round trips, gnuplot, a decimal comma.
 #include "vlx_test.hpp"
 
 #include <climits>
@@ -88,8 +86,7 @@ std::string binary_file(int form, bool swap, uint32_t width, int32_t points, int
     return out;
 }
 
-// The value read is the value written in the reader's type: converted for binary files, for text the value of the
-// printed digits (16, or 7 for float vectors) parsed independently.  Bit for bit, signs of zero and NaN included.
+// Bit for bit (signs of zero and NaN too): the value converted for binary files, its printed digits parsed for text.
 template <class R, class W>
 void expect_same(const std::vector<R>& got, const std::vector<W>& written, bool text) {
     std::vector<R> want;
@@ -274,8 +271,7 @@ TYPED_TEST(Writers, GnuplotDrawsTheScript) {
     }
 }
 
-// Numbers are written and read in the C locale whatever the thread's or the process's locale, with threads at work at
-// once, and the caller's locale is left as it was.
+// Numbers stay in the C locale under a thread's or the process's decimal comma, threads at once; the locale stays.
 TYPED_TEST(Writers, TextIsTheSameUnderADecimalComma) {
     locale_t german = newlocale(LC_ALL_MASK, "de_DE.UTF-8", static_cast<locale_t>(nullptr));
     if (german == static_cast<locale_t>(nullptr)) GTEST_SKIP() << "de_DE.UTF-8 is not available";

@@ -1,7 +1,9 @@
-// FIR engine, symmetric and decimating FIR, hwfilt and resampler, both families.
+// FIR engine, symmetric and decimating FIR, hwfilt and resampler, their vector lanes; filter staging, the decimator
+// and the tolerant point counts. Both families.
 #include "vlx_test.hpp"
 
 #include <algorithm>
+#include <climits>
 #include <complex>
 
 #if defined(__SANITIZE_ADDRESS__)
@@ -14,7 +16,8 @@ namespace {
 
 VLX_TWIN(d, fir) VLX_TWIN(d, sfir) VLX_TWIN(d, sfir_deci) VLX_TWIN(d, deci) VLX_TWIN(d, hwfilt) VLX_TWIN(d, rsmp)
 VLX_TWIN(d, rsmp2) VLX_TEST_TWIN(t_hwfilt_in_place, vlxi_hwfilt, vlxfi_hwfilt)
-VLX_TEST_TWIN(t_table, vlxc_rsmp, vlxfc_rsmp)
+VLX_TEST_TWIN(t_table, vlxc_rsmp, vlxfc_rsmp) VLX_TEST_TWIN(t_stage, vlx_stage_io, vlxf_stage_io)
+VLX_TEST_TWIN(t_unstage, vlx_unstage_io, vlxf_unstage_io)
 
 VLX_TYPED_SUITE(Filters);
 
@@ -135,23 +138,15 @@ TYPED_TEST(Filters, SymmetricStreamsMatchExpandedFilter) {
         }
 }
 
-// Empty filters copy; failing storage gives -1 and releases lock 1.
-TYPED_TEST(Filters, FirEdgesAndFailures) {
+// Empty filters copy; a decimating one keeps every factor-th sample and its surplus history point.
+TYPED_TEST(Filters, EmptyFilters) {
     using V = TypeParam; using T = real_of<V>;
-    vlx_lib_init();
     const auto x = random_values<T>(100, 40);
     Vec<V> in(x, false), empty, out, hist({T(5), T(6)});
     in->delta = T(0.5);
     EXPECT_TRUE(t_fir(&in, &out, &empty, hist.get()) == 0 && same_scalars(out.values(), x) && has_shape(out.get(), 100, 0, 0.5));
     EXPECT_TRUE(t_sfir_deci(&in, &out, &empty, 1, 0, 4, hist.get()) == 0 && has_shape(out.get(), 24, 0, 2.0) && out[0] == x[5]);
     EXPECT_EQ(hist.values(), (std::vector<T>{1, 6}));  // the surplus point stays
-    for (int path = 0; path < 3; ++path) {
-        Vec<V> src(x, false), filter(random_values<T>(path == 2 ? 64 : 20, 41), false), result(x, false);
-        FailingAlloc<V> failing;  // aliasing needs a temporary, the fast path a workspace
-        EXPECT_EQ(path == 1 ? t_sfir(&src, &src, &filter, 1, 0, nullptr) : t_fir(&src, path ? &result : &src, &filter, nullptr), -1);
-    }
-    Vec<V> filter(random_values<T>(64, 42), false);
-    EXPECT_TRUE(t_fir(&in, &in, &filter, nullptr) == 0 && t_free_internal<V>() == 0);
 }
 
 // Impulse from silence against H(z); blocks give one call bit for bit; complex is two real streams; id 1 is refused.
@@ -169,18 +164,15 @@ TYPED_TEST(Filters, Hwfilt) {
                   is_double<V> ? 1e-12 : 1e-6) << f;
     }
     const auto x = random_values<T>(1000, 5);
-    Vec<V> whole(x, false), cx(x, true), hist, stream_hist, sep[2];
+    Vec<V> whole(x, false), hist, stream_hist;
     ASSERT_EQ(t_hwfilt(&whole, &whole, 0, hist.get()), 0);
     EXPECT_EQ(in_blocks<V>(x, false, 6, [&](V* in, V* out) { return t_hwfilt(in, out, 0, stream_hist.get()); }), whole.values());
     EXPECT_EQ(stream_hist.values(), hist.values());
+    std::vector<T> pairs;  // the imaginary part negated: its own stream gives the negated bits
+    for (T v : x) pairs.push_back(v), pairs.push_back(-v);
+    Vec<V> cx(pairs, true);
     ASSERT_EQ(t_hwfilt_in_place(&cx, 0), 0);
-    for (int c = 0; c < 2; ++c) {
-        std::vector<T> part;
-        for (size_t i = size_t(c); i < x.size(); i += 2) part.push_back(x[i]);
-        sep[c].assign(part, false);
-        ASSERT_EQ(t_hwfilt_in_place(&sep[c], 0), 0);
-        for (int i = 0; i < 500; ++i) ASSERT_EQ(cx[2 * i + c], sep[c][i]);
-    }
+    for (int i = 0; i < 1000; ++i) ASSERT_TRUE(cx[2 * i] == whole[i] && cx[2 * i + 1] == -whole[i]) << i;
     Vec<V> in({1, 2, 3}), out({7}), long_hist(random_values<T>(14, 7), false);
     const auto before = long_hist.values();
     EXPECT_TRUE(t_hwfilt(&in, &out, 1, long_hist.get()) == -1 && out.values() == std::vector<T>{7} && long_hist.values() == before);
@@ -188,9 +180,8 @@ TYPED_TEST(Filters, Hwfilt) {
     EXPECT_TRUE(long_hist[12] == before[12] && long_hist[13] == before[13]);
 }
 
-// A slow sine comes out at the output times, delayed by 6.5 and scaled by the kernel's gain; blocks on one history
-// continue one stream.
-TYPED_TEST(Filters, ResamplerSineAndStreams) {
+// A slow sine comes out at the output times, delayed by 6.5 and scaled by the kernel's gain.
+TYPED_TEST(Filters, ResamplerFollowsASlowSine) {
     using V = TypeParam; using T = real_of<V>;
     Vec<V> coef;
     coef->points = 13314;
@@ -209,23 +200,6 @@ TYPED_TEST(Filters, ResamplerSineAndStreams) {
             EXPECT_NEAR(out->points, std::floor(2000 / ratio) + 1, 1);
             for (int32_t i = int32_t(20 / ratio); i < out->points; ++i)
                 ASSERT_NEAR(out[i], gain * std::sin(two_pi * f0 * (i * ratio - 6.5)), 2e-4) << method << " " << ratio;
-        }
-    // blocks on one history continue one stream; its last point says how far each block went
-    for (bool xc : {false, true})
-        for (double ratio : {0.73, 1.0, 2.6}) {
-            const auto noise = random_values<T>(size_t(xc ? 1200 : 600), 9);
-            Vec<V> whole(noise, xc), out, hist, stream_hist;
-            out->points = 5000;
-            ASSERT_EQ(t_rsmp(&whole, &out, 1, &coef, T(ratio), hist.get()), 0);
-            const auto got = in_blocks<V>(noise, xc, 3, [&](V* in, V* o) {
-                const T n = T(in->points);
-                o->points = 5000;
-                const int32_t r = t_rsmp(in, o, 1, coef.get(), T(ratio), stream_hist.get());
-                EXPECT_EQ(stream_hist->data[(13 + 1) * (xc ? 2 : 1)], n);  // used up to the end
-                return r;
-            }, false);  // in place, the preset count would be the block's length
-            ASSERT_EQ(got.size(), size_t(out.scalars()));
-            for (size_t i = 0; i < got.size(); ++i) ASSERT_NEAR(got[i], out[int64_t(i)], is_double<V> ? 1e-13 : 1e-5) << i;
         }
 }
 
@@ -264,6 +238,151 @@ TYPED_TEST(Filters, ResamplerEdgesAndFailures) {
     __lsan::ScopedDisabler settled_loss;  // a failed run keeps its table: settled behaviour
 #endif
     EXPECT_EQ(t_rsmp2(&in, &made, 3, 0, T(1), nullptr), -1);
+}
+
+// One stream in random blocks of up to 400 points, lanes on then off: the outputs and the final history, joined.
+template <class V, class Run>
+std::vector<real_of<V>> stream(int32_t lanes, const std::vector<real_of<V>>& x, bool xc, uint32_t seed, bool in_place,
+                               Run run) {
+    EXPECT_EQ(vlx_filter_lanes(lanes), lanes);
+    Vec<V> hist;
+    auto got = in_blocks<V>(x, xc, seed, [&](V* in, V* out) { return run(in, out, hist.get()); }, in_place, 400);
+    const auto kept = hist.values();
+    got.insert(got.end(), kept.begin(), kept.end());
+    return got;
+}
+
+// Random ratios both ways, both methods, real and complex, short blocks kept in the history, output counts cut short.
+TYPED_TEST(Filters, LanesResamplerKeepsScalarBits) {
+    using V = TypeParam; using T = real_of<V>;
+    const int32_t widest = vlx_filter_lanes(-1);
+    Vec<V> table;
+    table->points = 13314;  // 13 taps: windows end inside a register
+    ASSERT_EQ(t_table(table.get(), 4), 0);
+    std::mt19937 rng(7);
+    for (int trial = 0; trial < 24; ++trial) {
+        const bool cx = trial % 3 == 2;
+        const int32_t method = cx ? 1 : trial % 2, cap = int32_t(rng() % 50);
+        const T ratio = T(std::uniform_real_distribution<double>(trial % 4 ? 0.3 : 0.999, 2.5)(rng));
+        const auto x = random_values<T>(size_t(3000 * (cx ? 2 : 1)), uint32_t(trial));
+        const auto run = [&](V* in, V* out, V* hist) {
+            out->points = trial % 5 ? 100000 : cap;
+            return t_rsmp(in, out, method, table.get(), ratio, hist);
+        };
+        EXPECT_TRUE(same_scalars(stream<V>(widest, x, cx, uint32_t(trial), false, run),
+                                 stream<V>(0, x, cx, uint32_t(trial), false, run))) << "trial " << trial;
+    }
+    vlx_filter_lanes(widest);
+}
+
+// Every odd/anti pairing, real and complex, with and without history, plain and decimating, some blocks short.
+TYPED_TEST(Filters, LanesSymmetricKernelsKeepScalarBits) {
+    using V = TypeParam; using T = real_of<V>;
+    const int32_t widest = vlx_filter_lanes(-1);
+    for (int32_t m : {1, 2, 12, 20, 31, 60})
+        for (int kind = 0; kind < 8; ++kind)
+            for (int32_t factor : {0, 1, 2, 3, 7}) {
+                const bool odd = kind & 1, anti = kind & 2, xc = kind & 4, keep = (m + factor) % 2;
+                const auto x = random_values<T>(size_t(1500 * (xc ? 2 : 1)), uint32_t(m * 8 + kind));
+                Vec<V> filter(random_values<T>(size_t(m), uint32_t(m)), false);
+                const auto run = [&](V* in, V* out, V* hist) {
+                    V* past = keep ? hist : nullptr;
+                    return factor ? t_sfir_deci(in, out, &filter, odd, anti, factor, past) : t_sfir(in, out, &filter, odd, anti, past);
+                };
+                EXPECT_TRUE(same_scalars(stream<V>(widest, x, xc, uint32_t(kind + factor), true, run),
+                                         stream<V>(0, x, xc, uint32_t(kind + factor), true, run)))
+                    << "m " << m << " kind " << kind << " factor " << factor;
+            }
+    vlx_filter_lanes(widest);
+}
+
+VLX_TYPED_SUITE(Staging);
+
+// Blocks fed one after another give one long call's samples exactly, whatever the split: every factor-th sample.
+TYPED_TEST(Staging, BlockFedDecimationEqualsOneCall) {
+    using V = TypeParam; using T = real_of<V>;
+    const int32_t total = 97;
+    for (bool cx : {false, true})
+        for (int32_t factor : {-2, 0, 1, 2, 3, 4, 7, 16, 100})
+            for (uint32_t split_seed = 0; split_seed < 12; ++split_seed) {
+                const int64_t w = cx ? 2 : 1;
+                const auto x = random_values<T>(size_t(total * w), 42);
+                const int32_t f = factor < 1 ? 1 : factor;
+                std::vector<T> want;
+                for (int64_t k = 0; k < total; k += f)
+                    for (int64_t c = 0; c < w; ++c) want.push_back(x[size_t(k * w + c)]);
+                Vec<V> hist;  // empty: starts from silence; odd blocks decimate in place
+                const auto got = in_blocks<V>(x, cx, split_seed, [&](V* in, V* out) {
+                    in->delta = T(0.5);
+                    const int32_t r = t_deci(in, out, factor, hist.get());
+                    EXPECT_TRUE(out->complex == (cx ? 1 : 0) && out->delta == (T(f) * T(0.5)));
+                    return r;
+                }, true, 23);
+                EXPECT_EQ(got, want) << "factor " << factor << " split " << split_seed << " cx " << cx;
+                EXPECT_EQ(hist->complex, cx ? 1 : 0);
+            }
+}
+
+// The stored count still to drop, on blocks of 0, 1, 2, ...; without a history each block starts at its first sample.
+TYPED_TEST(Staging, DecimationSkipCount) {
+    using V = TypeParam; using T = real_of<V>;
+    struct Case { T stored; int32_t n, factor, points; T first, next; };
+    const Case cases[] = {  // the whole block still to be dropped; a negative count is 0; counts round to nearest
+        {7, 5, 3, 0, -1, 2}, {0, 10, 4, 3, 0, 2}, {0, 0, 4, 0, -1, 0}, {-3, 4, 2, 2, 0, 0}, {1.4f, 6, 2, 3, 1, 1},
+        {1.5f, 6, 2, 2, 2, 0}};
+    for (const Case& c : cases) {
+        std::vector<T> x(size_t(c.n));
+        for (int32_t i = 0; i < c.n; ++i) x[size_t(i)] = T(i);
+        Vec<V> in(x, false), out, hist({c.stored});
+        ASSERT_EQ(t_deci(in.get(), out.get(), c.factor, hist.get()), 0);
+        EXPECT_TRUE(out->points == c.points && (c.points == 0 || out[0] == c.first) && hist[0] == c.next) << c.stored << " " << c.n;
+    }
+    Vec<V> in({1, 2, 3, 4, 5}), dst;
+    ASSERT_EQ(t_deci(in.get(), in.get(), 2, static_cast<V*>(nullptr)), 0);
+    EXPECT_EQ(in.values(), (std::vector<T>{1, 3, 5}));
+    FailingAlloc<V> failing;  // a failed destination is left empty
+    EXPECT_TRUE(t_deci(in.get(), dst.get(), 1, static_cast<V*>(nullptr)) == -1 && dst->points == 0);
+}
+
+// The history takes the source's type and keeps its surplus; an aliased destination goes through the temporary.
+TYPED_TEST(Staging, HistoryAndAliasedDestination) {
+    using V = TypeParam; using T = real_of<V>;
+    Vec<V> in({1, 2, 3, 4}, true), out, hist({9, 8, 7, 6, 5}), a, b;
+    in->delta = T(0.25);
+    V *hp = hist.get(), *op = out.get(), tmp, *saved = nullptr;
+    ASSERT_EQ(t_stage(in.get(), &op, nullptr, &hp, 3, 0, nullptr, nullptr, nullptr), 0);
+    EXPECT_TRUE(has_shape(hist.get(), 5, 1, 0.25) && hist[2] == T(8) && hist[3] == T(0) && has_shape(out.get(), 2, 1, 0.25));
+    Vec<V> v({1, 2, 3});
+    v->points = 2, op = v.get();
+    int32_t aliased = -7;
+    ASSERT_TRUE(t_stage(v.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS | VLX_STAGE_KEEP_POINTS, &aliased, &tmp, &saved) == 0 &&
+                aliased == 1 && saved == v.get() && op == &tmp && tmp.points == 2);
+    for (int32_t i = 0; i < 2; ++i) tmp.data[i] = v[i] * T(10);  // the kernel reads the source
+    ASSERT_EQ(t_unstage(op, aliased, saved), 0);
+    EXPECT_TRUE(tmp.data == nullptr && v->points == 2 && v[0] == T(10) && v[1] == T(20));
+    op = b.get();
+    ASSERT_EQ(t_stage(a.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS, nullptr, nullptr, nullptr), -1);
+    ASSERT_EQ(t_stage(a.get(), &op, nullptr, nullptr, 0, VLX_STAGE_ALIAS, &aliased, &tmp, &saved), 0);
+    EXPECT_TRUE(aliased == 1 && t_unstage(op, 1, static_cast<V*>(nullptr)) == -1 && t_unstage(op, 1, saved) == 0);
+    EXPECT_EQ(t_unstage(a.get(), 0, static_cast<V*>(nullptr)), 0);
+}
+
+TEST(PointCounts, NearlyEqualCeilAndFloor) {
+    const struct { double a, b; int32_t want; } equal[] = {
+        {0.0, 1e-310, 1}, {1e-300, 0.0, 0}, {1.0, 1.0 + 4e-15, 1}, {1.0, 1.0 + 5e-15, 0}, {-2.0, -2.0, 1},
+        {2.0, -2.0, 0},   {NAN, NAN, 0},    {1.0, NAN, 0},         {4.4e-307, -4.4e-307, 1}};
+    for (const auto& c : equal) EXPECT_EQ(vlx_nearly_equal(c.a, c.b), c.want) << c.a << " " << c.b;
+    // the float allowance is 7 epsilons
+    EXPECT_TRUE(vlxf_nearly_equal(1.0f, 1.0000007f) == 1 && vlxf_nearly_equal(1.0f, 1.000001f) == 0);
+    EXPECT_TRUE(vlxf_nearly_equal(0.0f, 2e-37f) == 1 && vlxf_nearly_equal(3e-37f, 0.0f) == 0);
+    struct Case { double x; int32_t ceil, floor; };
+    const Case cases[] = {
+        {2.0000000000000004, 2, 2}, {1.9999999999999998, 2, 2}, {2.01, 3, 2}, {1.99, 2, 1}, {1e-20, 0, 0},
+        {0.5, 1, 0}, {-0.1, 0, 0}, {-1e9, 0, 0}, {NAN, 0, 0}, {3e9, INT_MAX, INT_MAX}, {2147483647.0, INT_MAX, INT_MAX}};
+    for (const Case& c : cases) EXPECT_TRUE(vlx_ceil_pts(c.x) == c.ceil && vlx_floor_pts(c.x) == c.floor) << c.x;
+    const Case fcases[] = {{2.0000002, 2, 2}, {1.9999999, 2, 2}, {20000.004, 20000, 20000}, {20000.02, 20001, 20000},
+                           {2147483648.0, INT_MAX, INT_MAX}, {-3.0, 0, 0}, {0.25, 1, 0}};
+    for (const Case& c : fcases) EXPECT_TRUE(vlxf_ceil_pts(float(c.x)) == c.ceil && vlxf_floor_pts(float(c.x)) == c.floor) << c.x;
 }
 
 }  // namespace
