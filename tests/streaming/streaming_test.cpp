@@ -249,6 +249,27 @@ TYPED_TEST(StreamingResampler, BlocksContinueOneStream) {
         }
 }
 
+// A tone comes out delayed by get_delay_pts, in input and in output points.
+TYPED_TEST(StreamingResampler, ToneDelay) {
+    using V = TypeParam; using T = real_of<V>;
+    for (double ratio : {0.1, 0.7, 0.97, 1.0, 1.088, 1.5, 2.0, 3.3, 8.0}) {
+        Stream<V> s(ratio, ratio == 1.0);
+        const double f = 0.01 / std::max(ratio, 1.0);
+        Vec<V> in, out;
+        in->points = 16000, out->points = s.out_pts(16000, 0, 0);
+        ASSERT_EQ(t_cos(in.get(), T(f), T(0)), 0);
+        ASSERT_EQ(s.run(in.get(), out.get(), nullptr, false), 0);  // no state: output j at input time j * ratio
+        std::complex<double> z = 0;  // Hann-weighted phase of the settled middle
+        const int32_t a = out->points / 4, b = out->points - 300;
+        for (int32_t j = a; j < b; ++j)
+            z += (1 - std::cos(2 * M_PI * (j - a) / (b - a))) * double(out[j]) * std::polar(1.0, -2 * M_PI * f * ratio * j);
+        T want = 0, want_out = 0;
+        t_rsmp_get_delay_pts(&want, &s.coef, 0), t_rsmp_get_delay_pts(&want_out, &s.coef, 1);
+        const double period = 1 / f, got = std::fmod(-std::arg(z) / (2 * M_PI * f) - want + 2.5 * period, period) - period / 2;
+        EXPECT_TRUE(near(got, 0, 0.1) && near(want_out * ratio, want, 1e-4 * want)) << ratio << ": " << got;
+    }
+}
+
 // |sum of taps[i] e^(-j 2 pi f i / step)| / step: a filter's gain at f cycles per sample, the table's kernel read at
 // `step` entries a sample. A half filter (centre tap last) counts its mirrored half too.
 template <class V>
