@@ -38,8 +38,6 @@ TYPED_TEST(Fft, ExactSmallLengths) {
         {{5, -2}, true, 1, {5, -2}, true},               // one complex point unchanged
         {{1, 3}, false, 0, {2, 0, -1, 0}, true},         // halved, then sum and difference
         {{2, 0, -1, 0}, true, 1, {1, 0, 3, 0}, true},
-        {{1, 2, 3, 4}, false, 0, {2.5, 0, -0.5, 0.5, -0.5, 0, -0.5, -0.5}, true},
-        {{10, 0, -2, 2, -2, 0, -2, -2}, true, 1, {4, 0, 8, 0, 12, 0, 16, 0}, true},
         {{1, 1, 1, 1, 1, 1, 1, 1}, false, 0, {1, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0}, true},
         {{8, 0, 0, 0, 0, 0, 0, 0}, false, 0, {1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0}, true},
     };
