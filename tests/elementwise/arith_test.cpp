@@ -99,8 +99,7 @@ TYPED_TEST(Arith, ClampsAndFixedValues) {
     }
 }
 
-// Real-only operations refuse complex input, even empty; the stubs always fail.  On empty vectors mag and magsq still
-// turn real, cscale and timesi stay real.
+// Real-only operations refuse complex input, even empty; stubs always fail; empty mag, magsq, cscale, timesi are real.
 TYPED_TEST(Arith, RefusalsAndEmptyVectors) {
     using V = TypeParam; using T = real_of<V>;
     const std::vector<std::pair<bool, std::function<int32_t(V*)>>> refusing = {
@@ -122,8 +121,7 @@ TYPED_TEST(Arith, RefusalsAndEmptyVectors) {
     }
 }
 
-// vlxu_ forms: dst a third vector (the vector loops), src itself, or a vector sharing src's data; all bit for bit as
-// the in-place form, clamps included.
+// vlxu_ forms into a third vector (vector loops), src, or a vector sharing src's data: the in-place bits, clamps too.
 TYPED_TEST(Arith, OneSourceFormsWithEveryAliasing) {
     using V = TypeParam; using T = real_of<V>;
     using Ops = std::pair<std::function<int32_t(V*, V*)>, std::function<int32_t(V*)>>;
@@ -170,8 +168,7 @@ TEST(ArithFloat, FunctionsThroughDouble) {
         EXPECT_TRUE(same_bits(z[i], static_cast<float>(std::hypot(double(xs[2 * i]), double(xs[2 * i + 1])))));
 }
 
-// The tone by the rotation recurrence, restarted from the math library every 256 samples (the float twin through
-// double, reduced to one turn), bit for bit; the complex form with flag 1 also gets the sine.
+// The rotation recurrence, restarted every 256 samples (float: through double, one turn), bit for bit; flag 1: sine.
 TYPED_TEST(Arith, AddcosFollowsTheRecurrence) {
     using V = TypeParam; using T = real_of<V>;
     const int n = 1000;

@@ -115,8 +115,7 @@ TYPED_TEST(Layout, ZeroInterleave) {
 
 }  // namespace
 
-// A ramp wrapped into [-pi, pi) comes back whole (plus the turns that bring its first sample within pi of 0), by the
-// plain unwrap and by windows.
+// A wrapped ramp comes back whole (less the turns putting its start within pi of 0), plain and by windows.
 TYPED_TEST(Layout, UnwrapRestoresRamp) {
     using T = real_of<TypeParam>;
     const long double pi = 3.14159265358979323846L;

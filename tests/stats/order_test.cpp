@@ -94,8 +94,7 @@ TYPED_TEST(Order, HistogramEdges) {
     EXPECT_TRUE(v->delta == T(1) && v.values() == (std::vector<T>{1, 2}));
 }
 
-// With a million bins the float tolerance spans more than one bin: a value there still goes to the top bin, never
-// past the vector.
+// A million bins: the float tolerance spans more than one bin, yet nothing is written past the top bin.
 TEST(OrderFloat, HistogramToleranceNeverWritesPastTheTop) {
     Vec<vlxf_t> src{1000000.0f, 1000001.0f}, dst;
     ASSERT_EQ(vlxfs_hist(src.get(), dst.get(), 0.0f, 1.0f, 1000000), 0);
@@ -157,8 +156,7 @@ TYPED_TEST(Peak, FixedCases) {
             << row.what << ": " << r.value;
         EXPECT_EQ(r.position, row.position) << row.what;
     }
-    // three equal samples: the parabola divides by zero and still succeeds; the last sample as maximum uses the pair
-    // points-2, points-1
+    // three equal samples: the parabola divides by zero, yet succeeds; a last maximum uses the last pair
     Vec<TypeParam> flat{1, 1, 1}, rising{1, 2, 3, 4};
     const auto r = run_peak(flat, VLX_PEAK_PARABOLA | VLX_PEAK_AT_INDEX, 1), lr = run_peak(rising, VLX_PEAK_LOG_RATIO);
     EXPECT_TRUE(r.status == 0 && std::isnan(r.position));
@@ -181,8 +179,7 @@ TYPED_TEST(Peak, ParabolaIsExact) {
 // Hann window spectrum, amplitude at f bins from the centre.
 double hann_lobe(double f) { return std::fabs(f) < 1e-9 ? 1.0 : std::sin(M_PI * f) / (M_PI * f) / (1.0 - f * f); }
 
-// The log ratio puts the Gaussian lobe of its constant (and a complex source's power) at its true position; on a Hann
-// main lobe so sampled both forms move monotonically with it, across a change of bracketing pair too, and stay near.
+// Its own Gaussian lobe (real, or as complex power) exactly placed; on a Hann lobe both forms monotonic and near.
 TYPED_TEST(Peak, LogRatioFollowsTheLobe) {
     using T = real_of<TypeParam>;
     const long double width = 0.792233201343665L;
@@ -218,8 +215,7 @@ TYPED_TEST(Peak, LogRatioFollowsTheLobe) {
     }
 }
 
-// dst may be src: the result goes through a fresh vector, so a complex source becomes two real points with delta 1;
-// elsewhere dst's delta stays.
+// In place, a complex source becomes two real points with delta 1; a separate dst keeps its delta.
 TYPED_TEST(Peak, InPlaceFrame) {
     using T = real_of<TypeParam>;
     Vec<TypeParam> v({1, 0, 1e-3f, 0, 0, 2}, true);

@@ -1,5 +1,4 @@
-// Polynomials: roots against their polynomial in long double, expansion back, closed forms, single-root searches;
-// interpolation: splines reproduce a cubic, the lower methods their own polynomials.
+// Polynomial roots (long double residuals, closed forms, single searches); splines and lower interpolation methods.
 #include "stats_support.hpp"
 
 #include <algorithm>
@@ -134,8 +133,7 @@ TYPED_TEST(Poly, SearchedRootsSatisfyPolynomialExpandBackAndSkipNoBit) {
     }
 }
 
-// Up to degree 5 the closed forms: real roots stay real (imaginary part exactly 0) and come first, ascending, then
-// the conjugate pairs.
+// Closed forms up to degree 5: real roots exactly real, first and ascending, then the conjugate pairs.
 TYPED_TEST(Poly, ClosedFormsKeepRealRootsReal) {
     using T = real_of<TypeParam>;
     const long double eps = std::numeric_limits<T>::epsilon();
@@ -238,8 +236,7 @@ Vec<V> table(const std::vector<LD>& xs, F f) {
 
 VLX_TYPED_SUITE(Interp);
 
-// Second derivatives and values of a cubic, in and beyond the table, for the four-point closed form and the
-// tridiagonal path; y comes back unchanged.
+// A cubic's second derivatives and values in and beyond the table, four-point and tridiagonal paths; y unchanged.
 TYPED_TEST(Interp, SplineReproducesCubic) {
     using T = real_of<TypeParam>;
     const LD tol = is_double<TypeParam> ? 1e-11L : 2e-4L;

@@ -28,8 +28,7 @@ TYPED_TEST(Fft, MatchesLiteralEnginesBitForBit) {
     }
 }
 
-// Small lengths whose results are exact in both precisions.  The real transform of the real rows keeps the first
-// N/2 + 1 bins (one point stays real) and turns a zero delta into the fallback.
+// Exact in both precisions; the real transform keeps N/2 + 1 bins (one point stays real), delta 0 takes the fallback.
 TYPED_TEST(Fft, ExactSmallLengths) {
     using T = real_of<TypeParam>;
     struct Case { std::vector<T> in; bool in_complex; int inverse; std::vector<T> out; bool out_complex; };
@@ -75,8 +74,7 @@ TYPED_TEST(Fft, RejectsOtherLengths) {
     EXPECT_TRUE(t_fft(&v, 1) == -1 && t_rfft(&c) == -1 && c->points == 4 && c->complex == 1);
 }
 
-// Every point lands at its reversed index, real and complex alike, past 1 MB of samples; the scaled form multiplies
-// each sample by 1/N exactly once; twice is identity.
+// Reversed indices, real and complex, past 1 MB of samples; the scaled form multiplies by 1/N once; twice is identity.
 TYPED_TEST(Fft, BitrevPermutesAndScales) {
     using T = real_of<TypeParam>;
     for (int m = 0; m <= 18; ++m)
