@@ -207,3 +207,28 @@ TYPED_TEST(DftTest, DctAndAnalyticShortLengths) {
     EXPECT_TRUE(one->complex == 0 && same_bits(one[0], T(5)) && same_bits(one->delta, T(4)));
     EXPECT_TRUE(zero->complex == 0 && same_bits(zero[0], T(0)));
 }
+
+// x = a cos(w i) + DC + Nyquist, real or complex: analytic x + j a sin(w i), Hilbert a sin(w i), within the bound.
+TYPED_TEST(DftTest, AnalyticTonesAndEdgeBins) {
+    using T = real_of<TypeParam>;
+    const double tol = 2 * fftref::transform_tolerance(std::numeric_limits<T>::epsilon(), 10);
+    for (int32_t n : {3, 4, 7, 8, 10, 64, 99, 360}) {
+        for (int32_t bin : {1, (n - 1) / 2}) {
+            std::vector<T> x(n), c(2 * size_t(n), T(0));
+            std::vector<long double> s(n);
+            for (int32_t i = 0; i < n; ++i) {
+                const long double w = 6.283185307179586476925286766559L * bin * i / n;
+                c[2 * i] = x[i] = T(0.75L * std::cos(w) + 0.5L + (n % 2 ? 0 : (i % 2 ? -0.25L : 0.25L)));
+                s[i] = 0.75L * std::sin(w);
+            }
+            for (bool cplx : {false, true}) {
+                Vec<TypeParam> a(cplx ? c : x, cplx), h(cplx ? c : x, cplx);
+                ASSERT_TRUE(t_analytic(&a) == 0 && t_hilbert(&h) == 0 && a->complex == 1 && h->complex == (cplx ? 1 : 0));
+                for (int32_t i = 0; i < n; ++i) {
+                    ASSERT_TRUE(near(a[2 * i], x[i], tol) && near(a[2 * i + 1], s[i], tol)) << n << " " << bin << " " << i;
+                    ASSERT_TRUE(near(h[cplx ? 2 * i : i], s[i], tol) && (!cplx || near(h[2 * i + 1], 0, tol))) << n << " " << i;
+                }
+            }
+        }
+    }
+}
