@@ -136,23 +136,6 @@ TYPED_TEST(Layout, UnwrapRestoresRamp) {
     }
 }
 
-// Crossings of a sine at level 0 sit at its zeros, within the error of the linear interpolation.
-TYPED_TEST(Layout, EdgesOfSine) {
-    const double delta = 0.01, freq = 3.0;  // 100 samples per unit, zeros every 1/6
-    std::vector<real_of<TypeParam>> s(400);
-    for (int k = 0; k < 400; ++k) s[k] = real_of<TypeParam>(std::sin(2 * M_PI * freq * (k * delta + 0.013)));
-    for (const int32_t mode : {1, 2, 3, 0}) {
-        Vec<TypeParam> v(s, false);
-        v->delta = static_cast<real_of<TypeParam>>(delta);
-        ASSERT_EQ(t_edge(v.get(), mode, real_of<TypeParam>(0)), 0);
-        std::vector<double> want;  // zeros at z / 6 - 0.013, rising for even z
-        for (int z = 1; z / (2 * freq) - 0.013 < 3.99; ++z)
-            if ((z % 2 == 0) ? (mode & 1) : (mode & 2)) want.push_back(z / (2 * freq) - 0.013);
-        ASSERT_TRUE(has_shape(v.get(), int32_t(want.size()), 0, 1.0)) << "mode " << mode;
-        for (size_t i = 0; i < want.size(); ++i) EXPECT_TRUE(near(v[i], want[i], 2e-4)) << i;
-    }
-}
-
 // Fixed results, bit for bit.
 TYPED_TEST(Layout, PhaseFixedCases) {
     using T = real_of<TypeParam>;
@@ -167,7 +150,9 @@ TYPED_TEST(Layout, PhaseFixedCases) {
         {"unwrap", [](auto* v) { return t_unwrap(v); }, {3, -3}, false, 1, {3, T(-3) + two_pi}, 2, 0},
         {"unwrap from 0", [](auto* v) { return t_unwrap(v); }, {4}, false, 1, {T(4) - two_pi}, 1, 0},
         {"unwrap_wnd from 0", [](auto* v) { return t_unwrap_wnd(v, 2); }, {4}, false, 1, {T(4) - two_pi}, 1, 0},
-        {"edge", [](auto* v) { return t_edge(v, 1, T(1)); }, {0, 2}, false, 0.5, {0.25}, 1, 0, 1},
+        {"edge, rising", [](auto* v) { return t_edge(v, 1, T(1)); }, {0, 2, 1, 2}, false, 0.5, {0.25, 1}, 2, 0, 1},
+        {"edge, falling", [](auto* v) { return t_edge(v, 2, T(1)); }, {0, 2, 1, 1, 0}, false, 0.5, {1.5}, 1, 0, 1},
+        {"edge, both", [](auto* v) { return t_edge(v, 3, T(1)); }, {0, 2, 1, 1, 0}, false, 0.5, {0.25, 1.5}, 2, 0, 1},
         {"edge, one point", [](auto* v) { return t_edge(v, 3, T(1)); }, {5}, false, 0.5, {}, 0, 0, 1},
         {"differ", [](auto* v) { return t_differ(v); }, {1, 3, 6}, false, 0.5, {2, 4, 6}, 3, 0},
         {"differ, delta 0", [](auto* v) { return t_differ(v); }, {1, 0, 3, 1}, true, 0, {b, 0, 2 * b, b}, 2, 1},
