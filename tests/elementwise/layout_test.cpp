@@ -25,12 +25,19 @@ std::pair<real_of<V>, real_of<V>> sample(Vec<V>& v, int64_t k) {
 
 VLX_TYPED_SUITE(Layout);
 
-TYPED_TEST(Layout, RealAndImaginaryParts) {
-    using R = std::vector<real_of<TypeParam>>;
+TYPED_TEST(Layout, PartsAndZeroInterleave) {
+    using V = TypeParam; using T = real_of<V>; using R = std::vector<T>;
     Vec<TypeParam> c({1, -2, 3, -4, 5, -6}, true), d({1, -2, 3, -4, 5, -6}, true), r({7, 8, 9}), q({7, 8, 9});
     ASSERT_TRUE(t_real(&c) == 0 && t_imag(&d) == 0 && t_real(&r) == 0 && t_imag(&q) == 0);
     EXPECT_TRUE(c.values() == (R{1, 3, 5}) && c->alloc == 6 && d.values() == (R{-2, -4, -6}) && d->complex == 0);
     EXPECT_TRUE(r.values() == (R{7, 8, 9}) && q.values() == (R{0, 0, 0}));  // the imaginary part of a real signal is 0
+    // zeros between the samples halve delta; the complex form scales, into itself or into another vector
+    Vec<V> zr({1, 2}), zc({1, 2, 3, 4}, true), zd;
+    zr->delta = 3;
+    ASSERT_TRUE(t_zinter(&zr) == 0 && t_uzinter(&zc, &zd, T(2)) == 0 && t_uzinter(&zc, &zc, T(2)) == 0);
+    EXPECT_TRUE(zr.values() == (R{1, 0, 2, 0}) && zr->delta == T(1.5));
+    const R want{2, 4, 0, 0, 6, 8, 0, 0};
+    EXPECT_TRUE(zc.values() == want && zd.values() == want && zd->complex == 1);
 }
 
 // Reversal, half rotations and shift against their index formulas, both parities, lengths past the vector widths.
@@ -61,7 +68,7 @@ TYPED_TEST(Layout, PermutationsAndShiftMatchIndexFormulas) {
 }
 
 // Padding puts the samples where a spectrum or a centred record expects them, unpadding restores them; all modes.
-TYPED_TEST(Layout, PadAndUnpadAreInverse) {
+TYPED_TEST(Layout, PadAndUnpad) {
     using V = TypeParam; using T = real_of<V>;
     for (bool cx : {false, true})
         for (int32_t mode : {VLX_PAD_SCALE_RATIO, VLX_PAD_SCALE_SQRT, VLX_PAD_SCALE_NONE})
@@ -88,10 +95,7 @@ TYPED_TEST(Layout, PadAndUnpadAreInverse) {
                         ASSERT_TRUE(t_unzpad(&v, old_n, mode | layout) == 0 && v->points == old_n);
                         EXPECT_TRUE(same_scalars(v.values(), x, mode == VLX_PAD_SCALE_NONE ? 0 : 4));
                     }
-}
-
-TYPED_TEST(Layout, InvalidFlagsAreSeenAfterGrowingAndBeforeUnpadding) {
-    using V = TypeParam; using T = real_of<V>;
+    // invalid flags are seen after growing and before unpadding
     for (int32_t flags : {3, VLX_PAD_SPLIT | 3, 0x400, 0x500, 0x600, 0x700 | VLX_PAD_SCALE_NONE}) {
         Vec<V> v({1, 2, 3});
         EXPECT_EQ(t_zpad2(&v, 3, flags), 0);  // nothing to do comes first
@@ -102,16 +106,6 @@ TYPED_TEST(Layout, InvalidFlagsAreSeenAfterGrowingAndBeforeUnpadding) {
     }
 }
 
-// Zeros between the samples halve delta; the complex form scales, into itself or into another vector.
-TYPED_TEST(Layout, ZeroInterleave) {
-    using V = TypeParam; using T = real_of<V>;
-    Vec<V> r({1, 2}), c({1, 2, 3, 4}, true), d;
-    r->delta = 3;
-    ASSERT_TRUE(t_zinter(&r) == 0 && t_uzinter(&c, &d, T(2)) == 0 && t_uzinter(&c, &c, T(2)) == 0);
-    EXPECT_TRUE(r.values() == (std::vector<T>{1, 0, 2, 0}) && r->delta == T(1.5));
-    const std::vector<T> want{2, 4, 0, 0, 6, 8, 0, 0};
-    EXPECT_TRUE(c.values() == want && d.values() == want && d->complex == 1);
-}
 
 }  // namespace
 
