@@ -23,8 +23,7 @@ Sample<real_of<V>> at(V* v, int64_t i) {
     return v->complex ? Sample<real_of<V>>(v->data[2 * i], v->data[2 * i + 1]) : Sample<real_of<V>>(v->data[i], 0);
 }
 
-// `op` on sources of every shape, dst a third vector (the vector loops), a or b (the scalar order, a real dst
-// growing into the complex result), each sample bit for bit against ref(a_i, b_i).
+// Every shape, dst a third vector (vector loops), a or b (scalar order, a real dst grows): the bits of ref(a_i, b_i).
 template <class V, class Op, class Ref>
 void check_shapes(Op op, Ref ref, int32_t n = 67) {
     using T = real_of<V>;
@@ -238,8 +237,7 @@ TYPED_TEST(Binary, DotSumsEveryPointWithLanePartialSums) {
     EXPECT_EQ(r.values(), (std::vector<T>{(1 - 4) + (9 - 16), 4 + 24}));  // no conjugate
 }
 
-// A destination that cannot be sized: -1 and nothing changes; storage that cannot be had: the destination is left
-// empty.
+// A destination that cannot be sized: -1, nothing changes; storage that cannot be had: the destination left empty.
 TYPED_TEST(Binary, PrepareDestFailures) {
     using V = TypeParam; using T = real_of<V>;
     Vec<V> a({1, 2}), b({1, 2, 3, 4}, true), longer({1, 2, 3}), d({5});

@@ -25,12 +25,19 @@ std::pair<real_of<V>, real_of<V>> sample(Vec<V>& v, int64_t k) {
 
 VLX_TYPED_SUITE(Layout);
 
-TYPED_TEST(Layout, RealAndImaginaryParts) {
-    using R = std::vector<real_of<TypeParam>>;
+TYPED_TEST(Layout, PartsAndZeroInterleave) {
+    using V = TypeParam; using T = real_of<V>; using R = std::vector<T>;
     Vec<TypeParam> c({1, -2, 3, -4, 5, -6}, true), d({1, -2, 3, -4, 5, -6}, true), r({7, 8, 9}), q({7, 8, 9});
     ASSERT_TRUE(t_real(&c) == 0 && t_imag(&d) == 0 && t_real(&r) == 0 && t_imag(&q) == 0);
     EXPECT_TRUE(c.values() == (R{1, 3, 5}) && c->alloc == 6 && d.values() == (R{-2, -4, -6}) && d->complex == 0);
     EXPECT_TRUE(r.values() == (R{7, 8, 9}) && q.values() == (R{0, 0, 0}));  // the imaginary part of a real signal is 0
+    // zeros between the samples halve delta; the complex form scales, into itself or into another vector
+    Vec<V> zr({1, 2}), zc({1, 2, 3, 4}, true), zd;
+    zr->delta = 3;
+    ASSERT_TRUE(t_zinter(&zr) == 0 && t_uzinter(&zc, &zd, T(2)) == 0 && t_uzinter(&zc, &zc, T(2)) == 0);
+    EXPECT_TRUE(zr.values() == (R{1, 0, 2, 0}) && zr->delta == T(1.5));
+    const R want{2, 4, 0, 0, 6, 8, 0, 0};
+    EXPECT_TRUE(zc.values() == want && zd.values() == want && zd->complex == 1);
 }
 
 // Reversal, half rotations and shift against their index formulas, both parities, lengths past the vector widths.
@@ -61,7 +68,7 @@ TYPED_TEST(Layout, PermutationsAndShiftMatchIndexFormulas) {
 }
 
 // Padding puts the samples where a spectrum or a centred record expects them, unpadding restores them; all modes.
-TYPED_TEST(Layout, PadAndUnpadAreInverse) {
+TYPED_TEST(Layout, PadAndUnpad) {
     using V = TypeParam; using T = real_of<V>;
     for (bool cx : {false, true})
         for (int32_t mode : {VLX_PAD_SCALE_RATIO, VLX_PAD_SCALE_SQRT, VLX_PAD_SCALE_NONE})
@@ -88,10 +95,7 @@ TYPED_TEST(Layout, PadAndUnpadAreInverse) {
                         ASSERT_TRUE(t_unzpad(&v, old_n, mode | layout) == 0 && v->points == old_n);
                         EXPECT_TRUE(same_scalars(v.values(), x, mode == VLX_PAD_SCALE_NONE ? 0 : 4));
                     }
-}
-
-TYPED_TEST(Layout, InvalidFlagsAreSeenAfterGrowingAndBeforeUnpadding) {
-    using V = TypeParam; using T = real_of<V>;
+    // invalid flags are seen after growing and before unpadding
     for (int32_t flags : {3, VLX_PAD_SPLIT | 3, 0x400, 0x500, 0x600, 0x700 | VLX_PAD_SCALE_NONE}) {
         Vec<V> v({1, 2, 3});
         EXPECT_EQ(t_zpad2(&v, 3, flags), 0);  // nothing to do comes first
@@ -102,21 +106,10 @@ TYPED_TEST(Layout, InvalidFlagsAreSeenAfterGrowingAndBeforeUnpadding) {
     }
 }
 
-// Zeros between the samples halve delta; the complex form scales, into itself or into another vector.
-TYPED_TEST(Layout, ZeroInterleave) {
-    using V = TypeParam; using T = real_of<V>;
-    Vec<V> r({1, 2}), c({1, 2, 3, 4}, true), d;
-    r->delta = 3;
-    ASSERT_TRUE(t_zinter(&r) == 0 && t_uzinter(&c, &d, T(2)) == 0 && t_uzinter(&c, &c, T(2)) == 0);
-    EXPECT_TRUE(r.values() == (std::vector<T>{1, 0, 2, 0}) && r->delta == T(1.5));
-    const std::vector<T> want{2, 4, 0, 0, 6, 8, 0, 0};
-    EXPECT_TRUE(c.values() == want && d.values() == want && d->complex == 1);
-}
 
 }  // namespace
 
-// A ramp wrapped into [-pi, pi) comes back whole (plus the turns that bring its first sample within pi of 0), by the
-// plain unwrap and by windows.
+// A wrapped ramp comes back whole (less the turns putting its start within pi of 0), plain and by windows.
 TYPED_TEST(Layout, UnwrapRestoresRamp) {
     using T = real_of<TypeParam>;
     const long double pi = 3.14159265358979323846L;
@@ -137,23 +130,6 @@ TYPED_TEST(Layout, UnwrapRestoresRamp) {
     }
 }
 
-// Crossings of a sine at level 0 sit at its zeros, within the error of the linear interpolation.
-TYPED_TEST(Layout, EdgesOfSine) {
-    const double delta = 0.01, freq = 3.0;  // 100 samples per unit, zeros every 1/6
-    std::vector<real_of<TypeParam>> s(400);
-    for (int k = 0; k < 400; ++k) s[k] = real_of<TypeParam>(std::sin(2 * M_PI * freq * (k * delta + 0.013)));
-    for (const int32_t mode : {1, 2, 3, 0}) {
-        Vec<TypeParam> v(s, false);
-        v->delta = static_cast<real_of<TypeParam>>(delta);
-        ASSERT_EQ(t_edge(v.get(), mode, real_of<TypeParam>(0)), 0);
-        std::vector<double> want;  // zeros at z / 6 - 0.013, rising for even z
-        for (int z = 1; z / (2 * freq) - 0.013 < 3.99; ++z)
-            if ((z % 2 == 0) ? (mode & 1) : (mode & 2)) want.push_back(z / (2 * freq) - 0.013);
-        ASSERT_TRUE(has_shape(v.get(), int32_t(want.size()), 0, 1.0)) << "mode " << mode;
-        for (size_t i = 0; i < want.size(); ++i) EXPECT_TRUE(near(v[i], want[i], 2e-4)) << i;
-    }
-}
-
 // Fixed results, bit for bit.
 TYPED_TEST(Layout, PhaseFixedCases) {
     using T = real_of<TypeParam>;
@@ -168,7 +144,9 @@ TYPED_TEST(Layout, PhaseFixedCases) {
         {"unwrap", [](auto* v) { return t_unwrap(v); }, {3, -3}, false, 1, {3, T(-3) + two_pi}, 2, 0},
         {"unwrap from 0", [](auto* v) { return t_unwrap(v); }, {4}, false, 1, {T(4) - two_pi}, 1, 0},
         {"unwrap_wnd from 0", [](auto* v) { return t_unwrap_wnd(v, 2); }, {4}, false, 1, {T(4) - two_pi}, 1, 0},
-        {"edge", [](auto* v) { return t_edge(v, 1, T(1)); }, {0, 2}, false, 0.5, {0.25}, 1, 0, 1},
+        {"edge, rising", [](auto* v) { return t_edge(v, 1, T(1)); }, {0, 2, 1, 2}, false, 0.5, {0.25, 1}, 2, 0, 1},
+        {"edge, falling", [](auto* v) { return t_edge(v, 2, T(1)); }, {0, 2, 1, 1, 0}, false, 0.5, {1.5}, 1, 0, 1},
+        {"edge, both", [](auto* v) { return t_edge(v, 3, T(1)); }, {0, 2, 1, 1, 0}, false, 0.5, {0.25, 1.5}, 2, 0, 1},
         {"edge, one point", [](auto* v) { return t_edge(v, 3, T(1)); }, {5}, false, 0.5, {}, 0, 0, 1},
         {"differ", [](auto* v) { return t_differ(v); }, {1, 3, 6}, false, 0.5, {2, 4, 6}, 3, 0},
         {"differ, delta 0", [](auto* v) { return t_differ(v); }, {1, 0, 3, 1}, true, 0, {b, 0, 2 * b, b}, 2, 1},

@@ -1,5 +1,4 @@
-// Moments: long-double references, the block order of the sums bit for bit, degenerate, huge and NaN inputs; the
-// regression record against least squares.
+// Moments (long double, block order bit for bit, degenerate, huge and NaN inputs); regression against least squares.
 #include "stats_support.hpp"
 
 #include <functional>
@@ -30,8 +29,7 @@ T saturated(T x, T b) { return x > b ? b : (x < -b ? -b : x); }
 
 }  // namespace
 
-// Tolerance 2 sqrt(adds per block) ulps plus 8 for what follows the sums (the excess kurtosis in ulps of m4/m2^2); a
-// wrong divisor, a lost block or a wrong pivot is off by far more.  The plain sums are checked bit for bit below.
+// 2 sqrt(adds per block) + 8 ulps (excess in ulps of m4/m2^2): a wrong divisor or a lost block is off by far more.
 TYPED_TEST(Moments, AgreeWithLongDoubleReference) {
     using T = real_of<TypeParam>;
     for (const int64_t n : {int64_t(7), int64_t(1000), int64_t(5000), int64_t(2 * 8 * kBlock + 700)}) {
@@ -97,8 +95,8 @@ TYPED_TEST(Moments, SumsFollowTheBlockOrderBitForBit) {
     }
 }
 
-// Fixed results: empty vectors, constant vectors, bound and NaN samples.
-TYPED_TEST(Moments, FixedResults) {
+// Empty, constant, bound and NaN samples; in place, the statistic is read before the vector becomes one point.
+TYPED_TEST(Moments, FixedResultsAndInPlace) {
     using T = real_of<TypeParam>;
     constexpr T b = bound_of<TypeParam>();
     const T nan = std::numeric_limits<T>::quiet_NaN();
@@ -147,11 +145,6 @@ TYPED_TEST(Moments, FixedResults) {
     // Complex input to skew and excess is refused, dst untouched.
     Vec<TypeParam> cx({1, 2, 3, 4}, true), dst{42};
     EXPECT_TRUE(t_skew(cx.get(), dst.get()) == -1 && t_excess(cx.get(), dst.get()) == -1 && dst->points == 1 && dst[0] == T(42));
-}
-
-// dst may be src: the statistic is read before the vector becomes one point.
-TYPED_TEST(Moments, InPlaceAndComplexShape) {
-    using T = real_of<TypeParam>;
     Vec<TypeParam> v({1, 2, 3, 4, 5, 6}, true);
     v->delta = T(0.25);
     ASSERT_TRUE(t_mean(v.get(), v.get()) == 0 && has_shape(v.get(), 1, 1, 0.25));
@@ -193,8 +186,7 @@ std::vector<LD> reference(const std::vector<LD>& x, const std::vector<LD>& y) {
 
 VLX_TYPED_SUITE(Regression);
 
-// Real vectors (one crossing the 2048-point block, where x starts again at 0) and a complex scatter far from the
-// origin, against the long double fit.
+// Real vectors (one crossing the 2048-point block, x restarting at 0) and a complex scatter far from the origin.
 TYPED_TEST(Regression, MatchesLeastSquares) {
     using T = real_of<TypeParam>;
     const LD tol = is_double<TypeParam> ? 1e-9L : 3e-3L;

@@ -28,8 +28,7 @@ inline size_t reverse_index(size_t i, int bits) {
     return r;
 }
 
-// The twiddle table, step by step as the recipe reads: recurrence with restarts after every 256 entries, pi/4
-// constants, reflected 3-theta triples.
+// The twiddle table: recurrence restarted every 256 entries, pi/4 constants, reflected 3-theta triples.
 template <class T>
 std::vector<T> literal_table(size_t n) {
     constexpr bool dbl = std::is_same_v<T, double>;
@@ -67,8 +66,7 @@ std::vector<T> literal_table(size_t n) {
     return t;
 }
 
-// The engines' blocks by recursion.  A block depends only on its parent (complex) or its children (real), so any such
-// order gives the bits of the library's stage-by-stage level walk.
+// A block depends only on its parent (complex) or children (real): recursion gives the level walk's bits.
 template <class T>
 void literal_block(T* x, size_t len, size_t n, const std::vector<T>& t, bool inverse) {
     auto rot = [inverse](T& re, T& im, const T* tri) {
@@ -175,8 +173,7 @@ inline std::vector<cld> exact_dft(const std::vector<cld>& x, bool inverse) {
     return y;
 }
 
-// Error bound of a transform of 2^m points: a few eps sqrt(m) for the butterflies, plus up to one eps per step of the
-// twiddle recurrence's runs (restarted every 256).
+// Bound for 2^m points: a few eps sqrt(m) for the butterflies plus one eps per step of the twiddle runs.
 inline double transform_tolerance(double eps, int m) {
     const double steps = m >= 3 ? std::min(double(size_t(1) << (m - 3)), 256.0) : 0.0;
     return eps * (4 * std::sqrt(std::max(1.0, double(m))) + steps);

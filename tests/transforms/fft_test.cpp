@@ -28,8 +28,7 @@ TYPED_TEST(Fft, MatchesLiteralEnginesBitForBit) {
     }
 }
 
-// Small lengths whose results are exact in both precisions.  The real transform of the real rows keeps the first
-// N/2 + 1 bins (one point stays real) and turns a zero delta into the fallback.
+// Exact in both precisions; the real transform keeps N/2 + 1 bins (one point stays real), delta 0 takes the fallback.
 TYPED_TEST(Fft, ExactSmallLengths) {
     using T = real_of<TypeParam>;
     struct Case { std::vector<T> in; bool in_complex; int inverse; std::vector<T> out; bool out_complex; };
@@ -38,8 +37,6 @@ TYPED_TEST(Fft, ExactSmallLengths) {
         {{5, -2}, true, 1, {5, -2}, true},               // one complex point unchanged
         {{1, 3}, false, 0, {2, 0, -1, 0}, true},         // halved, then sum and difference
         {{2, 0, -1, 0}, true, 1, {1, 0, 3, 0}, true},
-        {{1, 2, 3, 4}, false, 0, {2.5, 0, -0.5, 0.5, -0.5, 0, -0.5, -0.5}, true},
-        {{10, 0, -2, 2, -2, 0, -2, -2}, true, 1, {4, 0, 8, 0, 12, 0, 16, 0}, true},
         {{1, 1, 1, 1, 1, 1, 1, 1}, false, 0, {1, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0}, true},
         {{8, 0, 0, 0, 0, 0, 0, 0}, false, 0, {1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0, 1, 0}, true},
     };
@@ -77,8 +74,7 @@ TYPED_TEST(Fft, RejectsOtherLengths) {
     EXPECT_TRUE(t_fft(&v, 1) == -1 && t_rfft(&c) == -1 && c->points == 4 && c->complex == 1);
 }
 
-// Every point lands at its reversed index, real and complex alike, past 1 MB of samples; the scaled form multiplies
-// each sample by 1/N exactly once; twice is identity.
+// Reversed indices, real and complex, past 1 MB of samples; the scaled form multiplies by 1/N once; twice is identity.
 TYPED_TEST(Fft, BitrevPermutesAndScales) {
     using T = real_of<TypeParam>;
     for (int m = 0; m <= 18; ++m)
@@ -113,14 +109,8 @@ TYPED_TEST(Fft, RealReconstruction) {
     for (const Case& c : cases) {
         Vec<TypeParam> v(c.in, c.cplx);
         v->delta = T(2);
-        ASSERT_EQ(t_orecon(&v, c.odd), 0);
-        EXPECT_EQ(v.values(), c.out) << c.in.size() << " scalars, odd " << c.odd;
-        EXPECT_EQ(v->delta, T(2));
-        if (c.odd == 0) {
-            Vec<TypeParam> w(c.in, c.cplx);
-            ASSERT_EQ(t_recon(&w), 0);
-            EXPECT_EQ(w.values(), c.out);
-        }
+        ASSERT_EQ(c.odd ? t_orecon(&v, 1) : t_recon(&v), 0);  // recon is the even form
+        EXPECT_TRUE(v.values() == c.out && v->delta == T(2)) << c.in.size() << " scalars, odd " << c.odd;
     }
 }
 
