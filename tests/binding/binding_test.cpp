@@ -80,11 +80,6 @@ void expect_transform(Kind kind, int n, bool fast) {
     EXPECT_TRUE(same_scalars(v.values(), want) && has_shape(v.get(), points, 1, 2.0 / n)) << kind << " " << n;
 }
 
-template <class V>
-void expect_three(int n, bool fast) {
-    for (Kind k : {forward, inverse, real_fft}) expect_transform<V>(k, n, fast);
-}
-
 VLX_TYPED_SUITE(Binding);
 
 TYPED_TEST(Binding, Absent) {
@@ -98,7 +93,7 @@ TYPED_TEST(Binding, Absent) {
     for (uint32_t f : {0x0u, 0x7000u, 0xf000u}) EXPECT_EQ((A::set(f), got<uint32_t>(A::get)), f & 0x8000u);
     // A flags word of 0x8000 with no modules reaches no runtime call.
     EXPECT_EQ(A::set_blocktime(5) | A::set_threads(1) | got(A::blocktime) | got(A::threads), 0);
-    expect_three<TypeParam>(16, false);
+    for (Kind k : {forward, inverse, real_fft}) expect_transform<TypeParam>(k, 16, false);
     Vec<TypeParam> one({3});
     EXPECT_TRUE(t_rfft(&one) == 0 && has_shape(one.get(), 1, 0, 1.0));  // natively one real point stays real
     EXPECT_EQ(A::release(), 0);
@@ -120,7 +115,7 @@ TYPED_TEST(Binding, Present) {
     }
     A::set(0x6000);  // KEEP: one descriptor per length and domain
     EXPECT_EQ(got<uint32_t>(A::get), 0x7000u);
-    expect_three<TypeParam>(16, true);
+    for (Kind k : {forward, inverse, real_fft}) expect_transform<TypeParam>(k, 16, true);
     EXPECT_EQ(calls(), c + "32.1/16 s4=0.0625 m f b " + c + "33.1/16 s4=0.0625 m f ");
     // A thread count releases them; a runtime held to one thread gets the user-thread count.
     EXPECT_EQ(A::set_threads(1) + got(A::threads), 1);
@@ -134,7 +129,7 @@ TYPED_TEST(Binding, Present) {
     EXPECT_EQ(calls(), c + "32.1/16 s4=0.0625 m f f x ");
     A::set(0);  // the native engines, the module untouched
     EXPECT_EQ(got<uint32_t>(A::get), 0x1000u);
-    expect_three<TypeParam>(16, false);
+    for (Kind k : {forward, inverse, real_fft}) expect_transform<TypeParam>(k, 16, false);
     EXPECT_EQ(calls(), "");
     using W = std::conditional_t<is_double<TypeParam>, vlxf_t, vlx_t>;  // the twin, never touched, is bound on its own
     A::set(0x8000);
