@@ -11,19 +11,18 @@ using namespace fftref;
 
 namespace {
 
+// The binding calls of a family; precision is the module's code for it.
 template <class V>
-struct api;
-#define VLX_BINDING_API(V, p, prec)                                                                      \
-    template <>                                                                                          \
-    struct api<V> {                                                                                      \
-        static constexpr auto get = p##_dft_get_flags, set = p##_dft_set_flags;                         \
-        static constexpr auto blocktime = p##_kmp_get_blocktime, threads = p##_omp_get_max_threads;     \
-        static constexpr auto set_blocktime = p##_kmp_set_blocktime, set_threads = p##_omp_set_num_threads; \
-        static constexpr auto release = p##_free_internal;                                               \
-        static constexpr int precision = prec;                                                           \
-    };
-VLX_BINDING_API(vlx_t, vlx, 36)
-VLX_BINDING_API(vlxf_t, vlxf, 35)
+struct api {
+    static constexpr bool d = is_double<V>;
+    static constexpr auto get = d ? vlx_dft_get_flags : vlxf_dft_get_flags, set = d ? vlx_dft_set_flags : vlxf_dft_set_flags;
+    static constexpr auto blocktime = d ? vlx_kmp_get_blocktime : vlxf_kmp_get_blocktime;
+    static constexpr auto threads = d ? vlx_omp_get_max_threads : vlxf_omp_get_max_threads;
+    static constexpr auto set_blocktime = d ? vlx_kmp_set_blocktime : vlxf_kmp_set_blocktime;
+    static constexpr auto set_threads = d ? vlx_omp_set_num_threads : vlxf_omp_set_num_threads;
+    static constexpr auto release = d ? vlx_free_internal : vlxf_free_internal;
+    static constexpr int precision = d ? 36 : 35;
+};
 
 // What a getter stores (-2 if it does not return 0).
 template <class R = int32_t, class F>
@@ -32,10 +31,9 @@ R got(F fn) {
     return fn(&x) == 0 ? x : R(-2);
 }
 
-#define SCENARIO(name)                                                      \
-    if (std::getenv("VLX_BINDING_SCENARIO") == nullptr ||                   \
-        std::strcmp(std::getenv("VLX_BINDING_SCENARIO"), name) != 0)        \
-    GTEST_SKIP() << "runs as a process of its own under ctest"
+bool scenario(const char* name) { return std::getenv("VLX_BINDING_SCENARIO") && !std::strcmp(std::getenv("VLX_BINDING_SCENARIO"), name); }
+#define SCENARIO(name) \
+    if (!scenario(name)) GTEST_SKIP() << "runs as a process of its own under ctest"
 
 // A function of a module that the library has loaded (omp_... from the runtime).
 template <class F>
@@ -54,7 +52,7 @@ std::string calls() {
     return fresh;
 }
 template <class V>
-std::string created() { return std::string(1, 'c').append(std::to_string(api<V>::precision)).append("."); }
+std::string created() { return is_double<V> ? "c36." : "c35."; }
 
 enum Kind { forward, inverse, real_fft, real_as_complex };
 

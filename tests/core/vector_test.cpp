@@ -87,28 +87,22 @@ TYPED_TEST(VectorTest, GrowthIsExactNeverShrinksAndFailureLeavesTheEmptyState) {
 TYPED_TEST(VectorTest, LentStorageIsNeverWrittenOrFreed) {
     using V = TypeParam;
     using T = real_of<V>;
-    using C = Counting<V>;
     T lent[8] = {1, 2, 3, 4, 5, 6, 7, 8};
     const Vals<T> original(lent, lent + 8);
-    // rtoc detaches: the owned copy is spread, the lender's samples stay.  zero makes an owned block of zeros (the
-    // lent samples are not worth copying).  destroy releases nothing and resets the fields.
-    for (int step = 0; step < 3; ++step) {
-        V v;
-        t_init(&v);
-        v.data = lent, v.points = 8;
-        const int frees = C::frees;
-        if (step == 0) {
-            ASSERT_EQ(t_rtoc(&v), 0);
-            EXPECT_TRUE(v.alloc == 16 && v.data != lent);
-            EXPECT_EQ(Vals<T>(v.data, v.data + 16), (Vals<T>{1, 0, 2, 0, 3, 0, 4, 0, 5, 0, 6, 0, 7, 0, 8, 0}));
-        } else if (step == 1) {
-            ASSERT_EQ(t_zero(&v), 0);
-            EXPECT_TRUE(C::last_old_points == 0 && v.data != lent && Vals<T>(v.data, v.data + 8) == Vals<T>(8, T(0)));
-        }
-        t_destroy(&v);
-        EXPECT_TRUE(v.data == nullptr && v.points == 0 && (step < 2 || C::frees == frees));
-        EXPECT_EQ(Vals<T>(lent, lent + 8), original);
-    }
+    V a, b, c;
+    for (V* v : {&a, &b, &c}) t_init(v), v->data = lent, v->points = 8;
+    // rtoc detaches: the owned copy is spread, the lender's samples stay.
+    ASSERT_EQ(t_rtoc(&a), 0);
+    EXPECT_TRUE(a.alloc == 16 && a.data != lent);
+    EXPECT_EQ(Vals<T>(a.data, a.data + 16), (Vals<T>{1, 0, 2, 0, 3, 0, 4, 0, 5, 0, 6, 0, 7, 0, 8, 0}));
+    // zero makes an owned block of zeros (the lent samples are not worth copying).
+    ASSERT_EQ(t_zero(&b), 0);
+    EXPECT_TRUE(Counting<V>::last_old_points == 0 && b.data != lent && Vals<T>(b.data, b.data + 8) == Vals<T>(8, T(0)));
+    const int frees = Counting<V>::frees;
+    t_destroy(&c);  // releases nothing, resets the fields
+    EXPECT_TRUE(c.data == nullptr && c.points == 0 && Counting<V>::frees == frees);
+    t_destroy(&a), t_destroy(&b);
+    EXPECT_EQ(Vals<T>(lent, lent + 8), original);
 }
 
 TYPED_TEST(VectorTest, ZeroPadRtocAndAppend) {

@@ -1,5 +1,6 @@
-// The frame's internals: locks before and after vlx_lib_init, the bounded counter, the active counter and the
-// teardown that waits for readers. Linked against the static library, whose internal symbols are visible.
+// The frame's internals: locks before and after vlx_lib_init, the bounded counter and the teardown order. Linked
+// against the static library, whose internal symbols are visible.  (The teardown's wait for readers outside the lock
+// is exercised by the reliability soak, which releases the caches under running operations.)
 #include "core/frame.hpp"
 
 #include <gtest/gtest.h>
@@ -13,10 +14,6 @@ namespace {
 
 using std::chrono::milliseconds;
 
-int64_t ms_since(std::chrono::steady_clock::time_point t0) {
-    return std::chrono::duration_cast<milliseconds>(std::chrono::steady_clock::now() - t0).count();
-}
-
 // How long another thread waits for lock n while this thread holds it for 100 ms.
 int64_t blocked_ms(int n) {
     std::atomic<bool> held{false};
@@ -26,7 +23,7 @@ int64_t blocked_ms(int n) {
         held.wait(false);
         const auto t0 = std::chrono::steady_clock::now();
         vlx::LockGuard lock(n);
-        waited = ms_since(t0);
+        waited = std::chrono::duration_cast<milliseconds>(std::chrono::steady_clock::now() - t0).count();
     });
     held = true;
     held.notify_one();
@@ -81,35 +78,6 @@ TEST(Frame, TeardownRunsStepsInOrderAndStopsAtAFailure) {
     EXPECT_EQ(ran, (std::vector<int>{1, 3, 5}));
     for (int s = 0; s < static_cast<int>(TeardownStep::count); ++s)
         vlx::register_teardown<vlx_t>(static_cast<TeardownStep>(s), nullptr);
-}
-
-std::atomic<bool> reader_done{false}, step_saw_reader_done{false};
-
-TEST(Frame, TeardownWaitsForAReaderOutsideTheLock) {
-    ASSERT_EQ(vlx_lib_init(), 0);
-    vlx::register_teardown<vlx_t>(vlx::TeardownStep::twiddle_tables, [] {
-        vlx::LockGuard lock(0);
-        vlx::lib_active_wait();
-        step_saw_reader_done = reader_done.load();
-        return int32_t(0);
-    });
-    std::atomic<bool> reading{false};
-    std::thread reader([&] {
-        vlx::TableReader r;  // lock 0, active enter
-        r.release_lock();    // the table is now used outside the lock
-        reading = true;
-        reading.notify_one();
-        std::this_thread::sleep_for(milliseconds(120));
-        reader_done = true;
-    });  // active leave
-    reading.wait(false);
-    const auto t0 = std::chrono::steady_clock::now();
-    EXPECT_EQ(vlx_free_internal(), 0);
-    reader.join();
-    EXPECT_TRUE(step_saw_reader_done.load() && ms_since(t0) >= 60);
-    const auto t1 = std::chrono::steady_clock::now();  // with nobody reading, the wait returns at once
-    EXPECT_TRUE(vlx_free_internal() == 0 && ms_since(t1) < 50);
-    vlx::register_teardown<vlx_t>(vlx::TeardownStep::twiddle_tables, nullptr);
 }
 
 }  // namespace

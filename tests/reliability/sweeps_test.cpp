@@ -11,15 +11,13 @@
 
 namespace rel {
 
+// Unused fields read -1.
 std::string Mode::describe() const {
-    char b[96];
-    std::string d;
-    if (vec >= 0) std::snprintf(b, sizeof b, "vector %d (%s) %s; ", vec, kRoleNames[int(role)], kKindNames[int(kind)]), d += b;
-    if (scalar >= 0) std::snprintf(b, sizeof b, "scalar %d = %g; ", scalar, scalar_value), d += b;
-    if (integer >= 0) std::snprintf(b, sizeof b, "integer %d = %lld; ", integer, static_cast<long long>(int_value)), d += b;
-    if (alias_at >= 0) std::snprintf(b, sizeof b, "vector %d is vector %d; ", alias_at, alias_of), d += b;
-    if (all_same) d += "all vectors the same; ";
-    return d.empty() ? "normal" : d;
+    char b[200];
+    std::snprintf(b, sizeof b, "vector %d (%s) %s; scalar %d = %g; integer %d = %lld; vector %d is vector %d%s", vec,
+                  kRoleNames[int(role)], kKindNames[int(kind)], scalar, scalar_value, integer,
+                  static_cast<long long>(int_value), alias_at, alias_of, all_same ? "; all vectors the same" : "");
+    return b;
 }
 
 namespace {
