@@ -7,6 +7,7 @@
 #include "vlx_test.hpp"
 
 #include <array>
+#include <cstdio>
 #include <string>
 
 namespace rel {
@@ -229,6 +230,27 @@ auto twin(D d, F f) {
     if constexpr (is_double<V>) return d; else return f;
 }
 #define REL_TW(prefix, name) ::rel::twin<V>(vlx##prefix##_##name, vlxf##prefix##_##name)
+
+// A stream to write to, or one holding v in the given form at its start; its buffer is made before the window opens.
+struct Stream {
+    std::FILE* f;
+    Stream() {
+        Pause p;
+        f = std::fopen("/dev/null", "w");
+        std::fputc(' ', f);
+    }
+    template <class V>
+    Stream(V* v, int32_t form) : f((Pause(), std::tmpfile())) {
+        Pause p;
+        REL_TW(f, fwrite2)(v, f, form);
+        std::rewind(f);
+        std::ungetc(std::fgetc(f), f);
+    }
+    ~Stream() {
+        Pause p;
+        std::fclose(f);
+    }
+};
 
 // REL_ROW(prefix, name, body): body sees `c` (the context), `fn` (the operation of the family) and V, T; it returns
 // the operation's status.
