@@ -1,7 +1,5 @@
-// Machinery of the reliability sweeps: a counted, failing allocator behind both the vector hooks and the standard
-// heap; a watchdog that turns a hang into a failure with a name; and the argument context through which every row of
-// the operation table asks for its vectors and numbers, so that one row serves the normal call, every hostile variant
-// and every aliasing.
+// Reliability machinery: a counted, failing allocator, a watchdog, and the argument context through which one row
+// of the operation table serves the normal call, every hostile variant and every aliasing.
 #pragma once
 
 #include "vlx_test.hpp"
@@ -252,8 +250,7 @@ struct Stream {
     }
 };
 
-// REL_ROW(prefix, name, body): body sees `c` (the context), `fn` (the operation of the family) and V, T; it returns
-// the operation's status.
+// REL_ROW(prefix, name, body): body sees `c` (the context), `fn` (the family's operation), V and T; returns the status.
 #define REL_ROWF(flags, prefix, name, ...)                                                                       \
     ::rel::row<vlx##prefix##_##name, vlxf##prefix##_##name>(                                                     \
         "vlx" #prefix "_" #name,                                                                                 \
