@@ -9,24 +9,20 @@ namespace {
 // be told to fail, and counts the blocks alive.
 template <class V>
 struct Counting {
-    using T = real_of<V>;
-    static inline int allocs, reallocs, frees, live;
-    static inline int32_t last_old_points, last_old_complex;
+    static inline int allocs, reallocs, frees, live, last_old_points, last_old_complex;
     static inline bool fail;
-
-    static size_t bytes(const V* v) { return size_t(v->complex ? 2 * int64_t(v->points) : v->points) * sizeof(T); }
+    static size_t bytes(const V* v) { return size_t(v->complex ? 2 * int64_t(v->points) : v->points) * sizeof(*v->data); }
     static int32_t on_alloc(V* v) {
         ++allocs;
         if (v->alloc > 0) std::free(v->data), --live;  // the hook releases the old block itself
-        v->data = fail ? nullptr : static_cast<T*>(std::malloc(bytes(v)));
+        v->data = fail ? nullptr : static_cast<real_of<V>*>(std::malloc(bytes(v)));
         return live += v->data != nullptr, 0;
     }
     static int32_t on_realloc(V* v, int32_t old_points, int32_t old_complex) {
         ++reallocs, last_old_points = old_points, last_old_complex = old_complex;
         if (fail) return on_alloc(v), --allocs, -1;
         live += v->data == nullptr;
-        v->data = static_cast<T*>(std::realloc(v->data, bytes(v)));
-        return 0;
+        return v->data = static_cast<real_of<V>*>(std::realloc(v->data, bytes(v))), 0;
     }
     static int32_t on_free(V* v) { return ++frees, --live, std::free(v->data), 0; }
 };

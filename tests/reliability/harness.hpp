@@ -1,12 +1,11 @@
-// Machinery of the reliability sweeps: a counted, failing allocator behind both the vector hooks and the standard
-// heap; a watchdog that turns a hang into a failure with a name; and the argument context through which every row of
-// the operation table asks for its vectors and numbers, so that one row serves the normal call, every hostile variant
-// and every aliasing.
+// Reliability machinery: a counted, failing allocator, a watchdog, and the argument context through which one row
+// of the operation table serves the normal call, every hostile variant and every aliasing.
 #pragma once
 
 #include "vlx_test.hpp"
 
 #include <array>
+#include <cstdio>
 #include <string>
 
 namespace rel {
@@ -230,8 +229,28 @@ auto twin(D d, F f) {
 }
 #define REL_TW(prefix, name) ::rel::twin<V>(vlx##prefix##_##name, vlxf##prefix##_##name)
 
-// REL_ROW(prefix, name, body): body sees `c` (the context), `fn` (the operation of the family) and V, T; it returns
-// the operation's status.
+// A stream to write to, or one holding v in the given form at its start; its buffer is made before the window opens.
+struct Stream {
+    std::FILE* f;
+    Stream() {
+        Pause p;
+        f = std::fopen("/dev/null", "w");
+        std::fputc(' ', f);
+    }
+    template <class V>
+    Stream(V* v, int32_t form) : f((Pause(), std::tmpfile())) {
+        Pause p;
+        REL_TW(f, fwrite2)(v, f, form);
+        std::rewind(f);
+        std::ungetc(std::fgetc(f), f);
+    }
+    ~Stream() {
+        Pause p;
+        std::fclose(f);
+    }
+};
+
+// REL_ROW(prefix, name, body): body sees `c` (the context), `fn` (the family's operation), V and T; returns the status.
 #define REL_ROWF(flags, prefix, name, ...)                                                                       \
     ::rel::row<vlx##prefix##_##name, vlxf##prefix##_##name>(                                                     \
         "vlx" #prefix "_" #name,                                                                                 \

@@ -1,6 +1,4 @@
-// The counted allocator: malloc, calloc and realloc of this executable (and so of the library, which calls them
-// through the dynamic linker) and the vector hooks of both families share one per-thread window.  The real
-// allocator is glibc's, or the sanitizer's when one is linked in.
+// The counted allocator: the interposed standard heap and the vector hooks of both families share one window.
 #include "harness.hpp"
 
 #include <csignal>

@@ -54,27 +54,6 @@ V* wanting(Ctx<V>& c, int32_t n) {
     return v;
 }
 
-// A stream to write to, or one holding v in the given form at its start; its buffer is made before the window opens.
-struct Stream {
-    std::FILE* f;
-    Stream() {
-        Pause p;
-        f = std::fopen("/dev/null", "w");
-        std::fputc(' ', f);
-    }
-    template <class V>
-    Stream(V* v, int32_t form) : f((Pause(), std::tmpfile())) {
-        Pause p;
-        REL_TW(f, fwrite2)(v, f, form);
-        std::rewind(f);
-        std::ungetc(std::fgetc(f), f);
-    }
-    ~Stream() {
-        Pause p;
-        std::fclose(f);
-    }
-};
-
 // A configured streaming resampler of the family of V, destroyed on exit.
 template <class V>
 struct Resampler {

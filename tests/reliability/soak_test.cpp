@@ -5,119 +5,70 @@
 
 #include <atomic>
 #include <chrono>
-#include <cstdio>
-#include <functional>
-#include <memory>
 #include <mutex>
 #include <thread>
 
 namespace rel {
 namespace {
 
-using vlxtest::Vec;
+// The any-length transform turns its cached filter when only the direction changes rather than rebuilding it, so
+// its last bits depend on the call before (and on a release in between): these rows agree to rounding only.
+constexpr unsigned kToRounding = 1u << 16;
 
-struct Job {
-    std::string name;
-    std::function<std::vector<double>()> run;  // the status, then the image of the result
-    double tolerance = 0;                      // relative to the largest magnitude; 0: bit for bit
-    bool matches(const std::vector<double>& got, const std::vector<double>& want) const {
-        if (tolerance == 0 || got.size() != want.size()) return same_image(got, want);
-        double top = 0, diff = 0;
-        for (size_t i = 4; i < got.size(); ++i)
-            top = std::max(top, std::fabs(want[i])), diff = std::max(diff, std::fabs(got[i] - want[i]));
-        return same_image({got.begin(), got.begin() + 4}, {want.begin(), want.begin() + 4}) && diff <= tolerance * top;
-    }
-};
-
-// Runs op on a fresh vector of n reproducible points.
-template <class V>
-Job job(const char* name, int32_t n, bool cplx, std::function<int(V*)> op) {
-    return {std::string(name) + (is_double<V> ? "" : " (float)"), [=] {
-                Vec<V> v(vlxtest::random_values<real_of<V>>(size_t(cplx ? 2 * n : n), uint32_t(n)), cplx);
-                v->delta = real_of<V>(0.5);
-                const int rc = op(v.get());
-                std::vector<double> r = image(v.get());
-                return r.insert(r.begin(), double(rc)), r;
-            }};
-}
-
-// op(v, out), then out copied back into v.
-template <class V, class Op>
-int through(V* v, Op op) {
-    Vec<V> out;
-    const int r = op(v, out.get());
-    return vlxtest::t_copy(v, out.get()), r;
-}
-
-// v filtered by taps 0.01 * (1 + k % 7) (real), plain or in the symmetric form (half the taps given).
-template <class V>
-int filtered(V* v, int32_t taps, bool symmetric) {
-    std::vector<real_of<V>> h;
-    for (int32_t k = 0; k < taps; ++k) h.push_back(real_of<V>(0.01 * (1 + k % 7)));
-    Vec<V> f(h, false);
-    return through(v, [&](V* in, V* out) {
-        return symmetric ? REL_TW(d, sfir)(in, out, f.get(), 0, 0, nullptr) : REL_TW(d, fir)(in, out, f.get(), nullptr);
-    });
-}
-
-// Reads a file image from memory: a binary one of complex samples, or a text one of real samples, written once by
-// the family's writer.
-template <class V>
-Job file_job(bool text) {
-    Vec<V> v(vlxtest::random_values<real_of<V>>(text ? 700 : 1400, 7), !text);
-    v->delta = real_of<V>(0.25);
-    std::FILE* f = std::tmpfile();
-    REL_TW(f, fwrite2)(v.get(), f, text ? VLX_FORMAT_ASCII : VLX_FORMAT_BINARY);
-    auto file = std::make_shared<std::string>(size_t(std::ftell(f)), '\0');
-    std::rewind(f);
-    if (std::fread(file->data(), 1, file->size(), f) != file->size()) file->clear();
-    std::fclose(f);
-    return job<V>(text ? "text read" : "binary read", 1, false, [file](V* into) {
-        std::FILE* m = fmemopen(file->data(), file->size(), "r");
-        const int r = REL_TW(f, fread)(into, m) == 1 ? 0 : -1;
-        return std::fclose(m), r;
-    });
-}
-
-template <class V>
-void add_jobs(std::vector<Job>& jobs) {
-    jobs.push_back(file_job<V>(false));
-    jobs.push_back(file_job<V>(true));
-    jobs.push_back(job<V>("window", 1000, true, [](V* v) { return REL_TW(i, window)(v, VLX_WINDOW_HANN, 0); }));
-    jobs.push_back(job<V>("window width", 512, false,
-                          [](V* v) { return REL_TW(i, window2)(v, VLX_WINDOW_HANN + 4, VLX_WFLAG_WIDTH, 300); }));
-    jobs.push_back(job<V>("spectrum", 1000, false, [](V* v) {
-        return through(v, [](V* in, V* out) { return REL_TW(h, fft)(in, out, 1024, 1, VLX_WINDOW_HANN + 2, 0); });
-    }));
-    jobs.push_back(job<V>("fir fast", 2048, false, [](V* v) { return filtered(v, 64, false); }));
-    jobs.push_back(job<V>("fir fast complex", 1024, true, [](V* v) { return filtered(v, 64, false); }));
+const std::vector<Row> jobs = {
+    REL_ROW(f, fread, Stream i(c.in(1400, true), VLX_FORMAT_BINARY); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROW(f, fread, Stream i(c.in(700), VLX_FORMAT_ASCII); return fn(c.out(), i.f) == 1 ? 0 : -1;),
+    REL_ROW(i, window, return fn(c.io(1000, true), c.n(VLX_WINDOW_HANN), c.n(0));),
+    REL_ROW(i, window2, return fn(c.io(512), c.n(VLX_WINDOW_HANN + 4), c.n(VLX_WFLAG_WIDTH), c.s(300));),
+    REL_ROW(h, fft, return fn(c.in(1000), c.out(), c.n(1024), c.s(1), c.n(VLX_WINDOW_HANN + 2), c.n(0));),
+    // Same creation order, so the real and complex fast paths get the same taps.
+    REL_ROW(d, fir, return fn(c.in(2048), c.out(), c.coef(64), nullptr);),
+    REL_ROW(d, fir, return fn(c.in(1024, true), c.out(), c.coef(64), nullptr);),
     // The fast path keeps one filter key for its real and complex spectra, so a real call whose transform length
     // matches the last real spectrum of another filter uses that spectrum (settled): the expanded symmetric filter
-    // therefore runs at another transform length than the plain one.
-    jobs.push_back(job<V>("sfir expanded", 700, false, [](V* v) { return filtered(v, 40, true); }));
-    jobs.push_back(job<V>("fft", 1024, true, [](V* v) { return REL_TW(i, fft)(v, 0); }));
-    jobs.push_back(job<V>("inverse fft", 256, true, [](V* v) { return REL_TW(i, fft)(v, 1); }));
-    jobs.push_back(job<V>("rfft", 2048, false, [](V* v) { return REL_TW(i, rfft)(v); }));
-    jobs.push_back(job<V>("bitrev", 512, true, [](V* v) { return REL_TW(i, bitrev_scale)(v); }));
-    jobs.push_back(job<V>("dft", 1000, true, [](V* v) { return REL_TW(i, dft)(v, 0); }));
-    jobs.push_back(job<V>("rdft", 999, false, [](V* v) { return REL_TW(i, rdft)(v); }));
-    jobs.push_back(job<V>("analytic", 500, false, [](V* v) { return REL_TW(i, analytic)(v); }));
-    // The any-length transform turns its cached filter when only the direction changes rather than rebuilding it,
-    // so its last bits depend on the call before (and on a release in between): these agree to rounding only.
-    for (size_t i = jobs.size() - 3; i < jobs.size(); ++i) jobs[i].tolerance = is_double<V> ? 1e-13 : 1e-5;
-    jobs.push_back(job<V>("dct", 300, false, [](V* v) { return REL_TW(i, dct)(v, 2); }));
+    // therefore runs at another transform length (700 points) than the plain one.
+    REL_ROW(d, sfir, return fn(c.in(700), c.out(), c.coef(40), c.n(0), c.n(0), nullptr);),
+    REL_ROW(i, fft, return fn(c.io(1024, true), c.n(0));),
+    REL_ROW(i, fft, return fn(c.io(256, true), c.n(1));),
+    REL_ROW(i, rfft, return fn(c.io(2048));),
+    REL_ROW(i, bitrev_scale, return fn(c.io(512, true));),
+    REL_ROWF(kToRounding, i, dft, return fn(c.io(1000, true), c.n(0));),
+    REL_ROWF(kToRounding, i, rdft, return fn(c.io(999));),
+    REL_ROWF(kToRounding, i, analytic, return fn(c.io(500));),
+    REL_ROW(i, dct, return fn(c.io(300), c.u(2));),
     // Uniform noise lies in [-1, 1] (a float draw may round up to 1): compared by the count of samples outside.
-    jobs.push_back(job<V>("noise", 4096, false, [](V* v) {
-        const int r = REL_TW(c, rand)(v, 0);
-        const auto outside = std::count_if(v->data, v->data + v->points, [](auto x) { return !(x >= -1 && x <= 1); });
-        return v->points = 1, v->data[0] = real_of<V>(outside), r;
-    }));
+    REL_ROW(c, rand, V* v = c.io(4096); const int r = fn(v, c.n(0));
+            v->data[0] = T(std::count_if(v->data, v->data + v->points, [](T x) { return !(x >= -1 && x <= 1); }));
+            return v->points = 1, r;),
     // Shuffles, by their sorted samples.
-    jobs.push_back(job<V>("shuffle", 1000, true, [](V* v) {
-        const int r = REL_TW(i, shuffle)(v);
-        return REL_TW(i, sort)(v), r;
-    }));
+    REL_ROW(i, shuffle, V* v = c.io(1000, true); const int r = fn(v); return REL_TW(i, sort)(v), r;),
+};
+
+// Job i: row i of the doubles, then of the floats.  The status, then the images of every vector of the call.
+template <class V>
+std::vector<double> run(const Row& row) {
+    Ctx<V> c;
+    std::vector<double> r{double(row(c))};
+    for (int i = 0; i < c.used; ++i) {
+        const auto x = image(&c.pool[size_t(i)]);
+        r.insert(r.end(), x.begin(), x.end());
+    }
+    return r;
 }
+std::vector<double> run(size_t i) {
+    return i < jobs.size() ? run<vlx_t>(jobs[i]) : run<vlxf_t>(jobs[i - jobs.size()]);
+}
+
+bool matches(size_t i, const std::vector<double>& got, const std::vector<double>& want) {
+    if (!(jobs[i % jobs.size()].flags & kToRounding) || got.size() != want.size()) return same_image(got, want);
+    const double tolerance = i < jobs.size() ? 1e-13 : 1e-5;  // relative to the largest magnitude
+    double top = 0, diff = 0;
+    for (size_t k = 4; k < got.size(); ++k)
+        top = std::max(top, std::fabs(want[k])), diff = std::max(diff, std::fabs(got[k] - want[k]));
+    return same_image({got.begin(), got.begin() + 4}, {want.begin(), want.begin() + 4}) && diff <= tolerance * top;
+}
+
+std::string name(size_t i) { return std::string(jobs[i % jobs.size()].name) + (i < jobs.size() ? "" : " (float)"); }
 
 double env_number(const char* name, double fallback) {
     const char* e = std::getenv(name);
@@ -129,13 +80,11 @@ double env_number(const char* name, double fallback) {
 TEST(ReliabilitySoak, CachesReleasedUnderRunningOperations) {
     install_hooks();
     vlx_lib_init();
-    std::vector<Job> jobs;
-    add_jobs<vlx_t>(jobs);
-    add_jobs<vlxf_t>(jobs);
+    const size_t count = 2 * jobs.size();
     std::vector<std::vector<double>> want;
-    for (const Job& j : jobs) {
-        want.push_back(j.run());
-        ASSERT_GE(want.back()[0], 0) << j.name;
+    for (size_t i = 0; i < count; ++i) {
+        want.push_back(run(i));
+        ASSERT_GE(want.back()[0], 0) << name(i);
     }
     const double seconds = env_number("VLX_SOAK_SECONDS", 2);
     const int workers = std::max(1, int(env_number("VLX_SOAK_THREADS", 3)));
@@ -146,10 +95,10 @@ TEST(ReliabilitySoak, CachesReleasedUnderRunningOperations) {
     std::vector<std::thread> threads;
     for (int t = 0; t < workers; ++t)
         threads.emplace_back([&, t] {
-            for (size_t i = size_t(t); !stop.load(); i = (i + 1) % jobs.size(), ++calls)
-                if (!jobs[i].matches(jobs[i].run(), want[i])) {
+            for (size_t i = size_t(t); !stop.load(); i = (i + 1) % count, ++calls)
+                if (!matches(i, run(i), want[i])) {
                     std::lock_guard<std::mutex> lock(m);
-                    wrong.push_back(jobs[i].name);
+                    wrong.push_back(name(i));
                 }
         });
     std::thread freer([&] {

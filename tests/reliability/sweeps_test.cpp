@@ -54,51 +54,56 @@ std::string label(const Row& r, const std::string& what) {
     return std::string(r.name) + (is_double<V> ? " (double) " : " (float) ") + what;
 }
 
-// Every vector the call was handed unspoiled can be destroyed and read: owned storage covers its samples, and no
-// samples without storage.  The text reader, as stated, may keep the count read with no storage after a failure.
-template <class V>
-void check_vectors(Ctx<V>& c, const std::string& what, bool count_kept) {
-    for (int i = 0; i < c.used; ++i) {
-        const V* v = &c.pool[size_t(i)];
-        if ((count_kept && v->data == nullptr && v->alloc == 0) || (c.mode.vec >= 0 && c.args[size_t(c.mode.vec)] == v))
-            continue;
-        const int64_t n = v->complex ? 2 * int64_t(v->points) : int64_t(v->points);
-        EXPECT_FALSE(v->alloc > 0 && n > v->alloc) << what << ", vector " << i << ": " << n << " scalars over alloc " << v->alloc;
-        EXPECT_FALSE(v->alloc <= 0 && v->data == nullptr && v->points > 0) << what << ", vector " << i << ": no storage";
-    }
-}
-
-// After the context is gone and the caches of both families are released, no hook block may remain unless the row's
-// leak is a settled one.
-template <class V>
-void check_released(Ctx<V>& c, const std::string& what, bool leak_allowed) {
-    c.clear();
-    EXPECT_EQ(vlxtest::t_free_internal<V>(), 0) << what;
-    vlx_free_internal(), vlxf_free_internal();
-    EXPECT_TRUE(leak_allowed || live_hook_blocks() == 0) << what << ": vector blocks left behind";
-    release_hook_blocks();
-}
-
 void check_heap_leaks([[maybe_unused]] const std::string& what) {
 #if defined(__SANITIZE_ADDRESS__)
     EXPECT_EQ(__lsan_do_recoverable_leak_check(), 0) << what << ": heap blocks leaked (see the report above)";
 #endif
 }
 
-// Runs one call in the counted window, failing its fail_at-th allocation; count and failed as the window saw them.
+// What a call left: its status, the window's counts, the images of its vectors, and the arguments it asked for.
+struct Outcome {
+    int rc = 0;
+    long count = 0, failed = 0;
+    std::vector<std::vector<double>> images;
+    std::vector<Role> roles;
+    int nscalar = 0, nint = 0;
+};
+
+// Runs one call in the counted window, failing its fail_at-th allocation.  Then every vector the call was handed
+// unspoiled can be destroyed and read: owned storage covers its samples, and no samples without storage (the text
+// reader, as stated, may keep the count read with no storage after a failure).  After the context is gone and the
+// caches of both families are released, no hook block may remain unless the row's leak is a settled one, or the call
+// failed and failed_may_leak (it may drop a block it could not grow, as a failed resize does).
 template <class V>
-int run(const Row& r, Ctx<V>& c, long fail_at, const std::string& what, long* count = nullptr, long* failed = nullptr) {
+Outcome run(const Row& r, const Mode& m, long fail_at, const std::string& what, bool failed_may_leak) {
     static const bool trace = std::getenv("VLX_RELIABILITY_TRACE") != nullptr;
     if (trace) std::fprintf(stderr, "trace: %s\n", what.c_str());
+    Ctx<V> c(m);
     Window& w = window();
     w = Window{.open = true, .fail_at = fail_at};
     watch(what, kCallBudget);
-    const int rc = r(c);
+    Outcome o;
+    o.rc = r(c);
     unwatch();
     w.open = false;
-    if (count != nullptr) *count = w.count;
-    if (failed != nullptr) *failed = w.failed;
-    return rc;
+    o.count = w.count, o.failed = w.failed, o.roles = c.roles, o.nscalar = c.nscalar, o.nint = c.nint;
+    const bool count_kept = o.rc < 0 && (r.flags & kCountKept);
+    for (int i = 0; i < c.used; ++i) {
+        const V* v = &c.pool[size_t(i)];
+        if (m.vec >= 0 && c.args[size_t(m.vec)] == v) continue;
+        if (m.vec < 0) o.images.push_back(image(v));
+        if (count_kept && v->data == nullptr && v->alloc == 0) continue;
+        const int64_t n = v->complex ? 2 * int64_t(v->points) : int64_t(v->points);
+        EXPECT_FALSE(v->alloc > 0 && n > v->alloc) << what << ", vector " << i << ": " << n << " scalars over alloc " << v->alloc;
+        EXPECT_FALSE(v->alloc <= 0 && v->data == nullptr && v->points > 0) << what << ", vector " << i << ": no storage";
+    }
+    c.clear();
+    EXPECT_EQ(vlxtest::t_free_internal<V>(), 0) << what;
+    vlx_free_internal(), vlxf_free_internal();
+    EXPECT_TRUE((r.flags & kSettledLeak) || (failed_may_leak && o.rc < 0) || live_hook_blocks() == 0)
+        << what << ": vector blocks left behind";
+    release_hook_blocks();
+    return o;
 }
 
 }  // namespace
@@ -113,31 +118,24 @@ TYPED_TEST(Reliability, EveryAllocationFailure) {
     REL_SWEEPS_SKIPPED;
     long rows_swept = 0, points_total = 0;
     for (const Row& r : rows()) {
-        const bool leak_ok = r.flags & kSettledLeak;
         for (const bool cold : {true, false}) {
             if (!cold && !long_run) break;
             // Cold: the family's caches released first; warm: filled by a call first.
-            auto prepare = [&](Ctx<V>& c) { cold ? (void)vlxtest::t_free_internal<V>() : (r(c), c.clear()); };
-            long n = 0;
-            std::vector<std::vector<double>> want;
-            Ctx<V> c0;
-            prepare(c0);
-            const int rc0 = run(r, c0, 0, label<V>(r, "counting"), &n);
-            EXPECT_TRUE(rc0 >= 0 || (r.flags & kFails)) << label<V>(r, "normal call");
-            for (int i = 0; i < c0.used; ++i) want.push_back(image(&c0.pool[size_t(i)]));
-            check_released(c0, label<V>(r, "counting"), leak_ok);
-            ++rows_swept, points_total += n;
-            for (long k = 1; k <= n; ++k) {
-                const std::string what = label<V>(r, "failing allocation " + std::to_string(k) + " of " + std::to_string(n));
+            auto prepare = [&] {
                 Ctx<V> c;
-                prepare(c);
-                long failed = 0;
-                const int rc = run(r, c, k, what, nullptr, &failed);
-                bool same = c.used == int(want.size()) && !(r.flags & kRandom);
-                for (int i = 0; same && i < c.used; ++i) same = same_image(image(&c.pool[size_t(i)]), want[size_t(i)]);
-                EXPECT_TRUE(failed == 0 || rc0 < 0 || rc < 0 || same) << what << ": succeeded with another result";
-                check_vectors(c, what, rc < 0 && (r.flags & kCountKept));
-                check_released(c, what, leak_ok);
+                cold ? (void)vlxtest::t_free_internal<V>() : (void)r(c);
+            };
+            prepare();
+            const Outcome o = run<V>(r, {}, 0, label<V>(r, "counting"), false);
+            EXPECT_TRUE(o.rc >= 0 || (r.flags & kFails)) << label<V>(r, "normal call");
+            ++rows_swept, points_total += o.count;
+            for (long k = 1; k <= o.count; ++k) {
+                const std::string what = label<V>(r, "failing allocation " + std::to_string(k) + " of " + std::to_string(o.count));
+                prepare();
+                const Outcome f = run<V>(r, {}, k, what, false);
+                bool same = f.images.size() == o.images.size() && !(r.flags & kRandom);
+                for (size_t i = 0; same && i < f.images.size(); ++i) same = same_image(f.images[i], o.images[i]);
+                EXPECT_TRUE(f.failed == 0 || o.rc < 0 || f.rc < 0 || same) << what << ": succeeded with another result";
             }
             check_heap_leaks(label<V>(r, "allocation failures"));
         }
@@ -159,9 +157,9 @@ TYPED_TEST(Reliability, HostileArguments) {
     for (const Row& r : rows()) {
         if (r.flags & kNoHostile) continue;
         std::vector<Mode> modes;
-        Ctx<V> c0;
-        run(r, c0, 0, label<V>(r, "normal"));
-        for (int i = 0; i < c0.nvec; ++i)
+        const Outcome c0 = run<V>(r, {}, 0, label<V>(r, "normal"), false);
+        const int nvec = int(c0.roles.size());
+        for (int i = 0; i < nvec; ++i)
             for (int k = 1; k <= int(VKind::big); ++k)
                 if (kind_fits(VKind(k), c0.roles[size_t(i)]) && !(VKind(k) == VKind::big && (r.flags & kQuadratic)))
                     modes.push_back({.vec = i, .role = c0.roles[size_t(i)], .kind = VKind(k)});
@@ -170,7 +168,7 @@ TYPED_TEST(Reliability, HostileArguments) {
         for (int i = 0; i < c0.nint; ++i)
             for (int64_t x : integers) modes.push_back({.integer = i, .int_value = x});
         const size_t before_pairs = modes.size();
-        for (int j = 0; j < c0.nvec; ++j)
+        for (int j = 0; j < nvec; ++j)
             for (int i = 0; i < j; ++i)
                 if (may_alias(c0.roles[size_t(i)], c0.roles[size_t(j)])) modes.push_back({.alias_of = i, .alias_at = j});
         if (modes.size() > before_pairs + 1) modes.push_back({.all_same = true});
@@ -183,17 +181,12 @@ TYPED_TEST(Reliability, HostileArguments) {
                     m.vec = modes[i].vec, m.kind = modes[i].kind, m.role = modes[i].role;
                     modes.push_back(m);
                 }
-        check_released(c0, label<V>(r, "normal"), r.flags & kSettledLeak);
         for (const Mode& m : modes) {
             long n = 0;  // the long run fails every allocation of every case in turn too
             for (long k = 0; k <= n; ++k, ++cases) {
                 const std::string what = label<V>(r, m.describe() + (k ? " allocation " + std::to_string(k) : ""));
-                Ctx<V> c(m);
-                const int rc = run(r, c, k, what, k == 0 && long_run ? &n : nullptr);
-                check_vectors(c, what, rc < 0 && (r.flags & kCountKept));
-                // A failed call may drop a block it could not grow, as a failed resize does; a successful one
-                // leaves nothing behind.
-                check_released(c, what, rc < 0 || (r.flags & kSettledLeak));
+                const Outcome o = run<V>(r, m, k, what, true);
+                if (k == 0 && long_run) n = o.count;
             }
         }
         check_heap_leaks(label<V>(r, "hostile arguments"));
