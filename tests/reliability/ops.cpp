@@ -11,6 +11,12 @@ namespace {
 template <class X>
 int value_only(X) { return 0; }
 
+// A lane cap set from the context, then put back.
+constexpr auto lane_cap = [](auto& c, auto fn) {
+    const int32_t old = fn(-1), r = fn(c.n(0));
+    return fn(old), r >= 0 ? 0 : -1;
+};
+
 // Points doubled, for a vector that must grow (hostile lengths left alone).
 template <class V>
 V* bump(V* v) {
@@ -93,11 +99,9 @@ const std::vector<Row> table = {
     REL_ROW(, dft_set_flags, uint32_t old = 0; REL_TW(, dft_get_flags)(&old);
             const int r = fn(c.u(VLX_DFT_KEEP)); REL_TW(, dft_set_flags)(old); return r;),
     REL_ROW(, kmp_set_blocktime, return fn(c.n(0));), REL_ROW(, omp_set_num_threads, return fn(c.n(1));),
-    // ---- transforms (the lane cap is put back after the call)
-    row<vlx_transform_lanes, vlx_transform_lanes>("vlx_transform_lanes", [](auto& c, auto fn) {
-        const int32_t old = fn(-1), r = fn(c.n(0));
-        return fn(old), r >= 0 ? 0 : -1;
-    }, 0u),
+    // ---- lane caps, put back after the call; transforms
+    row<vlx_transform_lanes, vlx_transform_lanes>("vlx_transform_lanes", lane_cap, 0u),
+    row<vlx_filter_lanes, vlx_filter_lanes>("vlx_filter_lanes", lane_cap, 0u),
     REL_ROW(i, fft, return fn(c.grow(64), c.n(0));), REL_ROW(i, fft, return fn(c.io(64, true), c.n(1));),
     REL_ROW(i, bitrev, return fn(c.io(64, true));), REL_ROW(i, bitrev_scale, return fn(c.io(64));),
     REL_ROW(i, rfft, return fn(c.grow(64));), REL_ROW(i, irfft, return fn(c.grow(33, true));),
