@@ -93,12 +93,6 @@ struct Lanes<float> {
     }
 };
 
-// Sums and differences of two sample registers, for the symmetric kernels.
-__attribute__((target("avx2"))) inline __m256d lanes_add(__m256d a, __m256d b) { return _mm256_add_pd(a, b); }
-__attribute__((target("avx2"))) inline __m256d lanes_sub(__m256d a, __m256d b) { return _mm256_sub_pd(a, b); }
-__attribute__((target("avx2"))) inline __m256 lanes_add(__m256 a, __m256 b) { return _mm256_add_ps(a, b); }
-__attribute__((target("avx2"))) inline __m256 lanes_sub(__m256 a, __m256 b) { return _mm256_sub_ps(a, b); }
-
 // Splits pairs of elements of `bytes` bytes each (4, 8 or 16) into the even
 // and the odd ones, each side by side; plain moves, so every bit passes
 // unchanged.  Returns the pairs done: whole registers only.

@@ -104,12 +104,12 @@ void sym_outputs(const HalfFilter<T>& f, const T* x, const T* hist, T* y, int64_
 // Most tap pairs the lanes take (the decimating kernel's limit gives 60).
 constexpr int64_t lane_pairs_max = 64;
 
-template <bool anti, class R>
-__attribute__((target("avx2"))) inline R pair_of(R newer, R older) {
+template <bool anti, class L>
+__attribute__((target("avx2"))) inline typename L::reg pair_of(typename L::reg newer, typename L::reg older) {
     if constexpr (anti)
-        return lanes_sub(newer, older);
+        return L::sub(newer, older);
     else
-        return lanes_add(newer, older);
+        return L::add(newer, older);
 }
 
 // Third-range outputs side by side, one scalar per lane: lane q starts from 0
@@ -132,10 +132,10 @@ __attribute__((target("avx2"))) int64_t pair_lanes(const HalfFilter<T>& f, const
             const R c = L::broadcast(h + j);
             const T* u = newest[j] + q;
             const T* v = oldest[j] + q;
-            a0 = L::add_product(a0, c, pair_of<anti>(L::load(u), L::load(v)));
-            a1 = L::add_product(a1, c, pair_of<anti>(L::load(u + n), L::load(v + n)));
-            a2 = L::add_product(a2, c, pair_of<anti>(L::load(u + 2 * n), L::load(v + 2 * n)));
-            a3 = L::add_product(a3, c, pair_of<anti>(L::load(u + 3 * n), L::load(v + 3 * n)));
+            a0 = L::add_product(a0, c, pair_of<anti, L>(L::load(u), L::load(v)));
+            a1 = L::add_product(a1, c, pair_of<anti, L>(L::load(u + n), L::load(v + n)));
+            a2 = L::add_product(a2, c, pair_of<anti, L>(L::load(u + 2 * n), L::load(v + 2 * n)));
+            a3 = L::add_product(a3, c, pair_of<anti, L>(L::load(u + 3 * n), L::load(v + 3 * n)));
         }
         if (f.odd) {
             const R c = L::broadcast(h + f.m - 1);
@@ -153,7 +153,7 @@ __attribute__((target("avx2"))) int64_t pair_lanes(const HalfFilter<T>& f, const
     for (; q + n <= end; q += n) {
         R a0 = L::zero();
         for (int64_t j = 0; j < p; ++j)
-            a0 = L::add_product(a0, L::broadcast(h + j), pair_of<anti>(L::load(newest[j] + q), L::load(oldest[j] + q)));
+            a0 = L::add_product(a0, L::broadcast(h + j), pair_of<anti, L>(L::load(newest[j] + q), L::load(oldest[j] + q)));
         if (f.odd) a0 = L::add_product(a0, L::broadcast(h + f.m - 1), L::load(centre + q));
         L::store(y + q, a0);
     }
